@@ -1,0 +1,12 @@
+# Sanitizer builds apply to every target of the tree, third-party tests included.
+if(LUMORA_SANITIZE AND LUMORA_TSAN)
+  message(FATAL_ERROR "LUMORA_SANITIZE and LUMORA_TSAN cannot be combined")
+endif()
+if(LUMORA_SANITIZE)
+  add_compile_options(-fsanitize=address,undefined -fno-omit-frame-pointer -fno-sanitize-recover=undefined)
+  add_link_options(-fsanitize=address,undefined)
+endif()
+if(LUMORA_TSAN)
+  add_compile_options(-fsanitize=thread -fno-omit-frame-pointer)
+  add_link_options(-fsanitize=thread)
+endif()

@@ -1,0 +1,52 @@
+#pragma once
+// Debug: the process-wide log and error-reporting singleton.
+//
+//   Debug::Create("DebugLogger.txt", std::bitset<4>(12));   // severe + critical are fatal
+//   Debug::GetInstance()->CriticalErrorMessage(__LINE__, "Zeph::Engine::Init", "Failed to open %s:", name);
+//   Debug::Destroy();
+//
+// Each entry is appended to a text log written through FI_File. A level whose bit
+// is set in the fatal levels writes an assertion block and the call stack after its
+// entry and then ends the process. The logger takes no lock.
+
+#include <bitset>
+#include <string>
+
+#include "engine/FI_File.h"
+
+class Debug
+{
+public:
+	enum AssertLevels
+	{
+		DEBUG_MESSAGE = 0,
+		ERROR_MESSAGE = 1,
+		SEVERE_ERROR_MESSAGE = 2,
+		CRITICAL_ERROR_MESSAGE = 3,
+	};
+
+	static bool Create(std::string aFileName, std::bitset<4> someAssertLevels);
+	static bool Destroy();
+	static Debug* GetInstance();
+
+	void DebugMessage(int aLine, const char* aFunctionName, const char* aFormat, ...)
+	    __attribute__((format(printf, 4, 5)));
+	void ErrorMessage(int aLine, const char* aFunctionName, const char* aFormat, ...)
+	    __attribute__((format(printf, 4, 5)));
+	void SevereErrorMessage(int aLine, const char* aFunctionName, const char* aFormat, ...)
+	    __attribute__((format(printf, 4, 5)));
+	void CriticalErrorMessage(int aLine, const char* aFunctionName, const char* aFormat, ...)
+	    __attribute__((format(printf, 4, 5)));
+
+private:
+	Debug() = default;
+	~Debug() = default;
+
+	bool Init(const std::string& aFileName, std::bitset<4> someAssertLevels);
+	// (implementation helpers: WriteEntry, WriteTimeStamp, FatalReport, WriteCallStack)
+
+	FI_File myFile;
+	std::bitset<4> myAssertLevels;
+
+	static Debug* ourInstance;
+};

@@ -1,0 +1,66 @@
+#pragma once
+// FI_File: the engine's typed file stream, in text or binary mode.
+//
+// The same calls read and write both modes, chosen by the flags at Open, so a
+// format's reader and writer are written once:
+//
+//   FI_File file;
+//   if (file.Open("data/x.sh", FI_File::FileFlags::WRITE | FI_File::FileFlags::BINARY)) { file.Write(3); }
+//
+// Text mode: strings are written between double quotes, numbers with the
+// stream's default formatting and no separator. Binary mode: numbers as raw
+// little-endian bytes, strings as a 4-byte length and the characters.
+// Paths are resolved case-insensitively (Paths::Resolve); writing creates
+// missing directories.
+
+#include <fstream>
+#include <string>
+
+class FI_File
+{
+public:
+	// Plain enum inside a struct so the flags combine as ints (READ | BINARY).
+	struct FileFlags
+	{
+		enum : int
+		{
+			READ = 1,
+			WRITE = 2,
+			APPEND = 4,
+			BINARY = 8,
+		};
+	};
+
+	FI_File();
+	~FI_File();
+
+	bool Open(std::string aFileName, int someFlags);
+	bool Close();
+
+	int GetFileSize();
+	bool NewLine();
+
+	bool Read(unsigned short& aValue);
+	bool Read(int& aValue);
+	bool Read(float& aValue);
+	bool Read(double& aValue);
+	bool Read(std::string& aString);
+	bool ReadWord(std::string& aWord);
+	bool ReadData(void* aDestination, int aByteCount);
+
+	bool Write(const std::string& aString);
+	bool Write(const char* aString);
+	bool WriteWord(const std::string& aWord);
+	bool Write(int aValue);
+	bool Write(float aValue);
+	bool Write(double aValue);
+	bool WriteData(const void* aSource, int aByteCount);
+
+	bool Flush();
+
+	int GetFlags() const { return myFlags; }
+
+private:
+	int myFlags;
+	std::fstream myStream;
+};

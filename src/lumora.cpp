@@ -1,0 +1,7 @@
+// liblumora: the shared library that holds every subsystem of the tree.
+#include "lumora.h"
+
+namespace Lumora
+{
+const char* GetVersion() { return LUMORA_VERSION; }
+}
