@@ -1,0 +1,35 @@
+#!/usr/bin/env bash
+# Installs every Debian package Lumora needs to build, test and run.
+# Idempotent: when everything is present it changes nothing and asks no mirror.
+set -euo pipefail
+
+PACKAGES=(
+	# toolchain
+	g++ cmake ninja-build pkg-config clang-format
+	# GCC's libbacktrace for call stacks in fatal reports
+	libgcc-12-dev
+	# XML files
+	libtinyxml-dev
+	# tests and benchmarks
+	googletest libgtest-dev libbenchmark-dev
+)
+
+missing=()
+for package in "${PACKAGES[@]}"; do
+	if ! dpkg-query -W -f='${Status}' "$package" 2>/dev/null | grep -q "install ok installed"; then
+		missing+=("$package")
+	fi
+done
+
+if [ ${#missing[@]} -eq 0 ]; then
+	echo "install-deps: all ${#PACKAGES[@]} packages present"
+	exit 0
+fi
+
+SUDO=""
+if [ "$(id -u)" -ne 0 ]; then
+	SUDO="sudo"
+fi
+echo "install-deps: installing ${missing[*]}"
+$SUDO apt-get update -qq
+DEBIAN_FRONTEND=noninteractive $SUDO apt-get install -y -qq --no-install-recommends "${missing[@]}"
