@@ -10,6 +10,7 @@
 // entry and then ends the process. The logger takes no lock.
 
 #include <bitset>
+#include <cstdarg>
 #include <string>
 
 #include "engine/FI_File.h"
@@ -43,7 +44,19 @@ private:
 	~Debug() = default;
 
 	bool Init(const std::string& aFileName, std::bitset<4> someAssertLevels);
-	// (implementation helpers: WriteEntry, WriteTimeStamp, FatalReport, WriteCallStack)
+
+	// The helpers are members so that their frames carry the "Debug::" prefix by
+	// which the fatal report leaves the logger's own frames out of the call stack.
+	void Report(AssertLevels aLevel, int aLine, const char* aFunctionName, const char* aFormat,
+	            std::va_list someArguments);
+	void WriteEntry(const char* aTag, int aLine, const char* aFunctionName, const char* aMessage);
+	// aFile null: the log could not be opened and the report goes to standard error.
+	[[noreturn]] static void FatalReport(FI_File* aFile, int aLine, const char* aFunctionName,
+	                                     const char* aText);
+	static void WriteTimeStamp(FI_File* aFile);
+	static void WriteCallStack(FI_File* aFile);
+	// Installed as CoreReport's critical handler while the log exists.
+	static void ForwardCoreReport(int aLine, const char* aFunctionName, const char* aMessage);
 
 	FI_File myFile;
 	std::bitset<4> myAssertLevels;
