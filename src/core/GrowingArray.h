@@ -14,7 +14,9 @@
 // hot paths.
 
 #include <cassert>
+#include <cstddef>
 #include <cstring>
+#include <functional>
 #include <limits>
 #include <type_traits>
 
@@ -112,7 +114,16 @@ public:
 			{
 				newSize = myCurNrOfItems + 1;
 			}
+			// anObject may be one of our own elements (Add(array[i]), Add(array.Last())):
+			// the growth frees the storage it lives in, so read it from its new place.
+			const T* object = &anObject;
+			const bool ownElementFlag = !std::less<const T*>()(object, myData) &&
+			                            std::less<const T*>()(object, myData + myCurNrOfItems);
+			const std::ptrdiff_t ownIndex = ownElementFlag ? object - myData : 0;
 			ReSize(newSize);
+			myData[myCurNrOfItems] = ownElementFlag ? myData[ownIndex] : anObject;
+			++myCurNrOfItems;
+			return;
 		}
 		myData[myCurNrOfItems] = anObject;
 		++myCurNrOfItems;
