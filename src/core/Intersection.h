@@ -17,11 +17,50 @@
 
 namespace Intersection
 {
+namespace Detail
+{
+// Entry and exit distances of the line along one axis's slab. A zero direction
+// component of either sign takes the non-negative branch (-0 >= 0 is true).
+template <typename T>
+void SlabDistances(T anOrigin, T aDirection, T aMin, T aMax, T& aNearOut, T& aFarOut)
+{
+	if (aDirection >= 0)
+	{
+		aNearOut = (aMin - anOrigin) / aDirection;
+		aFarOut = (aMax - anOrigin) / aDirection;
+	}
+	else
+	{
+		aNearOut = (aMax - anOrigin) / aDirection;
+		aFarOut = (aMin - anOrigin) / aDirection;
+	}
+}
+
+// Narrows [aMin, aMax] by one more slab. Written so that a NaN distance never
+// rejects and never replaces a bound: every comparison with NaN is false.
+template <typename T> bool NarrowBySlab(T& aMin, T& aMax, T aSlabMin, T aSlabMax)
+{
+	if (aMin > aSlabMax || aSlabMin > aMax)
+	{
+		return false;
+	}
+	if (aSlabMin > aMin)
+	{
+		aMin = aSlabMin;
+	}
+	if (aSlabMax < aMax)
+	{
+		aMax = aSlabMax;
+	}
+	return true;
+}
+} // namespace Detail
+
 // Slab test. The order of the comparisons matters for NaN: a NaN distance (origin
 // exactly on a slab plane of an axis the ray is parallel to) never rejects and
-// never replaces tmin or tmax, but makes the final tmin < tmax false. A zero
-// direction component of either sign takes the non-negative branch. A ray that
-// only grazes the box (tmin equal to tmax) misses.
+// never replaces tmin or tmax, but makes the final tmin < tmax false when it
+// starts there (the x axis). A ray that only grazes the box (tmin equal to tmax)
+// misses.
 template <typename T> bool RayVsAABB(const Ray<T>& aRay, const AABB<T>& anAABB)
 {
 	const Vector3<T>& origin = aRay.myOrigin;
@@ -31,67 +70,22 @@ template <typename T> bool RayVsAABB(const Ray<T>& aRay, const AABB<T>& anAABB)
 
 	T tmin;
 	T tmax;
-	if (direction.x >= 0)
-	{
-		tmin = (minPos.x - origin.x) / direction.x;
-		tmax = (maxPos.x - origin.x) / direction.x;
-	}
-	else
-	{
-		tmin = (maxPos.x - origin.x) / direction.x;
-		tmax = (minPos.x - origin.x) / direction.x;
-	}
+	Detail::SlabDistances(origin.x, direction.x, minPos.x, maxPos.x, tmin, tmax);
 
 	T tymin;
 	T tymax;
-	if (direction.y >= 0)
-	{
-		tymin = (minPos.y - origin.y) / direction.y;
-		tymax = (maxPos.y - origin.y) / direction.y;
-	}
-	else
-	{
-		tymin = (maxPos.y - origin.y) / direction.y;
-		tymax = (minPos.y - origin.y) / direction.y;
-	}
-
-	if (tmin > tymax || tymin > tmax)
+	Detail::SlabDistances(origin.y, direction.y, minPos.y, maxPos.y, tymin, tymax);
+	if (!Detail::NarrowBySlab(tmin, tmax, tymin, tymax))
 	{
 		return false;
-	}
-	if (tymin > tmin)
-	{
-		tmin = tymin;
-	}
-	if (tymax < tmax)
-	{
-		tmax = tymax;
 	}
 
 	T tzmin;
 	T tzmax;
-	if (direction.z >= 0)
-	{
-		tzmin = (minPos.z - origin.z) / direction.z;
-		tzmax = (maxPos.z - origin.z) / direction.z;
-	}
-	else
-	{
-		tzmin = (maxPos.z - origin.z) / direction.z;
-		tzmax = (minPos.z - origin.z) / direction.z;
-	}
-
-	if (tmin > tzmax || tzmin > tmax)
+	Detail::SlabDistances(origin.z, direction.z, minPos.z, maxPos.z, tzmin, tzmax);
+	if (!Detail::NarrowBySlab(tmin, tmax, tzmin, tzmax))
 	{
 		return false;
-	}
-	if (tzmin > tmin)
-	{
-		tmin = tzmin;
-	}
-	if (tzmax < tmax)
-	{
-		tmax = tzmax;
 	}
 
 	return tmin < tmax;

@@ -41,6 +41,43 @@ std::streamoff BytesLeft(std::fstream& aStream)
 }
 } // namespace
 
+// Binary numbers are their memory image; the formats fix int at 4 bytes.
+static_assert(sizeof(int) == 4 && sizeof(float) == 4 && sizeof(double) == 8 && sizeof(unsigned short) == 2);
+
+template <typename T> bool FI_File::ReadNumber(T& aValue)
+{
+	if ((myFlags & FileFlags::READ) == 0)
+	{
+		return false;
+	}
+	if ((myFlags & FileFlags::BINARY) != 0)
+	{
+		ReadRaw(myStream, aValue);
+	}
+	else
+	{
+		myStream >> aValue;
+	}
+	return true;
+}
+
+template <typename T> bool FI_File::WriteNumber(T aValue)
+{
+	if ((myFlags & FileFlags::WRITE) == 0)
+	{
+		return false;
+	}
+	if ((myFlags & FileFlags::BINARY) != 0)
+	{
+		WriteRaw(myStream, aValue);
+	}
+	else
+	{
+		myStream << aValue;
+	}
+	return true;
+}
+
 FI_File::FI_File() : myFlags(0)
 {
 }
@@ -156,72 +193,22 @@ bool FI_File::NewLine()
 
 bool FI_File::Read(unsigned short& aValue)
 {
-	if ((myFlags & FileFlags::READ) == 0)
-	{
-		return false;
-	}
-	if ((myFlags & FileFlags::BINARY) != 0)
-	{
-		ReadRaw(myStream, aValue);
-	}
-	else
-	{
-		myStream >> aValue;
-	}
-	return true;
+	return ReadNumber(aValue);
 }
 
 bool FI_File::Read(int& aValue)
 {
-	if ((myFlags & FileFlags::READ) == 0)
-	{
-		return false;
-	}
-	if ((myFlags & FileFlags::BINARY) != 0)
-	{
-		std::int32_t value = 0;
-		ReadRaw(myStream, value);
-		aValue = value;
-	}
-	else
-	{
-		myStream >> aValue;
-	}
-	return true;
+	return ReadNumber(aValue);
 }
 
 bool FI_File::Read(float& aValue)
 {
-	if ((myFlags & FileFlags::READ) == 0)
-	{
-		return false;
-	}
-	if ((myFlags & FileFlags::BINARY) != 0)
-	{
-		ReadRaw(myStream, aValue);
-	}
-	else
-	{
-		myStream >> aValue;
-	}
-	return true;
+	return ReadNumber(aValue);
 }
 
 bool FI_File::Read(double& aValue)
 {
-	if ((myFlags & FileFlags::READ) == 0)
-	{
-		return false;
-	}
-	if ((myFlags & FileFlags::BINARY) != 0)
-	{
-		ReadRaw(myStream, aValue);
-	}
-	else
-	{
-		myStream >> aValue;
-	}
-	return true;
+	return ReadNumber(aValue);
 }
 
 bool FI_File::Read(std::string& aString)
@@ -342,53 +329,17 @@ bool FI_File::WriteWord(const std::string& aWord)
 
 bool FI_File::Write(int aValue)
 {
-	if ((myFlags & FileFlags::WRITE) == 0)
-	{
-		return false;
-	}
-	if ((myFlags & FileFlags::BINARY) != 0)
-	{
-		WriteRaw(myStream, static_cast<std::int32_t>(aValue));
-	}
-	else
-	{
-		myStream << aValue;
-	}
-	return true;
+	return WriteNumber(aValue);
 }
 
 bool FI_File::Write(float aValue)
 {
-	if ((myFlags & FileFlags::WRITE) == 0)
-	{
-		return false;
-	}
-	if ((myFlags & FileFlags::BINARY) != 0)
-	{
-		WriteRaw(myStream, aValue);
-	}
-	else
-	{
-		myStream << aValue;
-	}
-	return true;
+	return WriteNumber(aValue);
 }
 
 bool FI_File::Write(double aValue)
 {
-	if ((myFlags & FileFlags::WRITE) == 0)
-	{
-		return false;
-	}
-	if ((myFlags & FileFlags::BINARY) != 0)
-	{
-		WriteRaw(myStream, aValue);
-	}
-	else
-	{
-		myStream << aValue;
-	}
-	return true;
+	return WriteNumber(aValue);
 }
 
 bool FI_File::WriteData(const void* aSource, int aByteCount)

@@ -61,6 +61,11 @@ public:
 	int GetFlags() const { return myFlags; }
 
 private:
+	// The typed reads and writes share one shape: check the flag, then raw bytes
+	// in binary mode or stream extraction/insertion in text mode.
+	template <typename T> bool ReadNumber(T& aValue);
+	template <typename T> bool WriteNumber(T aValue);
+
 	int myFlags;
 	std::fstream myStream;
 };
