@@ -2,6 +2,7 @@
 
 #include <gtest/gtest.h>
 
+#include <numeric>
 #include <string>
 #include <vector>
 
@@ -14,23 +15,17 @@ template <typename T> std::vector<T> Contents(const GrowingArray<T>& anArray)
 	return std::vector<T>(anArray.begin(), anArray.end());
 }
 
-// Counts destructions, so a test can see which objects an array released.
 struct DestructionCounter
 {
-	static int ourDestroyedCount;
+	static inline int ourDestroyedCount = 0;
 	~DestructionCounter() { ++ourDestroyedCount; }
 };
-int DestructionCounter::ourDestroyedCount = 0;
 
-// Counts copy assignments, so a test can tell safe-mode growth from a raw copy.
+// Counts copy assignments, so a test can tell safe-mode growth from a byte copy.
 struct AssignmentCounter
 {
-	static int ourAssignmentCount;
+	static inline int ourAssignmentCount = 0;
 	int myValue = 0;
-
-	AssignmentCounter() = default;
-	explicit AssignmentCounter(int aValue) : myValue(aValue) {}
-	AssignmentCounter(const AssignmentCounter&) = default;
 	AssignmentCounter& operator=(const AssignmentCounter& anOther)
 	{
 		myValue = anOther.myValue;
@@ -38,10 +33,8 @@ struct AssignmentCounter
 		return *this;
 	}
 };
-int AssignmentCounter::ourAssignmentCount = 0;
 
-// Overwrites its value when destroyed, so reading an element out of freed
-// storage shows up as a wrong value even without a sanitizer.
+// Overwrites its value when destroyed, so a read from released storage shows.
 struct PoisonOnDestroy
 {
 	int myValue = 0;
@@ -52,146 +45,106 @@ struct PoisonOnDestroy
 TEST(GrowingArray, GrowsByTheFixedStepAndKeepsOrder)
 {
 	GrowingArray<int> array(2000, 2000, true);
-	EXPECT_EQ(array.GetCapacity(), 2000);
-	for (int i = 0; i < 2000; ++i)
+	for (int i = 0; i <= 2000; ++i)
 	{
+		ASSERT_EQ(array.GetCapacity(), 2000) << "before add " << i;
 		array.Add(i * 3);
 	}
-	EXPECT_EQ(array.Count(), 2000);
-	EXPECT_EQ(array.GetCapacity(), 2000);
-
-	array.Add(2000 * 3);
-	EXPECT_EQ(array.Count(), 2001);
 	EXPECT_EQ(array.GetCapacity(), 4000);
+	ASSERT_EQ(array.Count(), 2001);
 	for (int i = 0; i < 2001; ++i)
 	{
 		ASSERT_EQ(array[i], i * 3) << "at index " << i;
 	}
 
-	// A room's own list: the step differs from the first capacity.
-	GrowingArray<int> small(25, 10, true);
-	for (int i = 0; i < 36; ++i)
+	// The step is the increase size, not the first capacity; a step of zero still
+	// makes room for the one element.
+	std::vector<int> zeroTo35(36);
+	std::iota(zeroTo35.begin(), zeroTo35.end(), 0);
+	for (const auto& [step, finalCapacity] : {std::pair{10, 45}, std::pair{0, 36}})
 	{
-		small.Add(i);
-		ASSERT_EQ(small.GetCapacity(), i < 25 ? 25 : i < 35 ? 35 : 45) << "after " << i + 1 << " adds";
+		GrowingArray<int> small(25, step, true);
+		for (int i = 0; i < 36; ++i)
+		{
+			small.Add(i);
+		}
+		EXPECT_EQ(small.GetCapacity(), finalCapacity) << "step " << step;
+		EXPECT_EQ(Contents(small), zeroTo35) << "step " << step;
 	}
-
-	// A step of zero would never make room; the array still takes the element.
-	GrowingArray<int> noStep(1, 0, true);
-	noStep.Add(1);
-	noStep.Add(2);
-	noStep.Add(3);
-	EXPECT_EQ(Contents(noStep), (std::vector<int>{1, 2, 3}));
 }
 
 TEST(GrowingArray, RemoveCyclicMovesTheLastElementIntoTheHole)
 {
-	GrowingArray<char> array(4, 4, true);
-	for (char c : {'A', 'B', 'C'})
+	for (const auto& [index, expected] :
+	     {std::pair{0, std::vector<char>{'C', 'B'}}, std::pair{2, std::vector<char>{'A', 'B'}}})
 	{
-		array.Add(c);
+		GrowingArray<char> array(4, 4, true);
+		for (char c : {'A', 'B', 'C'})
+		{
+			array.Add(c);
+		}
+		array.RemoveCyclicAtIndex(index);
+		EXPECT_EQ(Contents(array), expected) << "removing index " << index;
+		array.RemoveLast();
+		EXPECT_EQ(Contents(array), std::vector<char>{expected[0]});
 	}
-	array.RemoveCyclicAtIndex(0);
-	EXPECT_EQ(Contents(array), (std::vector<char>{'C', 'B'}));
-
-	array.RemoveAll();
-	for (char c : {'A', 'B', 'C'})
-	{
-		array.Add(c);
-	}
-	array.RemoveCyclicAtIndex(2);
-	EXPECT_EQ(Contents(array), (std::vector<char>{'A', 'B'}));
-
-	array.RemoveLast();
-	EXPECT_EQ(Contents(array), (std::vector<char>{'A'}));
-	EXPECT_EQ(array.Last(), 'A');
 }
 
-TEST(GrowingArray, RemoveAllKeepsTheStorageForReuse)
+TEST(GrowingArray, ClearingKeepsTheStorage)
 {
-	GrowingArray<std::string> array(8, 8, true);
-	array.Add("first");
-	array.Add("second");
-	const std::string* storage = array.begin();
+	GrowingArray<std::string> strings(8, 8, true);
+	strings.Add("first");
+	strings.Add("second");
+	const std::string* storage = strings.begin();
+	strings.RemoveAll();
+	EXPECT_EQ(strings.Count(), 0);
+	strings.Add("X");
+	EXPECT_EQ(strings.begin(), storage);
+	EXPECT_EQ(Contents(strings), std::vector<std::string>{"X"});
 
-	array.RemoveAll();
-	EXPECT_EQ(array.Count(), 0);
-	array.Add("X");
-	EXPECT_EQ(array.begin(), storage);
-	EXPECT_EQ(array.Count(), 1);
-	EXPECT_EQ(array[0], "X");
-	EXPECT_EQ(array.GetCapacity(), 8);
-}
-
-TEST(GrowingArray, DeleteAllReleasesPointeesAndClearsSlots)
-{
+	// DeleteAll skips a null pointer and nulls every used slot.
 	DestructionCounter::ourDestroyedCount = 0;
-	GrowingArray<DestructionCounter*> array(4, 4, true);
-	array.Add(new DestructionCounter);
-	array.Add(nullptr);
-	array.Add(new DestructionCounter);
-
-	array.DeleteAll();
+	GrowingArray<DestructionCounter*> pointers(4, 4, true);
+	pointers.Add(new DestructionCounter);
+	pointers.Add(nullptr);
+	pointers.Add(new DestructionCounter);
+	pointers.DeleteAll();
 	EXPECT_EQ(DestructionCounter::ourDestroyedCount, 2);
-	EXPECT_EQ(array.Count(), 0);
-	for (int i = 0; i < 3; ++i)
-	{
-		EXPECT_EQ(array.begin()[i], nullptr) << "slot " << i;
-	}
-	EXPECT_EQ(array.GetCapacity(), 4);
+	EXPECT_EQ(pointers.Count(), 0);
+	EXPECT_EQ(std::vector<DestructionCounter*>(pointers.begin(), pointers.begin() + 3),
+	          std::vector<DestructionCounter*>(3, nullptr));
 }
 
-TEST(GrowingArray, ReInitReleasesTheOldStorage)
+TEST(GrowingArray, ReInitStartsEmptyWithTheNewCapacity)
 {
-	DestructionCounter::ourDestroyedCount = 0;
-	GrowingArray<DestructionCounter> array(5, 5, true);
-	array.Add(DestructionCounter());
-	array.Add(DestructionCounter());
-	DestructionCounter::ourDestroyedCount = 0;
-
-	// All five slots of the old storage are destroyed, not only the used ones.
+	GrowingArray<int> array(5, 5, true);
+	array.Add(1);
 	array.ReInit(12, 3, true);
-	EXPECT_EQ(DestructionCounter::ourDestroyedCount, 5);
 	EXPECT_EQ(array.Count(), 0);
 	EXPECT_EQ(array.GetCapacity(), 12);
+	for (int i = 0; i < 13; ++i)
+	{
+		array.Add(i);
+	}
+	EXPECT_EQ(array.GetCapacity(), 15) << "growth uses the new step";
 }
 
-TEST(GrowingArray, SafeModeCopiesElementsByAssignment)
+TEST(GrowingArray, SafeModeAssignsOnGrowthRawModeCopiesBytes)
 {
-	GrowingArray<std::string> strings(2, 2, true);
-	std::vector<std::string> expected;
-	for (int i = 0; i < 9; ++i)
+	// Four Adds assign in both modes; safe mode also assigns the three moved elements.
+	for (const auto& [safeMode, expectedAssignments] : {std::pair{true, 7}, std::pair{false, 4}})
 	{
-		// Long enough to live on the heap, so a byte copy would share buffers.
-		expected.push_back("a string that does not fit the small buffer #" + std::to_string(i));
-		strings.Add(expected.back());
-	}
-	EXPECT_EQ(strings.GetCapacity(), 10);
-	EXPECT_EQ(Contents(strings), expected);
-
-	AssignmentCounter::ourAssignmentCount = 0;
-	GrowingArray<AssignmentCounter> safe(3, 3, true);
-	for (int i = 0; i < 4; ++i)
-	{
-		safe.Add(AssignmentCounter(i));
-	}
-	// Four Adds plus three carried over by the growth.
-	EXPECT_EQ(AssignmentCounter::ourAssignmentCount, 7);
-}
-
-TEST(GrowingArray, RawModeCopiesElementsAsBytes)
-{
-	AssignmentCounter::ourAssignmentCount = 0;
-	GrowingArray<AssignmentCounter> raw(3, 3, false);
-	for (int i = 0; i < 4; ++i)
-	{
-		raw.Add(AssignmentCounter(i * 10));
-	}
-	EXPECT_EQ(AssignmentCounter::ourAssignmentCount, 4) << "growth must not call the assignment";
-	EXPECT_EQ(raw.GetCapacity(), 6);
-	for (int i = 0; i < 4; ++i)
-	{
-		EXPECT_EQ(raw[i].myValue, i * 10);
+		AssignmentCounter::ourAssignmentCount = 0;
+		GrowingArray<AssignmentCounter> array(3, 3, safeMode);
+		for (int i = 0; i < 4; ++i)
+		{
+			array.Add(AssignmentCounter{i * 10});
+		}
+		EXPECT_EQ(AssignmentCounter::ourAssignmentCount, expectedAssignments) << "safe mode " << safeMode;
+		for (int i = 0; i < 4; ++i)
+		{
+			EXPECT_EQ(array[i].myValue, i * 10) << "safe mode " << safeMode;
+		}
 	}
 }
 
@@ -200,62 +153,40 @@ TEST(GrowingArray, AddOfAnOwnElementSurvivesGrowth)
 	GrowingArray<PoisonOnDestroy> array(2, 2, true);
 	array.Add(PoisonOnDestroy{7});
 	array.Add(PoisonOnDestroy{8});
-	// The argument refers into the storage that this growth replaces.
-	array.Add(array[0]);
+	array.Add(array[0]); // the argument lives in the storage this growth replaces
 	ASSERT_EQ(array.Count(), 3);
 	EXPECT_EQ(array[2].myValue, 7);
-
-	GrowingArray<std::string> strings(1, 1, true);
-	strings.Add("long enough to be allocated on the heap by std::string");
-	strings.Add(strings.Last());
-	EXPECT_EQ(strings[1], strings[0]);
 }
 
 namespace
 {
-struct RecordedReport
+std::vector<std::string> ourReports;
+void RecordReport(int, const char* aFunctionName, const char* aMessage)
 {
-	int myCallCount = 0;
-	std::string myFunctionName;
-	std::string myMessage;
-};
-RecordedReport ourRecordedReport;
-
-void RecordReport(int aLine, const char* aFunctionName, const char* aMessage)
-{
-	static_cast<void>(aLine);
-	++ourRecordedReport.myCallCount;
-	ourRecordedReport.myFunctionName = aFunctionName;
-	ourRecordedReport.myMessage = aMessage;
+	ourReports.push_back(std::string(aFunctionName) + ": " + aMessage);
 }
 } // namespace
 
 TEST(GrowingArray, RefusesToGrowPastTheCounterRange)
 {
-	ourRecordedReport = RecordedReport();
+	ourReports.clear();
 	const CoreReport::Handler previous = CoreReport::GetCriticalHandler();
 	CoreReport::SetCriticalHandler(&RecordReport);
-
 	GrowingArray<int> array(2000, 2000, true);
 	for (int i = 0; i < 65535; ++i)
 	{
 		array.Add(i);
 	}
-	EXPECT_EQ(ourRecordedReport.myCallCount, 0);
-	// The last step is cut to what a 16-bit counter can hold.
-	EXPECT_EQ(array.GetCapacity(), 65535);
-
+	EXPECT_TRUE(ourReports.empty());
+	EXPECT_EQ(array.GetCapacity(), 65535) << "the last step is cut to the counter's range";
 	array.Add(-1);
 	CoreReport::SetCriticalHandler(previous);
 
-	EXPECT_EQ(ourRecordedReport.myCallCount, 1);
-	EXPECT_EQ(ourRecordedReport.myFunctionName, "GrowingArray::Add");
-	EXPECT_NE(ourRecordedReport.myMessage.find("65535"), std::string::npos) << ourRecordedReport.myMessage;
+	ASSERT_EQ(ourReports.size(), 1u);
+	EXPECT_EQ(ourReports[0].rfind("GrowingArray::Add: ", 0), 0u) << ourReports[0];
+	EXPECT_NE(ourReports[0].find("65535"), std::string::npos) << ourReports[0];
 	EXPECT_EQ(array.Count(), 65535);
-	EXPECT_EQ(array.GetCapacity(), 65535);
-	EXPECT_EQ(array[0], 0);
 	EXPECT_EQ(array.Last(), 65534);
-	EXPECT_EQ(CoreReport::GetCriticalHandler(), previous);
 }
 
 TEST(GrowingArrayDeathTest, DebugBuildsCatchOutOfRangeAccess)

@@ -12,10 +12,11 @@
 using Intersection::AABB;
 using Intersection::Ray;
 using Intersection::Sphere;
+using V3 = Vector3<float>;
 
 namespace
 {
-AABB<float> Box(const Vector3<float>& aMin, const Vector3<float>& aMax)
+AABB<float> Box(const V3& aMin, const V3& aMax)
 {
 	AABB<float> box;
 	box.myMinPos = aMin;
@@ -23,25 +24,19 @@ AABB<float> Box(const Vector3<float>& aMin, const Vector3<float>& aMax)
 	return box;
 }
 
-AABB<float> UnitBox()
-{
-	return Box(Vector3<float>(-1.0f, -1.0f, -1.0f), Vector3<float>(1.0f, 1.0f, 1.0f));
-}
+const AABB<float> ourUnitBox = Box(V3(-1.0f, -1.0f, -1.0f), V3(1.0f, 1.0f, 1.0f));
 
-bool Hits(const Vector3<float>& anOrigin, const Vector3<float>& aDirection, const AABB<float>& aBox)
+bool Hits(const V3& anOrigin, const V3& aDirection, const AABB<float>& aBox = ourUnitBox)
 {
 	return Intersection::RayVsAABB(Ray<float>(anOrigin, aDirection), aBox);
 }
 
-// The smallest shape there is: relies on the base for everything optional.
+// The smallest shape: relies on the base for everything optional, and records
+// the spheres handed to it.
 class Marker : public Intersection::CollisionObject
 {
 public:
-	bool Collide(const CollisionObject& anObject) const override
-	{
-		static_cast<void>(anObject);
-		return false;
-	}
+	bool Collide(const CollisionObject&) const override { return false; }
 	bool CollideWithSphere(const Sphere& aSphere) const override
 	{
 		++myCallCount;
@@ -51,152 +46,116 @@ public:
 };
 } // namespace
 
-TEST(IntersectionRay, ConstructorNormalisesTheDirection)
+TEST(IntersectionRayVsAABB, UnitBoxCases)
 {
-	const Ray<float> ray(Vector3<float>(1.0f, 2.0f, 3.0f), Vector3<float>(0.0f, 3.0f, 4.0f));
-	EXPECT_EQ(ray.myOrigin.z, 3.0f);
-	EXPECT_NEAR(ray.myDirection.y, 0.6f, 1e-6f);
-	EXPECT_NEAR(ray.myDirection.z, 0.8f, 1e-6f);
-
-	const Ray<float> still(Vector3<float>(0.0f, 0.0f, 0.0f), Vector3<float>(0.0f, 0.0f, 0.0f));
-	EXPECT_EQ(still.myDirection.LengthFast(), 0.0f);
-}
-
-TEST(IntersectionRayVsAABB, HitsAndMissesAlongTheLine)
-{
-	const AABB<float> box = UnitBox();
-	EXPECT_TRUE(Hits(Vector3<float>(0.0f, 0.0f, -10.0f), Vector3<float>(0.0f, 0.0f, 1.0f), box));
-	// Pointing away still hits: the whole line is tested, not the half in front.
-	EXPECT_TRUE(Hits(Vector3<float>(0.0f, 0.0f, -10.0f), Vector3<float>(0.0f, 0.0f, -1.0f), box));
-	EXPECT_FALSE(Hits(Vector3<float>(2.0f, 0.0f, -10.0f), Vector3<float>(0.0f, 0.0f, 1.0f), box));
-	EXPECT_TRUE(Hits(Vector3<float>(-5.0f, -4.0f, -3.0f), Vector3<float>(5.0f, 4.5f, 3.5f), box));
-	EXPECT_FALSE(Hits(Vector3<float>(-5.0f, -4.0f, -3.0f), Vector3<float>(5.0f, -4.0f, 3.0f), box));
-
-	// An off-centre box, reached on a diagonal from every octant.
-	const AABB<float> offset = Box(Vector3<float>(2.0f, 3.0f, 4.0f), Vector3<float>(3.0f, 5.0f, 7.0f));
-	const Vector3<float> centre(2.5f, 4.0f, 5.5f);
-	for (float sx : {-1.0f, 1.0f})
+	struct Case
 	{
-		for (float sy : {-1.0f, 1.0f})
-		{
-			for (float sz : {-1.0f, 1.0f})
-			{
-				const Vector3<float> direction(sx, sy * 0.5f, sz * 2.0f);
-				EXPECT_TRUE(Hits(centre - direction * 10.0f, direction, offset)) << sx << sy << sz;
-				EXPECT_FALSE(
-				    Hits(centre - direction * 10.0f + Vector3<float>(0.0f, 2.5f, 0.0f), direction, offset))
-				    << sx << sy << sz;
-			}
-		}
+		const char* myName;
+		V3 myOrigin;
+		V3 myDirection;
+		bool myHit;
+	};
+	const Case cases[] = {
+	    {"straight through", V3(0.0f, 0.0f, -10.0f), V3(0.0f, 0.0f, 1.0f), true},
+	    {"box behind the origin: the whole line counts", V3(0.0f, 0.0f, -10.0f), V3(0.0f, 0.0f, -1.0f), true},
+	    {"beside the box at x = 2", V3(2.0f, 0.0f, -10.0f), V3(0.0f, 0.0f, 1.0f), false},
+	    {"diagonal through", V3(-5.0f, -4.0f, -3.0f), V3(5.0f, 4.5f, 3.5f), true},
+	    {"diagonal past", V3(-5.0f, -4.0f, -3.0f), V3(5.0f, -4.0f, 3.0f), false},
+	    // On a slab plane and parallel to it, 0/0 is NaN. On x it becomes tmin or tmax
+	    // and the final comparison fails; on y and z it never replaces a bound.
+	    {"NaN on the x = 1 plane", V3(1.0f, 0.0f, -10.0f), V3(0.0f, 0.0f, 1.0f), false},
+	    {"NaN on the y = -1 plane", V3(0.0f, -1.0f, -10.0f), V3(0.0f, 0.0f, 1.0f), true},
+	    {"NaN on the z = 1 plane", V3(-10.0f, 0.0f, 1.0f), V3(1.0f, 0.0f, 0.0f), true},
+	    {"grazing the x = 1, z = 1 edge", V3(0.0f, 0.0f, 2.0f), V3(1.0f, 0.0f, -1.0f), false},
+	    {"the grazing line moved inwards", V3(0.0f, 0.0f, 1.5f), V3(1.0f, 0.0f, -1.0f), true},
+	    // A zero direction is parallel to every slab.
+	    {"zero direction outside", V3(5.0f, 0.0f, 0.0f), V3(0.0f, 0.0f, 0.0f), false},
+	    {"zero direction inside", V3(0.5f, 0.0f, 0.0f), V3(0.0f, 0.0f, 0.0f), true},
+	};
+	for (const Case& ray : cases)
+	{
+		EXPECT_EQ(Hits(ray.myOrigin, ray.myDirection), ray.myHit) << ray.myName;
 	}
+
+	// -0 takes the non-negative branch: the x slab runs from +inf to -inf and the
+	// ray misses, where +0 (the first case) or a branch on the sign bit would hit.
+	const Ray<float> negativeZero(V3(0.0f, 0.0f, -10.0f), V3(-0.0f, 0.0f, 1.0f));
+	ASSERT_TRUE(std::signbit(negativeZero.myDirection.x));
+	EXPECT_FALSE(Intersection::RayVsAABB(negativeZero, ourUnitBox));
 }
 
-TEST(IntersectionRayVsAABB, IeeeEdgeCases)
+TEST(IntersectionRayVsAABB, OffCentreBoxFromEveryOctant)
 {
-	const AABB<float> box = UnitBox();
-
-	// Origin on a slab plane with the ray parallel to it: 0/0 is NaN. On x the NaN
-	// becomes tmin or tmax directly and the final comparison fails; on y and z it
-	// never replaces a bound, so the same ray on those planes hits.
-	EXPECT_FALSE(Hits(Vector3<float>(1.0f, 0.0f, -10.0f), Vector3<float>(0.0f, 0.0f, 1.0f), box));
-	EXPECT_FALSE(Hits(Vector3<float>(-1.0f, 0.0f, -10.0f), Vector3<float>(0.0f, 0.0f, 1.0f), box));
-	EXPECT_TRUE(Hits(Vector3<float>(0.0f, -1.0f, -10.0f), Vector3<float>(0.0f, 0.0f, 1.0f), box));
-	EXPECT_TRUE(Hits(Vector3<float>(0.0f, 1.0f, -10.0f), Vector3<float>(0.0f, 0.0f, 1.0f), box));
-	EXPECT_TRUE(Hits(Vector3<float>(-10.0f, 0.0f, 1.0f), Vector3<float>(1.0f, 0.0f, 0.0f), box));
-
-	// Grazing the edge x = 1, z = 1: entry and exit coincide (tmin == tmax), a miss,
-	// while the same line moved inwards hits.
-	EXPECT_FALSE(Hits(Vector3<float>(0.0f, 0.0f, 2.0f), Vector3<float>(1.0f, 0.0f, -1.0f), box));
-	EXPECT_TRUE(Hits(Vector3<float>(0.0f, 0.0f, 1.5f), Vector3<float>(1.0f, 0.0f, -1.0f), box));
-
-	// Negative zero counts as non-negative: the x slab then runs from +inf to -inf
-	// and the ray misses, where +0 (or a branch on the sign bit) would hit.
-	EXPECT_TRUE(Hits(Vector3<float>(0.0f, 0.0f, -10.0f), Vector3<float>(0.0f, 0.0f, 1.0f), box));
-	const Ray<float> negativeZero(Vector3<float>(0.0f, 0.0f, -10.0f), Vector3<float>(-0.0f, 0.0f, 1.0f));
-	ASSERT_TRUE(std::signbit(negativeZero.myDirection.x));
-	EXPECT_FALSE(Intersection::RayVsAABB(negativeZero, box));
-
-	// A zero direction is parallel to every slab: from outside the box it misses,
-	// from strictly inside every slab spans -inf..+inf and it hits.
-	EXPECT_FALSE(Hits(Vector3<float>(5.0f, 0.0f, 0.0f), Vector3<float>(0.0f, 0.0f, 0.0f), box));
-	EXPECT_TRUE(Hits(Vector3<float>(0.5f, 0.0f, 0.0f), Vector3<float>(0.0f, 0.0f, 0.0f), box));
+	const AABB<float> box = Box(V3(2.0f, 3.0f, 4.0f), V3(3.0f, 5.0f, 7.0f));
+	for (int octant = 0; octant < 8; ++octant)
+	{
+		const V3 direction(octant & 1 ? -1.0f : 1.0f, octant & 2 ? -0.5f : 0.5f, octant & 4 ? -2.0f : 2.0f);
+		const V3 start = V3(2.5f, 4.0f, 5.5f) - direction * 10.0f; // the line through the centre
+		EXPECT_TRUE(Hits(start, direction, box)) << "octant " << octant;
+		EXPECT_FALSE(Hits(start + V3(0.0f, 2.5f, 0.0f), direction, box)) << "octant " << octant;
+	}
 }
 
 TEST(IntersectionPointInsideAABB, StrictOnEveryAxis)
 {
-	const AABB<float> box = UnitBox();
-	EXPECT_TRUE(Intersection::PointInsideAABB(box, Vector3<float>(0.0f, 0.0f, 0.0f)));
-	EXPECT_TRUE(Intersection::PointInsideAABB(box, Vector3<float>(0.99f, -0.99f, 0.5f)));
-	// Each of the six faces on its own.
+	EXPECT_TRUE(Intersection::PointInsideAABB(ourUnitBox, V3(0.99f, -0.99f, 0.5f)));
+	EXPECT_FALSE(Intersection::PointInsideAABB(ourUnitBox, V3(-3.0f, 0.0f, 0.0f)));
+	// A point on any of the six faces is outside.
 	for (int axis = 0; axis < 3; ++axis)
 	{
 		for (float side : {-1.0f, 1.0f})
 		{
-			Vector3<float> onFace(0.25f, -0.25f, 0.5f);
+			V3 onFace(0.25f, -0.25f, 0.5f);
 			(axis == 0 ? onFace.x : axis == 1 ? onFace.y : onFace.z) = side;
-			EXPECT_FALSE(Intersection::PointInsideAABB(box, onFace)) << "axis " << axis << " side " << side;
+			EXPECT_FALSE(Intersection::PointInsideAABB(ourUnitBox, onFace))
+			    << "axis " << axis << " side " << side;
 		}
 	}
-	EXPECT_FALSE(Intersection::PointInsideAABB(box, Vector3<float>(0.0f, 0.0f, 1.5f)));
-	EXPECT_FALSE(Intersection::PointInsideAABB(box, Vector3<float>(-3.0f, 0.0f, 0.0f)));
 }
 
 TEST(IntersectionSphere, TouchingSpheresCollide)
 {
-	const Sphere a(Vector3<float>(0.0f, 0.0f, 0.0f), 1.0f);
-	const Sphere touching(Vector3<float>(2.0f, 0.0f, 0.0f), 1.0f);
-	const Sphere apart(Vector3<float>(0.0f, 2.01f, 0.0f), 1.0f);
-	const Sphere overlapping(Vector3<float>(0.0f, 0.0f, -0.5f), 0.25f);
+	const Sphere a(V3(0.0f, 0.0f, 0.0f), 1.0f);
+	const Sphere touching(V3(2.0f, 0.0f, 0.0f), 1.0f);
 	EXPECT_TRUE(a.CollideWithSphere(touching));
 	EXPECT_TRUE(touching.CollideWithSphere(a));
-	EXPECT_FALSE(a.CollideWithSphere(apart));
-	EXPECT_TRUE(a.CollideWithSphere(overlapping));
+	EXPECT_FALSE(a.CollideWithSphere(Sphere(V3(0.0f, 2.01f, 0.0f), 1.0f)));
+	EXPECT_TRUE(a.CollideWithSphere(Sphere(V3(0.0f, 0.0f, -0.5f), 0.25f)));
 }
 
-TEST(IntersectionSphere, CollideDispatchesOnTheOtherShape)
+TEST(IntersectionSphere, CollideDispatchesToTheOtherShape)
 {
-	const Sphere a(Vector3<float>(0.0f, 0.0f, 0.0f), 1.0f);
-	const Sphere touching(Vector3<float>(2.0f, 0.0f, 0.0f), 1.0f);
-	const Sphere apart(Vector3<float>(3.0f, 0.0f, 0.0f), 1.0f);
-	const Intersection::CollisionObject& asBase = touching;
-	EXPECT_TRUE(a.Collide(asBase));
-	EXPECT_FALSE(a.Collide(apart));
+	const Sphere a(V3(0.0f, 0.0f, 0.0f), 1.0f);
+	const Intersection::CollisionObject& touching = Sphere(V3(2.0f, 0.0f, 0.0f), 1.0f);
+	EXPECT_TRUE(a.Collide(touching));
+	EXPECT_FALSE(a.Collide(Sphere(V3(3.0f, 0.0f, 0.0f), 1.0f)));
 
 	// The other shape decides, with this sphere handed over.
 	Marker marker;
 	EXPECT_FALSE(a.Collide(marker));
-	EXPECT_TRUE(Sphere(Vector3<float>(0.0f, 0.0f, 0.0f), 2.0f).Collide(marker));
+	EXPECT_TRUE(Sphere(V3(0.0f, 0.0f, 0.0f), 2.0f).Collide(marker));
 	EXPECT_EQ(marker.myCallCount, 2);
 
-	// Boxes take part in no shape test: even a sphere inside one does not collide.
-	const AABB<float> box = UnitBox();
-	EXPECT_FALSE(a.Collide(box));
-	EXPECT_FALSE(box.Collide(a));
-	EXPECT_FALSE(box.CollideWithSphere(a));
+	// Boxes take part in no shape test, even with a sphere inside.
+	EXPECT_FALSE(a.Collide(ourUnitBox));
+	EXPECT_FALSE(ourUnitBox.Collide(a));
+	EXPECT_FALSE(ourUnitBox.CollideWithSphere(a));
 }
 
-TEST(IntersectionCollisionObject, PositionDefaultsAndOverrides)
+TEST(IntersectionCollisionObject, BasePositionDefaultsDoNothing)
 {
 	Marker marker;
 	Intersection::CollisionObject& base = marker;
-	base.SetPosition(Vector3<float>(1.0f, 2.0f, 3.0f));
-	const Vector3<float> position = base.GetPosition();
-	EXPECT_EQ(position.x, 0.0f);
-	EXPECT_EQ(position.y, 0.0f);
-	EXPECT_EQ(position.z, 0.0f);
+	base.SetPosition(V3(1.0f, 2.0f, 3.0f));
+	const V3 position = base.GetPosition();
+	EXPECT_TRUE(position.x == 0.0f && position.y == 0.0f && position.z == 0.0f);
 
-	Sphere sphere(Vector3<float>(1.0f, 1.0f, 1.0f), 0.5f);
+	// Sphere overrides the position but not SetPreviousPosition.
+	Sphere sphere(V3(1.0f, 1.0f, 1.0f), 0.5f);
 	Intersection::CollisionObject& asBase = sphere;
-	asBase.SetPosition(Vector3<float>(4.0f, 5.0f, 6.0f));
-	asBase.SetPreviousPosition(Vector3<float>(9.0f, 9.0f, 9.0f));
+	asBase.SetPosition(V3(4.0f, 5.0f, 6.0f));
+	asBase.SetPreviousPosition(V3(9.0f, 9.0f, 9.0f));
 	EXPECT_EQ(asBase.GetPosition().y, 5.0f);
 	EXPECT_EQ(sphere.myPosition.z, 6.0f);
-	// Nothing overrides SetPreviousPosition, so it leaves the field alone.
 	EXPECT_EQ(sphere.myPreviousPosition.x, 1.0f);
-
-	Sphere copy;
-	copy = sphere;
-	EXPECT_EQ(copy.myPosition.x, 4.0f);
-	EXPECT_EQ(copy.myPreviousPosition.x, 1.0f);
-	EXPECT_EQ(copy.myRadius, 0.5f);
 }
