@@ -16,153 +16,38 @@ constexpr int WRITE = FI_File::FileFlags::WRITE;
 constexpr int APPEND = FI_File::FileFlags::APPEND;
 constexpr int BINARY = FI_File::FileFlags::BINARY;
 
-std::string OpenAndCaptureError(FI_File& aFile, const std::string& aName, int someFlags, bool& anOpenedFlag)
+// The next value of type T read from the file; aStart shows whether Read replaced it.
+template <typename T> T Next(FI_File& aFile, T aStart = T())
 {
-	testing::internal::CaptureStderr();
-	anOpenedFlag = aFile.Open(aName, someFlags);
-	return testing::internal::GetCapturedStderr();
+	EXPECT_TRUE(aFile.Read(aStart));
+	return aStart;
 }
 } // namespace
 
-TEST(FI_FileTest, TextStringsAreQuotedAndReadBack)
+TEST(FI_FileTest, TextModeQuotesStringsWritesNumbersBareAndReadsThemBack)
 {
 	ScratchDir scratch;
-	const std::string name = scratch.File("strings.txt");
+	const std::string name = scratch.File("text.txt");
 	{
 		FI_File file;
 		ASSERT_TRUE(file.Open(name, WRITE));
-		EXPECT_TRUE(file.Write("a b"));
-		EXPECT_TRUE(file.Write(std::string("c")));
-		EXPECT_TRUE(file.NewLine());
-		EXPECT_TRUE(file.Close());
+		EXPECT_TRUE(file.Write("a b") && file.Write(std::string("c")) && file.NewLine());
+		EXPECT_TRUE(file.Write(1.0f / 3.0f) && file.WriteWord(" ") && file.Write(-7) &&
+		            file.WriteWord(" 65535 rest of line") && file.NewLine() && file.Write(2.5));
+		ASSERT_TRUE(file.Close());
 	}
-	EXPECT_EQ(ReadWholeFile(name), "\"a b\"\"c\"\n");
+	EXPECT_EQ(ReadWholeFile(name), "\"a b\"\"c\"\n0.333333 -7 65535 rest of line\n2.5");
 
 	FI_File file;
 	ASSERT_TRUE(file.Open(name, READ));
-	std::string first;
-	std::string second;
-	EXPECT_TRUE(file.Read(first));
-	EXPECT_TRUE(file.Read(second));
-	EXPECT_EQ(first, "a b");
-	EXPECT_EQ(second, "c");
+	EXPECT_EQ(Next<std::string>(file), "a b");
+	EXPECT_EQ(Next<std::string>(file), "c");
+	EXPECT_FLOAT_EQ(Next<float>(file), 0.333333f);
+	EXPECT_EQ(Next<int>(file), -7);
+	EXPECT_EQ(Next<unsigned short>(file), 65535);
+	EXPECT_TRUE(file.NewLine()) << "skips the rest of the line";
+	EXPECT_DOUBLE_EQ(Next<double>(file), 2.5);
 	EXPECT_TRUE(file.Close());
-}
-
-TEST(FI_FileTest, TextNumbersUseDefaultFormattingWithoutSeparators)
-{
-	ScratchDir scratch;
-	const std::string name = scratch.File("numbers.txt");
-	{
-		FI_File file;
-		ASSERT_TRUE(file.Open(name, WRITE));
-		file.Write("Line:");
-		file.Write(34);
-		file.NewLine();
-		file.Write(1.0f / 3.0f);
-		file.WriteWord(" ");
-		file.Write(2.5);
-		file.WriteWord(" ");
-		file.Write(-7);
-		file.WriteWord(" 65535");
-		file.NewLine();
-		ASSERT_TRUE(file.Close());
-	}
-	EXPECT_EQ(ReadWholeFile(name), "\"Line:\"34\n0.333333 2.5 -7 65535\n");
-
-	FI_File file;
-	ASSERT_TRUE(file.Open(name, READ));
-	EXPECT_TRUE(file.NewLine()) << "skips the first line";
-	float third = 0.0f;
-	double half = 0.0;
-	int negative = 0;
-	unsigned short big = 0;
-	EXPECT_TRUE(file.Read(third));
-	EXPECT_TRUE(file.Read(half));
-	EXPECT_TRUE(file.Read(negative));
-	EXPECT_TRUE(file.Read(big));
-	EXPECT_FLOAT_EQ(third, 0.333333f);
-	EXPECT_DOUBLE_EQ(half, 2.5);
-	EXPECT_EQ(negative, -7);
-	EXPECT_EQ(big, 65535);
-	EXPECT_TRUE(file.Close());
-}
-
-TEST(FI_FileTest, BinaryValuesAreRawLittleEndianBytes)
-{
-	ScratchDir scratch;
-	const std::string name = scratch.File("values.bin");
-	{
-		FI_File file;
-		ASSERT_TRUE(file.Open(name, WRITE | BINARY));
-		EXPECT_TRUE(file.Write("abc"));
-		EXPECT_TRUE(file.Write(0x01020304));
-		EXPECT_FALSE(file.NewLine()) << "binary files have no lines";
-		ASSERT_TRUE(file.Close());
-	}
-	EXPECT_EQ(ReadWholeFile(name), std::string("\x03\0\0\0abc\x04\x03\x02\x01", 11));
-}
-
-TEST(FI_FileTest, BinaryRoundTripOfEveryType)
-{
-	ScratchDir scratch;
-	const std::string name = scratch.File("round.bin");
-	const unsigned char shortBytes[] = {0xfe, 0xca};
-	const std::string withNul("x\0y\"z", 5);
-	{
-		FI_File file;
-		ASSERT_TRUE(file.Open(name, WRITE | BINARY));
-		EXPECT_TRUE(file.WriteData(shortBytes, 2));
-		EXPECT_TRUE(file.Write(-123456));
-		EXPECT_TRUE(file.Write(3.25f));
-		EXPECT_TRUE(file.Write(-1.0e300));
-		EXPECT_TRUE(file.Write(withNul));
-		EXPECT_TRUE(file.WriteWord("word"));
-		EXPECT_TRUE(file.Write(std::string()));
-		ASSERT_TRUE(file.Close());
-	}
-	EXPECT_EQ(std::filesystem::file_size(name), 2u + 4 + 4 + 8 + (4 + 5) + (4 + 4) + 4);
-
-	FI_File file;
-	ASSERT_TRUE(file.Open(name, READ | BINARY));
-	unsigned short shortValue = 0;
-	int intValue = 0;
-	float floatValue = 0.0f;
-	double doubleValue = 0.0;
-	std::string stringValue;
-	std::string word;
-	std::string empty = "not cleared";
-	EXPECT_TRUE(file.Read(shortValue));
-	EXPECT_TRUE(file.Read(intValue));
-	EXPECT_TRUE(file.Read(floatValue));
-	EXPECT_TRUE(file.Read(doubleValue));
-	EXPECT_TRUE(file.Read(stringValue));
-	EXPECT_TRUE(file.ReadWord(word));
-	EXPECT_TRUE(file.Read(empty));
-	EXPECT_EQ(shortValue, 0xcafe);
-	EXPECT_EQ(intValue, -123456);
-	EXPECT_EQ(floatValue, 3.25f);
-	EXPECT_EQ(doubleValue, -1.0e300);
-	EXPECT_EQ(stringValue, withNul);
-	EXPECT_EQ(word, "word");
-	EXPECT_EQ(empty, "");
-	EXPECT_TRUE(file.Close()) << "every read stayed inside the file";
-}
-
-TEST(FI_FileTest, CorruptBinaryLengthFailsTheStreamWithoutAllocating)
-{
-	ScratchDir scratch;
-	const std::string name = scratch.File("corrupt.bin");
-	WriteWholeFile(name, std::string("\xff\xff\xff\x7f"
-	                                 "abc",
-	                                 7));
-
-	FI_File file;
-	ASSERT_TRUE(file.Open(name, READ | BINARY));
-	std::string value = "old";
-	EXPECT_TRUE(file.Read(value));
-	EXPECT_EQ(value, "");
-	EXPECT_FALSE(file.Close()) << "the caller learns of the bad length at Close";
 }
 
 TEST(FI_FileTest, ReadWordSkipsCommentLines)
@@ -173,67 +58,86 @@ TEST(FI_FileTest, ReadWordSkipsCommentLines)
 
 	FI_File file;
 	ASSERT_TRUE(file.Open(name, READ));
-	std::string word;
-	EXPECT_TRUE(file.ReadWord(word));
-	EXPECT_EQ(word, "SURF");
-	EXPECT_TRUE(file.ReadWord(word));
-	EXPECT_EQ(word, "next");
-	EXPECT_TRUE(file.ReadWord(word));
-	EXPECT_EQ(word, "") << "a file ending in a comment has no further word";
+	const auto nextWord = [&file] {
+		std::string word;
+		EXPECT_TRUE(file.ReadWord(word));
+		return word;
+	};
+	EXPECT_EQ(nextWord(), "SURF");
+	EXPECT_EQ(nextWord(), "next");
+	EXPECT_EQ(nextWord(), "") << "a file ending in a comment has no further word";
 }
 
-TEST(FI_FileTest, TextNewLineSkipsTheRestOfALine)
+TEST(FI_FileTest, BinaryWritesRawLittleEndianBytesAndReadsThemBack)
 {
 	ScratchDir scratch;
-	const std::string name = scratch.File("lines.txt");
-	WriteWholeFile(name, "12 ignored \"text\"\n34\n");
-
-	FI_File file;
-	ASSERT_TRUE(file.Open(name, READ));
-	int first = 0;
-	int second = 0;
-	EXPECT_TRUE(file.Read(first));
-	EXPECT_TRUE(file.NewLine());
-	EXPECT_TRUE(file.Read(second));
-	EXPECT_EQ(first, 12);
-	EXPECT_EQ(second, 34);
-}
-
-TEST(FI_FileTest, GetFileSizeCountsFromTheReadPositionAndRewinds)
-{
-	ScratchDir scratch;
-	const std::string name = scratch.File("ten.bin");
-	WriteWholeFile(name, "0123456789");
+	const std::string name = scratch.File("values.bin");
+	const unsigned char shortBytes[] = {0xfe, 0xca};
+	const std::string withNul("x\0y\"z", 5);
+	{
+		FI_File file;
+		ASSERT_TRUE(file.Open(name, WRITE | BINARY));
+		EXPECT_TRUE(file.Write("abc"));
+		EXPECT_TRUE(file.Write(0x01020304));
+		EXPECT_FALSE(file.NewLine()) << "binary files have no lines";
+		EXPECT_TRUE(file.WriteData(shortBytes, 2) && file.Write(3.25f) && file.Write(-1.0e300) &&
+		            file.Write(withNul) && file.WriteWord("word") && file.Write(std::string()));
+		ASSERT_TRUE(file.Close());
+	}
+	const std::string bytes = ReadWholeFile(name);
+	EXPECT_EQ(bytes.substr(0, 13), std::string("\x03\0\0\0abc\x04\x03\x02\x01\xfe\xca", 13));
+	EXPECT_EQ(bytes.size(), 7u + 4 + 2 + 4 + 8 + (4 + 5) + (4 + 4) + 4);
 
 	FI_File file;
 	ASSERT_TRUE(file.Open(name, READ | BINARY));
-	EXPECT_EQ(file.GetFileSize(), 10);
-	char bytes[3] = {};
-	EXPECT_TRUE(file.ReadData(bytes, 3));
-	EXPECT_EQ(std::string(bytes, 3), "012");
-	EXPECT_EQ(file.GetFileSize(), 7);
-	EXPECT_TRUE(file.ReadData(bytes, 3));
-	EXPECT_EQ(std::string(bytes, 3), "012") << "GetFileSize leaves the position at the start";
+	EXPECT_EQ(Next<std::string>(file), "abc");
+	EXPECT_EQ(Next<int>(file), 0x01020304);
+	EXPECT_EQ(Next<unsigned short>(file), 0xcafe);
+	EXPECT_EQ(Next<float>(file), 3.25f);
+	EXPECT_EQ(Next<double>(file), -1.0e300);
+	EXPECT_EQ(Next<std::string>(file), withNul);
+	EXPECT_EQ(Next<std::string>(file), "word");
+	EXPECT_EQ(Next<std::string>(file, "not cleared"), "");
+	EXPECT_TRUE(file.Close()) << "every read stayed inside the file";
 }
 
-TEST(FI_FileTest, OperationsWithoutTheirFlagDoNothing)
+TEST(FI_FileTest, CorruptLengthFailsAtCloseAndAReopenStartsClean)
+{
+	ScratchDir scratch;
+	const std::string name = scratch.File("corrupt.bin");
+	WriteWholeFile(name, std::string("\xff\xff\xff\x7f"
+	                                 "abc",
+	                                 7));
+
+	FI_File file;
+	ASSERT_TRUE(file.Open(name, READ | BINARY));
+	EXPECT_EQ(Next<std::string>(file, "old"), "") << "no 2 GiB string was built; the call still returns true";
+	EXPECT_FALSE(file.Close()) << "the caller learns of the bad length at Close";
+
+	// GetFileSize counts from the read position and rewinds to the start.
+	ASSERT_TRUE(file.Open(name, READ | BINARY));
+	EXPECT_EQ(file.GetFileSize(), 7);
+	char bytes[3] = {};
+	EXPECT_TRUE(file.ReadData(bytes, 3));
+	EXPECT_EQ(file.GetFileSize(), 4);
+	EXPECT_TRUE(file.ReadData(bytes, 3));
+	EXPECT_EQ(std::string(bytes, 3), "\xff\xff\xff");
+	EXPECT_TRUE(file.Close());
+}
+
+TEST(FI_FileTest, OperationsWithoutTheirFlagAreRefusedAndTouchNothing)
 {
 	ScratchDir scratch;
 	const std::string name = scratch.File("flags.txt");
 	WriteWholeFile(name, "\"kept\" 5\n");
+	std::string text;
+	int number = 7;
+	char byte = 0;
 
 	FI_File reader;
 	ASSERT_TRUE(reader.Open(name, READ));
-	EXPECT_FALSE(reader.Write("x"));
-	EXPECT_FALSE(reader.WriteWord("x"));
-	EXPECT_FALSE(reader.Write(1));
-	EXPECT_FALSE(reader.Write(1.0f));
-	EXPECT_FALSE(reader.Write(1.0));
-	EXPECT_FALSE(reader.Flush());
-	char byte = 0;
+	EXPECT_FALSE(reader.Write("x") || reader.WriteWord("x") || reader.Write(1) || reader.Flush());
 	EXPECT_FALSE(reader.ReadData(&byte, 1)) << "raw reads need binary mode";
-	EXPECT_FALSE(reader.WriteData(&byte, 1));
-	std::string text;
 	EXPECT_TRUE(reader.Read(text));
 	EXPECT_EQ(text, "kept") << "the refused calls moved nothing";
 	EXPECT_TRUE(reader.Close());
@@ -241,16 +145,7 @@ TEST(FI_FileTest, OperationsWithoutTheirFlagDoNothing)
 
 	FI_File writer;
 	ASSERT_TRUE(writer.Open(name, WRITE));
-	int number = 7;
-	unsigned short shortNumber = 7;
-	float floatNumber = 7;
-	double doubleNumber = 7;
-	EXPECT_FALSE(writer.Read(number));
-	EXPECT_FALSE(writer.Read(shortNumber));
-	EXPECT_FALSE(writer.Read(floatNumber));
-	EXPECT_FALSE(writer.Read(doubleNumber));
-	EXPECT_FALSE(writer.Read(text));
-	EXPECT_FALSE(writer.ReadWord(text));
+	EXPECT_FALSE(writer.Read(number) || writer.Read(text) || writer.ReadWord(text));
 	EXPECT_FALSE(writer.WriteData("raw", 3)) << "text mode refuses raw bytes";
 	EXPECT_TRUE(writer.Close());
 	EXPECT_EQ(number, 7);
@@ -258,96 +153,59 @@ TEST(FI_FileTest, OperationsWithoutTheirFlagDoNothing)
 	EXPECT_EQ(ReadWholeFile(name), "") << "WriteData wrote nothing into the truncated file";
 
 	FI_File unopened;
-	EXPECT_FALSE(unopened.Write("x"));
-	EXPECT_FALSE(unopened.Read(text));
-	EXPECT_FALSE(unopened.NewLine());
+	EXPECT_FALSE(unopened.Write("x") || unopened.Read(text) || unopened.NewLine());
 }
 
-TEST(FI_FileTest, OpenReportsBadFlagsAndMissingFiles)
+TEST(FI_FileTest, OpenReportsBadFlagsAndUnopenableFiles)
 {
 	ScratchDir scratch;
-	FI_File file;
-	bool openedFlag = true;
-
-	EXPECT_EQ(OpenAndCaptureError(file, scratch.File("a.txt"), APPEND, openedFlag),
-	          "error: can't have append without read access.\n\n");
-	EXPECT_FALSE(openedFlag);
-	EXPECT_EQ(OpenAndCaptureError(file, scratch.File("a.txt"), READ | APPEND, openedFlag),
-	          "error: can't have append without read access.\n\n");
-	EXPECT_FALSE(openedFlag);
-	EXPECT_EQ(OpenAndCaptureError(file, scratch.File("a.txt"), 0, openedFlag),
-	          "error: must have at least read or write access.\n\n");
-	EXPECT_FALSE(openedFlag);
-	EXPECT_EQ(OpenAndCaptureError(file, scratch.File("a.txt"), BINARY, openedFlag),
-	          "error: must have at least read or write access.\n\n");
-	EXPECT_FALSE(openedFlag);
-	EXPECT_FALSE(std::filesystem::exists(scratch.File("a.txt")));
-
-	const std::string missing = scratch.File("missing.txt");
-	EXPECT_EQ(OpenAndCaptureError(file, missing, READ, openedFlag),
-	          "error: unable to open file:" + missing + "\n\n");
-	EXPECT_FALSE(openedFlag);
-	EXPECT_EQ(file.GetFlags(), 0);
-
 	WriteWholeFile(scratch.File("plain"), "x");
+	const std::string missing = scratch.File("missing.txt");
 	const std::string underFile = scratch.File("plain/log.txt");
-	EXPECT_EQ(OpenAndCaptureError(file, underFile, WRITE, openedFlag),
-	          "error: unable to open file:" + underFile + "\n\n");
-	EXPECT_FALSE(openedFlag);
-	EXPECT_FALSE(file.Write("lost")) << "nothing is written after a failed open";
+	const struct
+	{
+		std::string name;
+		int flags;
+		std::string error;
+	} cases[] = {
+	    {scratch.File("a.txt"), APPEND, "error: can't have append without read access.\n\n"},
+	    {scratch.File("a.txt"), READ | APPEND, "error: can't have append without read access.\n\n"},
+	    {scratch.File("a.txt"), 0, "error: must have at least read or write access.\n\n"},
+	    {scratch.File("a.txt"), BINARY, "error: must have at least read or write access.\n\n"},
+	    {missing, READ, "error: unable to open file:" + missing + "\n\n"},
+	    {underFile, WRITE, "error: unable to open file:" + underFile + "\n\n"},
+	};
+	for (const auto& test : cases)
+	{
+		FI_File file;
+		testing::internal::CaptureStderr();
+		EXPECT_FALSE(file.Open(test.name, test.flags)) << test.flags;
+		EXPECT_EQ(testing::internal::GetCapturedStderr(), test.error);
+		EXPECT_FALSE(file.Write("lost")) << "nothing is written after a failed open";
+	}
+	EXPECT_FALSE(std::filesystem::exists(scratch.File("a.txt")));
 }
 
-TEST(FI_FileTest, OpenResolvesCaseAndCreatesDirectoriesForWriting)
+TEST(FI_FileTest, OpenResolvesCaseCreatesDirectoriesAndAppends)
 {
 	ScratchDir scratch;
 	std::filesystem::create_directories(scratch.Path() / "data/Shaders");
 	WriteWholeFile(scratch.File("data/Shaders/x.fx"), "\"shader\"");
-
-	FI_File reader;
-	ASSERT_TRUE(reader.Open(scratch.File("DATA/shaders/X.FX"), READ));
+	FI_File file;
 	std::string text;
-	reader.Read(text);
+	ASSERT_TRUE(file.Open(scratch.File("DATA/shaders/X.FX"), READ));
+	EXPECT_TRUE(file.Read(text));
 	EXPECT_EQ(text, "shader");
 
-	FI_File writer;
-	ASSERT_TRUE(writer.Open(scratch.File("Data/shaders/Misc/new.txt"), WRITE));
-	writer.Write(5);
-	ASSERT_TRUE(writer.Close());
-	EXPECT_EQ(ReadWholeFile(scratch.File("data/Shaders/Misc/new.txt")), "5");
-}
-
-TEST(FI_FileTest, AppendKeepsWhatWasThere)
-{
-	ScratchDir scratch;
-	const std::string name = scratch.File("log.txt");
-	WriteWholeFile(name, "first\n");
-
-	FI_File file;
-	ASSERT_TRUE(file.Open(name, WRITE | APPEND));
-	file.WriteWord("second");
-	file.NewLine();
+	const std::string written = scratch.File("data/Shaders/Misc/new.txt");
+	ASSERT_TRUE(file.Open(scratch.File("Data/shaders/Misc/new.txt"), WRITE));
+	EXPECT_TRUE(file.WriteWord("first "));
 	ASSERT_TRUE(file.Close());
-	EXPECT_EQ(ReadWholeFile(name), "first\nsecond\n");
-
-	ASSERT_TRUE(file.Open(name, WRITE));
+	ASSERT_TRUE(file.Open(written, WRITE | APPEND));
+	EXPECT_TRUE(file.Write(5));
 	ASSERT_TRUE(file.Close());
-	EXPECT_EQ(ReadWholeFile(name), "") << "plain write truncates";
-}
-
-TEST(FI_FileTest, CloseReportsAFailedStream)
-{
-	ScratchDir scratch;
-	const std::string name = scratch.File("short.bin");
-	WriteWholeFile(name, "ab");
-
-	FI_File file;
-	ASSERT_TRUE(file.Open(name, READ | BINARY));
-	int value = 0;
-	EXPECT_TRUE(file.Read(value)) << "reading past the end still reports the call as done";
-	EXPECT_FALSE(file.Close());
-	EXPECT_FALSE(file.Close()) << "a second close has nothing open";
-
-	ASSERT_TRUE(file.Open(name, READ | BINARY)) << "reopening clears the failed state";
-	EXPECT_EQ(file.GetFileSize(), 2);
-	EXPECT_TRUE(file.Close());
+	EXPECT_EQ(ReadWholeFile(written), "first 5");
+	ASSERT_TRUE(file.Open(written, WRITE));
+	ASSERT_TRUE(file.Close());
+	EXPECT_EQ(ReadWholeFile(written), "") << "plain write truncates";
 }
