@@ -6,182 +6,117 @@
 
 #include "XMLTestFixture.h"
 
-namespace
-{
-const char* const ourGraphText = R"(<?xml version="1.0" ?>
-<root>
-	<node-graph>
-		<nodes number-of-nodes="3">
-			<node id="1" />
-			<node id="2" />
-			<node id="5" />
-		</nodes>
-		<edges number-of-edges="0" />
-	</node-graph>
-</root>
-)";
-}
-
-class XMLCursorOpsTest : public XMLFixture
-{
-protected:
-	void SetUp() override
-	{
-		XMLFixture::SetUp();
-		myPath = WriteDocument("nodegraph.xml", ourGraphText);
-	}
-
-	std::string myPath;
-};
-
-TEST_F(XMLCursorOpsTest, PushAndPopReturnToSavedPositions)
+TEST_F(XMLFixture, PushPopAndGoToLastChildMoveBetweenPositions)
 {
 	XML xml(myPath);
-	ASSERT_TRUE(xml.GoToElement("node-graph", "nodes", ""));
+	ASSERT_TRUE(xml.GoToElement("lights", "", ""));
 	xml.PushElement();
-	ASSERT_TRUE(xml.EnterChild("node"));
+	xml.GoToLastChild();
+	EXPECT_EQ(xml.GetAttribute<int>("id"), 2);
 	xml.PushElement();
-	ASSERT_TRUE(xml.GoToNextSibling("node"));
+	xml.GoToLastChild();
+	EXPECT_EQ(xml.GetElementName(), "angles");
+	xml.GoToLastChild(); // none: reported, the cursor stays
+	EXPECT_EQ(xml.GetElementName(), "angles");
+	xml.PopElement();
 	EXPECT_EQ(xml.GetAttribute<int>("id"), 2);
 	xml.PopElement();
-	EXPECT_EQ(xml.GetAttribute<int>("id"), 1);
-	xml.PopElement();
-	EXPECT_EQ(xml.GetElementName(), "nodes");
-	EXPECT_EQ(ReportCount(), 0);
-
-	xml.PopElement();
-	EXPECT_NE(Log().find("Stack is empty!\n"), std::string::npos);
-	EXPECT_EQ(xml.GetElementName(), "nodes");
+	EXPECT_EQ(xml.GetElementName(), "lights");
+	xml.PopElement(); // the stack is empty: reported, the cursor stays
+	EXPECT_EQ(xml.GetElementName(), "lights");
 
 	// With the cursor null after a walk, the push keeps the last record visited.
-	ASSERT_TRUE(xml.EnterChild("node"));
-	while (xml.GoToNextSibling("node"))
-	{
-	}
+	ASSERT_TRUE(xml.EnterChild("light"));
+	EXPECT_TRUE(xml.GoToNextSibling("light"));
+	EXPECT_FALSE(xml.GoToNextSibling("light"));
 	xml.PushElement();
-	ASSERT_TRUE(xml.GoToElement("node-graph", "", ""));
+	ASSERT_TRUE(xml.GoToElement("bare", "", ""));
 	xml.PopElement();
-	EXPECT_EQ(xml.GetAttribute<int>("id"), 5);
-	EXPECT_EQ(ReportCount(), 1);
-}
-
-TEST_F(XMLCursorOpsTest, GoToLastChildAndGetElementName)
-{
-	XML xml(myPath);
-	xml.GetElementName();
-	EXPECT_NE(Log().find("No node set to get name from"), std::string::npos);
-
-	ASSERT_TRUE(xml.GoToElement("node-graph", "nodes", ""));
-	xml.GoToLastChild();
-	EXPECT_EQ(xml.GetElementName(), "node");
-	EXPECT_EQ(xml.GetAttribute<int>("id"), 5);
-	xml.GoToLastChild();
-	EXPECT_NE(Log().find("Node doesn't have a child"), std::string::npos);
-	EXPECT_EQ(xml.GetAttribute<int>("id"), 5);
+	EXPECT_EQ(xml.GetAttribute<int>("id"), 2);
 	EXPECT_EQ(ReportCount(), 2);
 }
 
-TEST_F(XMLCursorOpsTest, RemoveCurrentElementDeletesItAndForgetsPositionsInside)
+TEST_F(XMLFixture, RemovalForgetsPositionsInsideTheRemovedNodes)
 {
 	XML xml(myPath);
-	xml.RemoveCurrentElement();
-	EXPECT_NE(Log().find("No node set to remove"), std::string::npos);
-
-	ASSERT_TRUE(xml.GoToElement("node-graph", "nodes", "node"));
-	ASSERT_TRUE(xml.GoToNextSibling("node"));
+	ASSERT_TRUE(xml.GoToElement("lights", "light", ""));
 	xml.PushElement();
 	xml.RemoveCurrentElement();
 	EXPECT_FALSE(xml.EnterChild(""));
-	// The pushed position died with the node: popping it gives no cursor, not a dangling one.
-	xml.PopElement();
-	xml.GetElementName();
-	EXPECT_NE(Log().find("No node set to get name from"), std::string::npos);
-	EXPECT_EQ(ReportCount(), 2);
+	xml.PopElement(); // the pushed position died with the node: no cursor, not a dangling one
+	EXPECT_EQ(xml.GetElementName(), "");
+	EXPECT_TRUE(Logged("No node set to get name from"));
 
 	// The same holds for positions under a section whose children are removed.
-	ASSERT_TRUE(xml.GoToElement("node-graph", "nodes", "node"));
+	ASSERT_TRUE(xml.GoToElement("lights", "light", ""));
+	EXPECT_EQ(xml.GetAttribute<int>("id"), 2);
 	xml.PushElement();
-	ASSERT_TRUE(xml.GoToElement("node-graph", "nodes", ""));
+	ASSERT_TRUE(xml.GoToElement("lights", "", ""));
 	xml.RemoveChildren();
-	EXPECT_EQ(xml.GetAttribute<int>("number-of-nodes"), 3);
+	EXPECT_FALSE(xml.EnterChild(""));
 	xml.PopElement();
 	xml.ExitChild();
-	EXPECT_NE(Log().find("Could not find element [] in [" + myPath + "]"), std::string::npos);
-
-	ASSERT_TRUE(xml.GoToElement("node-graph", "", ""));
-	xml.SaveFile();
-	XML reread(myPath);
-	ASSERT_TRUE(reread.GoToElement("node-graph", "nodes", ""));
-	EXPECT_FALSE(reread.EnterChild("node"));
-	ASSERT_TRUE(reread.GoToElement("node-graph", "edges", ""));
+	EXPECT_TRUE(Logged("Could not find element [] in [" + myPath + "]"));
+	EXPECT_EQ(ReportCount(), 2);
 }
 
-TEST_F(XMLCursorOpsTest, InsertElementAtRootKeepsTheCursor)
+TEST_F(XMLFixture, InsertElementAtRootAppendsToRootAndKeepsTheCursor)
 {
 	XML xml(myPath);
-	ASSERT_TRUE(xml.GoToElement("node-graph", "nodes", ""));
+	ASSERT_TRUE(xml.GoToElement("lights", "light", ""));
 	XMLElement decals("decals");
 	xml.InsertElementAtRoot(decals, true);
-	EXPECT_EQ(xml.GetElementName(), "nodes");
-	EXPECT_EQ(ReportCount(), 0);
-
+	EXPECT_EQ(xml.GetAttribute<int>("id"), 1);
 	XML reread(myPath);
-	EXPECT_TRUE(reread.GoToElement("decals", "", ""));
-	ASSERT_TRUE(reread.GoToElement("node-graph", "", ""));
+	ASSERT_TRUE(reread.GoToElement("bare", "", ""));
 	reread.ExitChild();
 	reread.GoToLastChild();
 	EXPECT_EQ(reread.GetElementName(), "decals");
+	EXPECT_EQ(ReportCount(), 0);
 
 	const std::string otherRoot = WriteDocument("other.xml", "<level><a /></level>");
-	XML other(otherRoot);
-	other.InsertElementAtRoot(decals, false);
-	EXPECT_NE(Log().find("Could not insert element [decals] in file [" + otherRoot + "]"), std::string::npos);
+	XML(otherRoot).InsertElementAtRoot(decals, true);
+	EXPECT_TRUE(Logged("Could not insert element [decals] in file [" + otherRoot + "]"));
+	EXPECT_EQ(TestSupport::ReadWholeFile(otherRoot).find("decals"), std::string::npos);
 }
 
-TEST_F(XMLCursorOpsTest, CreateEmptyDocumentReplacesTheFile)
+TEST_F(XMLFixture, CreateEmptyDocumentReplacesTheFileWithAnEmptyRoot)
 {
 	XML xml(myPath);
 	xml.CreateEmptyDocument();
-	EXPECT_EQ(ReportCount(), 0);
-	EXPECT_FALSE(xml.GoToElement("node-graph", "", ""));
 	EXPECT_FALSE(xml.GoToElement("", "", ""));
-	XMLElement section("lights");
-	xml.InsertElementAtRoot(section, true);
-
+	xml.InsertElementAtRoot(XMLElement("sounds"), true);
 	XML reread(myPath);
-	ASSERT_TRUE(reread.GoToElement("lights", "", ""));
+	ASSERT_TRUE(reread.GoToElement("sounds", "", ""));
 	reread.ExitChild();
 	EXPECT_EQ(reread.GetElementName(), "root");
-	EXPECT_EQ(TestSupport::ReadWholeFile(myPath).find("node-graph"), std::string::npos);
+	EXPECT_EQ(TestSupport::ReadWholeFile(myPath).find("lights"), std::string::npos);
+	EXPECT_EQ(ReportCount(), 0);
 }
 
-TEST_F(XMLCursorOpsTest, CopyDocumentWritesTheSameDocumentElsewhere)
+TEST_F(XMLFixture, CopyDocumentWritesTheDocumentInMemoryElsewhere)
 {
 	XML xml(myPath);
-	ASSERT_TRUE(xml.GoToElement("node-graph", "edges", ""));
+	ASSERT_TRUE(xml.GoToElement("bare", "", ""));
 	xml.RemoveCurrentElement();
-	const std::string copy = myScratch.File("copies/nodegraph-copy.xml");
+	const std::string copy = myScratch.File("copies/lights-copy.xml");
 	xml.CopyDocument(copy);
-	EXPECT_EQ(ReportCount(), 0);
-	// The copy holds the document as it is in memory; the original file is not touched.
-	EXPECT_NE(TestSupport::ReadWholeFile(myPath).find("edges"), std::string::npos);
+	EXPECT_EQ(TestSupport::ReadWholeFile(myPath), ourLightsText);
 	const std::string copied = TestSupport::ReadWholeFile(copy);
-	EXPECT_EQ(copied.find("edges"), std::string::npos);
-	EXPECT_NE(copied.find("<node id=\"5\" />"), std::string::npos);
-
-	// A target below a regular file cannot be created.
-	const std::string blocked = WriteDocument("blocker", "not a directory") + "/copy.xml";
-	xml.CopyDocument(blocked);
-	EXPECT_NE(Log().find("Couldn't copy document [" + myPath + "] to [" + blocked + "]"), std::string::npos);
-	EXPECT_EQ(ReportCount(), 1);
+	EXPECT_EQ(copied.find("bare"), std::string::npos);
+	EXPECT_NE(copied.find("<falloff v=\"0.5\" />"), std::string::npos);
+	EXPECT_EQ(ReportCount(), 0);
 }
 
-TEST_F(XMLCursorOpsTest, ElementAttributeSetsUseTheirComponentNames)
+TEST_F(XMLFixture, ElementAttributeSetsUseTheirComponentNames)
 {
-	XMLElement vectors("vectors");
-	vectors.AddVector3Attributes(Vector3<float>(1.0f, 2.0f, 3.0f));
+	XMLElement holder("holder");
+	XMLElement vector("vector");
+	vector.AddVector3Attributes(Vector3<float>(1.0f, 2.0f, 3.0f));
+	holder.InsertElement(vector);
 	XMLElement colour("colour");
 	colour.AddVector4Attributes(Vector4<float>(0.25f, 0.5f, 0.75f, 1.5f));
+	holder.InsertElement(colour);
 	Matrix44<float> matrix;
 	for (int i = 0; i < 16; ++i)
 	{
@@ -189,38 +124,23 @@ TEST_F(XMLCursorOpsTest, ElementAttributeSetsUseTheirComponentNames)
 	}
 	XMLElement transform("transform");
 	transform.AddMatrixAttributes(matrix);
-	XMLElement holder("holder");
-	holder.InsertElement(vectors);
-	holder.InsertElement(colour);
 	holder.InsertElement(transform);
-	XML xml(myPath);
-	xml.InsertElementAtRoot(holder, true);
+	XML(myPath).InsertElementAtRoot(holder, true);
 
 	XML reread(myPath);
 	ASSERT_TRUE(reread.GoToElement("holder", "", ""));
-	const Vector3<float> vector = reread.GetVector3Attribute("vectors");
-	EXPECT_EQ(vector.x, 1.0f);
-	EXPECT_EQ(vector.y, 2.0f);
-	EXPECT_EQ(vector.z, 3.0f);
-	const Vector4<float> colourRead = reread.GetVector4Attribute("colour");
-	EXPECT_EQ(colourRead.x, 0.25f);
-	EXPECT_EQ(colourRead.y, 0.5f);
-	EXPECT_EQ(colourRead.z, 0.75f);
-	EXPECT_EQ(colourRead.w, 1.5f);
-
-	const char* const names[12] = {"r-x", "r-y", "r-z", "u-x", "u-y", "u-z",
-	                               "f-x", "f-y", "f-z", "p-x", "p-y", "p-z"};
+	EXPECT_EQ(Components(reread.GetVector3Attribute("vector")), (std::vector<float>{1, 2, 3}));
+	EXPECT_EQ(Components(reread.GetVector4Attribute("colour")),
+	          (std::vector<float>{0.25f, 0.5f, 0.75f, 1.5f}));
 	ASSERT_TRUE(reread.GoToElement("holder", "transform", ""));
+	// Rows right, up, forward, position; the fourth column is not written.
+	const char* const names[] = {"r-x", "r-y", "r-z", "u-x", "u-y", "u-z",
+	                             "f-x", "f-y", "f-z", "p-x", "p-y", "p-z"};
 	for (int i = 0; i < 12; ++i)
 	{
-		const int component = (i / 3) * 4 + i % 3;
-		EXPECT_EQ(reread.GetAttribute<float>(names[i]), static_cast<float>(component) + 0.5f) << names[i];
+		EXPECT_EQ(reread.GetAttribute<float>(names[i]), static_cast<float>((i / 3) * 4 + i % 3) + 0.5f)
+		    << names[i];
 	}
 	EXPECT_EQ(ReportCount(), 0);
-	// The fourth column is not written.
-	const std::string saved = TestSupport::ReadWholeFile(myPath);
-	for (const char* fourthColumn : {"\"3.5\"", "\"7.5\"", "\"11.5\"", "\"15.5\""})
-	{
-		EXPECT_EQ(saved.find(fourthColumn), std::string::npos) << fourthColumn;
-	}
+	EXPECT_EQ(TestSupport::ReadWholeFile(myPath).find("\"15.5\""), std::string::npos);
 }
