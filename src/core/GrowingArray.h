@@ -96,33 +96,11 @@ public:
 
 	void Add(const T& anObject)
 	{
-		if (myCurNrOfItems == myMaxNrOfItems)
+		// The common case stays small enough to inline into the caller's loop;
+		// growth is rare and lives out of line.
+		if (myCurNrOfItems == myMaxNrOfItems) [[unlikely]]
 		{
-			const int limit = std::numeric_limits<CountType>::max();
-			const int wanted = static_cast<int>(myMaxNrOfItems) + myItemIncreaseSize;
-			if (static_cast<int>(myCurNrOfItems) + 1 > limit)
-			{
-				// Wrapping the count would corrupt every index the owner holds. With a
-				// non-fatal log the element is refused and the array stays as it was.
-				GrowingArrayDetail::ReportCapacityOverflow(static_cast<int>(myCurNrOfItems) + 1, limit);
-				return;
-			}
-			// Near the top of the range the last step is cut to what the counter can hold;
-			// a step of 0 (an owner's mistake) still makes room for the one element.
-			int newSize = wanted > limit ? limit : wanted;
-			if (newSize <= static_cast<int>(myCurNrOfItems))
-			{
-				newSize = myCurNrOfItems + 1;
-			}
-			// anObject may be one of our own elements (Add(array[i]), Add(array.Last())):
-			// the growth frees the storage it lives in, so read it from its new place.
-			const T* object = &anObject;
-			const bool ownElementFlag = !std::less<const T*>()(object, myData) &&
-			                            std::less<const T*>()(object, myData + myCurNrOfItems);
-			const std::ptrdiff_t ownIndex = ownElementFlag ? object - myData : 0;
-			ReSize(newSize);
-			myData[myCurNrOfItems] = ownElementFlag ? myData[ownIndex] : anObject;
-			++myCurNrOfItems;
+			GrowAndAdd(anObject);
 			return;
 		}
 		myData[myCurNrOfItems] = anObject;
@@ -191,6 +169,35 @@ public:
 	const T* end() const { return myData + myCurNrOfItems; }
 
 private:
+	void GrowAndAdd(const T& anObject)
+	{
+		const int limit = std::numeric_limits<CountType>::max();
+		if (static_cast<int>(myCurNrOfItems) + 1 > limit)
+		{
+			// Wrapping the count would corrupt every index the owner holds. With a
+			// non-fatal log the element is refused and the array stays as it was.
+			GrowingArrayDetail::ReportCapacityOverflow(static_cast<int>(myCurNrOfItems) + 1, limit);
+			return;
+		}
+		// Near the top of the range the last step is cut to what the counter can hold;
+		// a step of 0 (an owner's mistake) still makes room for the one element.
+		const int wanted = static_cast<int>(myMaxNrOfItems) + myItemIncreaseSize;
+		int newSize = wanted > limit ? limit : wanted;
+		if (newSize <= static_cast<int>(myCurNrOfItems))
+		{
+			newSize = myCurNrOfItems + 1;
+		}
+		// anObject may be one of our own elements (Add(array[i]), Add(array.Last())):
+		// the growth frees the storage it lives in, so read it from its new place.
+		const T* object = &anObject;
+		const bool ownElementFlag =
+		    !std::less<const T*>()(object, myData) && std::less<const T*>()(object, myData + myCurNrOfItems);
+		const std::ptrdiff_t ownIndex = ownElementFlag ? object - myData : 0;
+		ReSize(newSize);
+		myData[myCurNrOfItems] = ownElementFlag ? myData[ownIndex] : anObject;
+		++myCurNrOfItems;
+	}
+
 	T* myData;
 	CountType myMaxNrOfItems = 0;
 	CountType myCurNrOfItems = 0;
