@@ -12,6 +12,10 @@ PACKAGES=(
 	libtinyxml-dev
 	# tests and benchmarks
 	googletest libgtest-dev libbenchmark-dev
+	# the libFuzzer build of the file readers (cmake -DLUMORA_FUZZ=ON with clang)
+	clang
+	# GPU layer: OpenGL through libepoxy on EGL, Mesa's llvmpipe for headless runs, PNG output
+	libepoxy-dev libegl-dev libgl1-mesa-dri libegl-mesa0 libpng-dev
 )
 
 missing=()

@@ -1,0 +1,34 @@
+#pragma once
+// Report: how the GPU layer reaches the engine's log, and its debug-build GL checks.
+//
+//   Gpu::ReportError(__LINE__, "Gpu::Texture::Init", "Unsupported format %u", aFormat);
+//   glTextureStorage2D(...);
+//   LUMORA_GL_CHECK("Gpu::Texture::Init");
+//
+// The platform layer sits below the engine, so reports travel through CoreReport,
+// which the engine's Debug log forwards into its log file (standard error when no
+// log exists). Debug builds read glGetError after the checked calls; release
+// builds compile the checks away.
+
+#include <epoxy/gl.h>
+#include <string>
+
+namespace Gpu
+{
+void ReportError(int aLine, const char* aFunctionName, const char* aFormat, ...)
+    __attribute__((format(printf, 3, 4)));
+
+#ifdef NDEBUG
+inline void CheckGlErrors(int, const char*)
+{
+}
+#else
+// Drains glGetError and reports every error with the caller's function and line.
+void CheckGlErrors(int aLine, const char* aFunctionName);
+#endif
+
+// Names a GL object for debuggers; a no-op when the label is empty.
+void LabelObject(GLenum anIdentifier, GLuint aName, const std::string& aLabel);
+} // namespace Gpu
+
+#define LUMORA_GL_CHECK(functionName) Gpu::CheckGlErrors(__LINE__, functionName)

@@ -1,0 +1,77 @@
+#include "platform/gpu/Readback.h"
+
+#include "GpuTest.h"
+
+namespace
+{
+using FramebufferCacheTest = GpuTest;
+
+TEST_F(FramebufferCacheTest, SameViewsShareOneFramebuffer)
+{
+	Gpu::Texture* first = MakeTarget(DxgiFormat::Rgba8, 16, 16);
+	Gpu::Texture* second = MakeTarget(DxgiFormat::Rgba16Float, 16, 16);
+	Gpu::Texture* depth = MakeTarget(DxgiFormat::D24S8, 16, 16);
+	ASSERT_TRUE(first && second && depth);
+	Gpu::RenderTargetView* a = first->CreateRenderTargetView();
+	Gpu::RenderTargetView* b = second->CreateRenderTargetView();
+	Gpu::DepthStencilView* d = depth->CreateDepthStencilView();
+	Gpu::FramebufferCache& cache = GetContext().GetFramebufferCache();
+
+	Gpu::RenderTargetView* const one[] = {a};
+	Gpu::RenderTargetView* const two[] = {a, b};
+	Gpu::RenderTargetView* const swapped[] = {b, a};
+	const GLuint justA = cache.Get(one, nullptr);
+	ASSERT_NE(justA, 0u);
+	EXPECT_EQ(cache.Get(one, nullptr), justA);
+	const GLuint withDepth = cache.Get(two, d);
+	EXPECT_NE(withDepth, justA);
+	EXPECT_NE(cache.Get(swapped, d), withDepth); // slots matter, not just the set
+	EXPECT_EQ(cache.Get(two, d), withDepth);
+	EXPECT_EQ(cache.GetEntryCount(), 3u);
+
+	ASSERT_TRUE(GetContext().SetRenderTargets(two, d));
+	GLint bound = 0;
+	glGetIntegerv(GL_DRAW_FRAMEBUFFER_BINDING, &bound);
+	EXPECT_EQ(static_cast<GLuint>(bound), withDepth);
+
+	// Destroying b drops both framebuffers that use it, and GL's binding with them.
+	second->DestroyView(b);
+	EXPECT_EQ(cache.GetEntryCount(), 1u);
+	EXPECT_EQ(GetContext().GetStateCache().GetDrawFramebuffer(), 0u);
+}
+
+// GL reuses texture names; a view made where a destroyed one was must get a
+// framebuffer that really draws into it.
+TEST_F(FramebufferCacheTest, RecreatedViewNeverFindsAStaleFramebuffer)
+{
+	Gpu::Texture* first = MakeTarget(DxgiFormat::Rgba8, 8, 8);
+	ASSERT_NE(first, nullptr);
+	Gpu::RenderTargetView* old = first->CreateRenderTargetView();
+	const GLuint oldName = old->GetName();
+	const uint64_t oldId = old->GetUniqueId();
+	const float red[4] = {1, 0, 0, 1};
+	GetContext().ClearRenderTargetView(*old, red);
+	Gpu::FramebufferCache& cache = GetContext().GetFramebufferCache();
+	EXPECT_EQ(cache.GetEntryCount(), 1u);
+	first->DestroyView(old);
+	EXPECT_EQ(cache.GetEntryCount(), 0u);
+
+	Gpu::RenderTargetView* fresh = first->CreateRenderTargetView();
+	EXPECT_NE(fresh->GetUniqueId(), oldId);
+	const float green[4] = {0, 1, 0, 1};
+	GetContext().ClearRenderTargetView(*fresh, green);
+	Gpu::RenderTargetView* const views[] = {fresh};
+	const GLuint framebuffer = cache.Get(views, nullptr);
+	GLint attached = 0;
+	glGetNamedFramebufferAttachmentParameteriv(framebuffer, GL_COLOR_ATTACHMENT0,
+	                                           GL_FRAMEBUFFER_ATTACHMENT_OBJECT_NAME, &attached);
+	EXPECT_EQ(static_cast<GLuint>(attached), fresh->GetName());
+	std::vector<uint8_t> pixels;
+	ASSERT_TRUE(Gpu::ReadRenderTarget(GetContext(), *fresh, pixels));
+	EXPECT_EQ(pixels[0], 0);
+	EXPECT_EQ(pixels[1], 255);
+	// Whether or not GL handed out the old name again, the cache held one entry.
+	EXPECT_EQ(cache.GetEntryCount(), 1u);
+	(void)oldName;
+}
+} // namespace

@@ -1,0 +1,104 @@
+#include "platform/gpu/Readback.h"
+
+#include <cstdlib>
+#include <filesystem>
+#include <png.h>
+
+#include "GpuTest.h"
+#include "support/TestSupport.h"
+
+namespace
+{
+using ReadbackTest = GpuTest;
+
+std::vector<uint8_t> ReadPng(const std::string& aPath, int& aWidth, int& aHeight)
+{
+	png_image image{};
+	image.version = PNG_IMAGE_VERSION;
+	if (!png_image_begin_read_from_file(&image, aPath.c_str()))
+	{
+		return {};
+	}
+	image.format = PNG_FORMAT_RGBA;
+	std::vector<uint8_t> pixels(PNG_IMAGE_SIZE(image));
+	if (!png_image_finish_read(&image, nullptr, pixels.data(), 0, nullptr))
+	{
+		return {};
+	}
+	aWidth = static_cast<int>(image.width);
+	aHeight = static_cast<int>(image.height);
+	return pixels;
+}
+
+// A picture worth looking at: four quadrants cleared through per-quadrant copies,
+// so orientation mistakes show (red must be top left).
+TEST_F(ReadbackTest, RenderedTargetSurvivesAPngRoundTrip)
+{
+	Gpu::Texture* picture = MakeTarget(DxgiFormat::Rgba8, 64, 32);
+	Gpu::Texture* tile = MakeTarget(DxgiFormat::Rgba8, 32, 16);
+	ASSERT_TRUE(picture && tile);
+	Gpu::RenderTargetView* tileView = tile->CreateRenderTargetView();
+	const float colors[4][4] = {{1, 0, 0, 1}, {0, 1, 0, 1}, {0, 0, 1, 1}, {1, 1, 1, 1}};
+	for (int quadrant = 0; quadrant < 4; ++quadrant)
+	{
+		GetContext().ClearRenderTargetView(*tileView, colors[quadrant]);
+		ASSERT_TRUE(GetContext().CopySubresourceRegion(*picture, 0, 0, (quadrant % 2) * 32,
+		                                               (quadrant / 2) * 16, 0, *tile, 0, 0));
+	}
+	std::vector<uint8_t> pixels;
+	ASSERT_TRUE(Gpu::ReadRenderTarget(GetContext(), *picture->CreateRenderTargetView(), pixels));
+	EXPECT_EQ(pixels[0], 255); // top left red
+	EXPECT_EQ(pixels[1], 0);
+
+	TestSupport::ScratchDir scratch;
+	const std::string path = scratch.File("shots/quadrants.png");
+	ASSERT_TRUE(Gpu::SavePng(path, 64, 32, pixels.data()));
+	if (const char* keep = std::getenv("LUMORA_KEEP_TEST_PNG"))
+	{
+		EXPECT_TRUE(Gpu::SavePng(keep, 64, 32, pixels.data()));
+	}
+	int width = 0;
+	int height = 0;
+	const std::vector<uint8_t> decoded = ReadPng(path, width, height);
+	EXPECT_EQ(width, 64);
+	EXPECT_EQ(height, 32);
+	EXPECT_EQ(decoded, pixels);
+	size_t files = 0;
+	for (const auto& entry : std::filesystem::directory_iterator(scratch.Path() / "shots"))
+	{
+		EXPECT_EQ(entry.path().filename(), "quadrants.png");
+		++files;
+	}
+	EXPECT_EQ(files, 1u);
+
+	EXPECT_FALSE(Gpu::SavePng("/proc/lumora/none.png", 64, 32, pixels.data()));
+	EXPECT_FALSE(Gpu::SavePng(path, 0, 32, pixels.data()));
+	EXPECT_EQ(TakeReports().size(), 2u);
+}
+
+TEST_F(ReadbackTest, FloatTargetsReadBackAsFloats)
+{
+	// Values a half float holds exactly, beyond 0..1 both ways.
+	const float color[4] = {0.25f, -2.0f, 1000.0f, 1.0f};
+	for (const uint32_t format : {DxgiFormat::Rgba16Float, DxgiFormat::Rgba32Float})
+	{
+		SCOPED_TRACE(format);
+		Gpu::Texture* target = MakeTarget(format, 4, 4);
+		ASSERT_NE(target, nullptr);
+		Gpu::RenderTargetView* view = target->CreateRenderTargetView();
+		GetContext().ClearRenderTargetView(*view, color);
+		std::vector<float> values;
+		ASSERT_TRUE(Gpu::ReadRenderTarget(GetContext(), *view, values));
+		ASSERT_EQ(values.size(), 64u);
+		for (size_t i = 0; i < values.size(); ++i)
+		{
+			ASSERT_EQ(values[i], color[i % 4]) << i;
+		}
+		std::vector<uint8_t> bytes;
+		EXPECT_FALSE(Gpu::ReadRenderTarget(GetContext(), *view, bytes));
+	}
+	const std::vector<std::string> reports = TakeReports();
+	ASSERT_EQ(reports.size(), 2u);
+	EXPECT_NE(reports[0].find("Format 10 is not an 8-bit RGBA target"), std::string::npos) << reports[0];
+}
+} // namespace
