@@ -15,11 +15,14 @@ const char* SanitizerName()
 	return "none";
 #endif
 }
-}
+} // namespace
 
 namespace Lumora
 {
-const char* GetVersion() { return LUMORA_VERSION; }
+const char* GetVersion()
+{
+	return LUMORA_VERSION;
+}
 
 std::string GetBuildInfo()
 {
@@ -28,10 +31,12 @@ std::string GetBuildInfo()
 	info += SanitizerName();
 	info += "\nsubsystems:\n";
 	info += "  core      GrowingArray, Vector2/3/4, Matrix33/44, Intersection (Sphere, AABB, Ray)\n";
-	info += "  engine    Debug log with fatal reports, FI_File typed text/binary stream\n";
-	info += "  xml       XML cursor and XMLElement builder on TinyXML " + std::to_string(TIXML_MAJOR_VERSION) +
-	        "." + std::to_string(TIXML_MINOR_VERSION) + "." + std::to_string(TIXML_PATCH_VERSION) + "\n";
-	info += "  platform  paths (case-insensitive lookup, atomic replace), stacktrace (GCC libbacktrace)\n";
+	info += "  engine    Debug log with fatal reports, FI_File typed text/binary stream, Camera\n";
+	info += "  xml       XML cursor and XMLElement builder on TinyXML " +
+	        std::to_string(TIXML_MAJOR_VERSION) + "." + std::to_string(TIXML_MINOR_VERSION) + "." +
+	        std::to_string(TIXML_PATCH_VERSION) + "\n";
+	info += "  platform  paths (case-insensitive lookup, atomic replace), stacktrace (GCC libbacktrace),\n"
+	        "            DDS files, GPU layer (OpenGL 4.5 core through libepoxy on EGL)\n";
 	return info;
 }
-}
+} // namespace Lumora

@@ -1,8 +1,28 @@
-// lumora: headless jobs on a level. This first version tells what the build holds.
+// lumora: headless jobs on a level. This first version tells what the build holds
+// and whether this machine gives it an OpenGL 4.5 core context.
 #include <cstdio>
 #include <cstring>
 
 #include "lumora.h"
+#include "platform/gpu/Device.h"
+
+namespace
+{
+// Starts the headless device once, the way the bakes and renders will, and says
+// what the driver is; a machine without GL is told, not a failure of the tool.
+void PrintGpu()
+{
+	Gpu::Device device;
+	if (!device.Init(16, 16))
+	{
+		std::printf("gpu:        no OpenGL 4.5 core context on this machine (see the message above)\n");
+		return;
+	}
+	std::printf("gpu:        %s, OpenGL %s, %s\n", device.GetRendererName().c_str(),
+	            device.GetVersionName().c_str(), device.IsSurfaceless() ? "EGL surfaceless" : "EGL pbuffer");
+	device.Destroy();
+}
+} // namespace
 
 int main(int argc, char** argv)
 {
@@ -17,5 +37,6 @@ int main(int argc, char** argv)
 		return 2;
 	}
 	std::printf("Lumora %s\n%s", Lumora::GetVersion(), Lumora::GetBuildInfo().c_str());
+	PrintGpu();
 	return 0;
 }

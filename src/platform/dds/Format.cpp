@@ -21,6 +21,8 @@ constexpr Facts GetFacts(Format aFormat)
 		return {"UNKNOWN", 0, false, false};
 	case Format::R32G32B32A32_FLOAT:
 		return {"R32G32B32A32_FLOAT", 16, false, false};
+	case Format::R32G32B32_FLOAT:
+		return {"R32G32B32_FLOAT", 12, false, false};
 	case Format::R16G16B16A16_FLOAT:
 		return {"R16G16B16A16_FLOAT", 8, false, false};
 	case Format::R16G16B16A16_UNORM:

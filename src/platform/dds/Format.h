@@ -20,6 +20,7 @@ enum class Format : uint32_t
 {
 	UNKNOWN = 0,
 	R32G32B32A32_FLOAT = 2,
+	R32G32B32_FLOAT = 6, // vertex positions
 	R16G16B16A16_FLOAT = 10,
 	R16G16B16A16_UNORM = 11,
 	R32G32_FLOAT = 16,

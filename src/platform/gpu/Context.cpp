@@ -1,7 +1,9 @@
 #include "platform/gpu/Context.h"
 
+#include "platform/gpu/Buffer.h"
 #include "platform/gpu/Formats.h"
 #include "platform/gpu/Report.h"
+#include "platform/gpu/SamplerState.h"
 #include "platform/gpu/Texture.h"
 
 namespace Gpu
@@ -14,6 +16,32 @@ bool CopyCompatible(const Texture& aDestination, const Texture& aSource)
 	const FormatInfo source = GetFormatInfo(aSource.GetDesc().myFormat);
 	return destination.myBlockBytes == source.myBlockBytes && destination.myBlockSize == source.myBlockSize &&
 	       destination.myDepthFlag == source.myDepthFlag;
+}
+
+constexpr GLenum ToGlTopology(PrimitiveTopology aTopology)
+{
+	switch (aTopology)
+	{
+	case PrimitiveTopology::TriangleList:
+		return GL_TRIANGLES;
+	case PrimitiveTopology::TriangleStrip:
+		return GL_TRIANGLE_STRIP;
+	case PrimitiveTopology::LineList:
+		return GL_LINES;
+	}
+	return GL_TRIANGLES;
+}
+
+constexpr uint32_t IndexBytes(IndexFormat aFormat)
+{
+	switch (aFormat)
+	{
+	case IndexFormat::UInt16:
+		return 2;
+	case IndexFormat::UInt32:
+		return 4;
+	}
+	return 4;
 }
 } // namespace
 
@@ -29,12 +57,22 @@ void Context::Init()
 	glPixelStorei(GL_PACK_ALIGNMENT, 1);
 	myStateCache.Reset();
 	myFramebufferCache.Init(myStateCache);
+	glCreateVertexArrays(1, &myEmptyVertexArray);
+	LabelObject(GL_VERTEX_ARRAY, myEmptyVertexArray, "no input layout");
 	LUMORA_GL_CHECK("Gpu::Context::Init");
 }
 
 void Context::Destroy()
 {
 	myFramebufferCache.Destroy();
+	myStateCache.BindVertexArray(0);
+	myStateCache.UseProgram(0);
+	myInputLayout = nullptr;
+	if (myEmptyVertexArray != 0)
+	{
+		glDeleteVertexArrays(1, &myEmptyVertexArray);
+		myEmptyVertexArray = 0;
+	}
 	myStateCache.BindDrawFramebuffer(0);
 	myStateCache.BindReadFramebuffer(0);
 }
@@ -59,7 +97,7 @@ void Context::ClearRenderTargetView(const RenderTargetView& aView, const float a
 	{
 		return;
 	}
-	myStateCache.SetColorWriteFlag(true);
+	myStateCache.SetColorWriteMask(ColorWrite::All);
 	myStateCache.SetScissorTestFlag(false);
 	glClearNamedFramebufferfv(framebuffer, GL_COLOR, 0, aColor);
 	LUMORA_GL_CHECK("Gpu::Context::ClearRenderTargetView");
@@ -105,7 +143,8 @@ bool Context::CopyResource(Texture& aDestination, const Texture& aSource)
 	{
 		ReportError(__LINE__, "Gpu::Context::CopyResource",
 		            "Cannot copy '%s' (format %u) to '%s' (format %u)", source.myLabel.c_str(),
-		            source.myFormat, destination.myLabel.c_str(), destination.myFormat);
+		            static_cast<unsigned>(source.myFormat), destination.myLabel.c_str(),
+		            static_cast<unsigned>(destination.myFormat));
 		return false;
 	}
 	for (int mip = 0; mip < source.myMipLevels; ++mip)
@@ -152,6 +191,122 @@ bool Context::CopySubresourceRegion(Texture& aDestination, int aDestinationMip, 
 	                   aDestinationMip, anX, aY, destinationVolumeFlag ? aZ : aDestinationSlice, width,
 	                   height, depth);
 	LUMORA_GL_CHECK("Gpu::Context::CopySubresourceRegion");
+	return true;
+}
+
+void Context::SetSampler(int aUnit, const SamplerState* aSampler)
+{
+	if (aUnit < 0 || aUnit >= StateCache::ourSamplerUnitCount)
+	{
+		ReportError(__LINE__, "Gpu::Context::SetSampler", "Sampler unit %d out of range 0..%d", aUnit,
+		            StateCache::ourSamplerUnitCount - 1);
+		return;
+	}
+	myStateCache.BindSampler(aUnit, aSampler ? aSampler->GetName() : 0);
+}
+
+void Context::SetInputLayout(const InputLayout* aLayout)
+{
+	if (aLayout != myInputLayout)
+	{
+		myInputLayout = aLayout;
+		myBuffersDirtyFlag = true;
+	}
+}
+
+bool Context::SetVertexBuffer(uint32_t aSlot, const Buffer* aBuffer, uint32_t aStride, uint32_t anOffset)
+{
+	if (aSlot >= InputLayout::ourSlotCount || (aBuffer && aBuffer->GetDesc().myKind != BufferKind::Vertex))
+	{
+		ReportError(__LINE__, "Gpu::Context::SetVertexBuffer", "Cannot bind buffer '%s' to vertex slot %u",
+		            aBuffer ? aBuffer->GetDesc().myLabel.c_str() : "", aSlot);
+		return false;
+	}
+	const VertexBinding binding{aBuffer ? aBuffer->GetName() : 0, static_cast<GLintptr>(anOffset),
+	                            static_cast<GLsizei>(aStride)};
+	VertexBinding& current = myVertexBuffers[aSlot];
+	if (binding.myBuffer != current.myBuffer || binding.myOffset != current.myOffset ||
+	    binding.myStride != current.myStride)
+	{
+		current = binding;
+		myBuffersDirtyFlag = true;
+	}
+	return true;
+}
+
+bool Context::SetIndexBuffer(const Buffer* aBuffer, IndexFormat aFormat, uint32_t anOffset)
+{
+	if (aBuffer && (aBuffer->GetDesc().myKind != BufferKind::Index || anOffset % IndexBytes(aFormat) != 0))
+	{
+		ReportError(__LINE__, "Gpu::Context::SetIndexBuffer",
+		            "Cannot use buffer '%s' as an index buffer at offset %u",
+		            aBuffer->GetDesc().myLabel.c_str(), anOffset);
+		return false;
+	}
+	myIndexBuffer = aBuffer ? aBuffer->GetName() : 0;
+	myIndexBufferSize = aBuffer ? aBuffer->GetDesc().mySize : 0;
+	myIndexFormat = aFormat;
+	myIndexOffset = anOffset;
+	myBuffersDirtyFlag = true;
+	return true;
+}
+
+void Context::ForgetInputLayout(const InputLayout& aLayout)
+{
+	myStateCache.ForgetVertexArray(aLayout.GetVertexArray());
+	if (myInputLayout == &aLayout)
+	{
+		myInputLayout = nullptr;
+		myBuffersDirtyFlag = true;
+	}
+}
+
+void Context::PrepareDraw()
+{
+	const GLuint vertexArray = myInputLayout ? myInputLayout->GetVertexArray() : myEmptyVertexArray;
+	if (myBuffersDirtyFlag)
+	{
+		const uint32_t usedSlots = myInputLayout ? myInputLayout->GetUsedSlots() : 0;
+		for (uint32_t slot = 0; slot < InputLayout::ourSlotCount; ++slot)
+		{
+			if ((usedSlots & (1u << slot)) != 0)
+			{
+				const VertexBinding& binding = myVertexBuffers[slot];
+				glVertexArrayVertexBuffer(vertexArray, slot, binding.myBuffer, binding.myOffset,
+				                          binding.myStride);
+			}
+		}
+		glVertexArrayElementBuffer(vertexArray, myIndexBuffer);
+		myBuffersDirtyFlag = false;
+	}
+	myStateCache.BindVertexArray(vertexArray);
+}
+
+void Context::Draw(uint32_t aVertexCount, uint32_t aStartVertex)
+{
+	PrepareDraw();
+	glDrawArrays(ToGlTopology(myTopology), static_cast<GLint>(aStartVertex),
+	             static_cast<GLsizei>(aVertexCount));
+	LUMORA_GL_CHECK("Gpu::Context::Draw");
+}
+
+bool Context::DrawIndexed(uint32_t anIndexCount, uint32_t aStartIndex, int32_t aBaseVertex)
+{
+	const uint64_t indexBytes = IndexBytes(myIndexFormat);
+	const uint64_t end = myIndexOffset + (uint64_t{aStartIndex} + anIndexCount) * indexBytes;
+	if (myIndexBuffer == 0 || end > myIndexBufferSize)
+	{
+		ReportError(__LINE__, "Gpu::Context::DrawIndexed",
+		            "%u indices from index %u need %llu bytes; the index buffer has %zu", anIndexCount,
+		            aStartIndex, static_cast<unsigned long long>(end), myIndexBufferSize);
+		return false;
+	}
+	PrepareDraw();
+	const uintptr_t offset = myIndexOffset + aStartIndex * indexBytes;
+	glDrawElementsBaseVertex(ToGlTopology(myTopology), static_cast<GLsizei>(anIndexCount),
+	                         myIndexFormat == IndexFormat::UInt16 ? GL_UNSIGNED_SHORT : GL_UNSIGNED_INT,
+	                         reinterpret_cast<const void*>(offset), aBaseVertex);
+	LUMORA_GL_CHECK("Gpu::Context::DrawIndexed");
 	return true;
 }
 } // namespace Gpu

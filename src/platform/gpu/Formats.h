@@ -1,15 +1,15 @@
 #pragma once
 // Formats: what a DXGI format number means to OpenGL.
 //
-//   const Gpu::FormatInfo info = Gpu::GetFormatInfo(aDxgiFormat);
+//   const Gpu::FormatInfo info = Gpu::GetFormatInfo(aFormat);
 //   if (!info.IsSupported()) { ... report, refuse ... }
 //   glTextureStorage2D(name, mips, info.myInternalFormat, width, height);
 //   glTextureSubImage2D(name, 0, 0, 0, width, height, info.myUploadFormat, info.myUploadType, data);
 //
-// Formats keep their DXGI numbers because files store them. The DDS layer names
-// them in its own enum; this table takes the plain numbers so that it does not
-// depend on the file layer. Memory layouts match Direct3D's: B8G8R8A8 uploads
-// and reads as GL_BGRA, so bytes in memory mean the same under both.
+// Formats keep their DXGI numbers because files store them; the platform layer
+// has one type for them, Dds::Format, so a format read from a file reaches a
+// texture unchanged. Memory layouts match Direct3D's: B8G8R8A8 uploads and
+// reads as GL_BGRA, so bytes in memory mean the same under both.
 //
 // One layout differs: D24_UNORM_S8_UINT keeps depth in the low 24 bits under
 // Direct3D and in the high 24 bits under GL_UNSIGNED_INT_24_8. Depth is rendered,
@@ -17,6 +17,8 @@
 
 #include <cstdint>
 #include <epoxy/gl.h>
+
+#include "platform/dds/Format.h"
 
 namespace Gpu
 {
@@ -82,51 +84,51 @@ constexpr FormatInfo Depth(GLenum anInternal, GLenum aFormat, GLenum aType, bool
 // The GL description of a DXGI format; a default FormatInfo (IsSupported() false)
 // for numbers the engine does not use. A default is needed here, unlike in the
 // layer's own enums: the numbers come from files and can be anything.
-constexpr FormatInfo GetFormatInfo(uint32_t aDxgiFormat)
+constexpr FormatInfo GetFormatInfo(Dds::Format aFormat)
 {
 	using namespace Detail;
-	switch (aDxgiFormat)
+	switch (aFormat)
 	{
-	case 2: // R32G32B32A32_FLOAT
+	case Dds::Format::R32G32B32A32_FLOAT:
 		return Plain(GL_RGBA32F, GL_RGBA, GL_FLOAT, 16);
-	case 10: // R16G16B16A16_FLOAT
+	case Dds::Format::R16G16B16A16_FLOAT:
 		return Plain(GL_RGBA16F, GL_RGBA, GL_HALF_FLOAT, 8);
-	case 24: // R10G10B10A2_UNORM
+	case Dds::Format::R10G10B10A2_UNORM:
 		return Plain(GL_RGB10_A2, GL_RGBA, GL_UNSIGNED_INT_2_10_10_10_REV, 4);
-	case 26: // R11G11B10_FLOAT
+	case Dds::Format::R11G11B10_FLOAT:
 		return Plain(GL_R11F_G11F_B10F, GL_RGB, GL_UNSIGNED_INT_10F_11F_11F_REV, 4);
-	case 27: // R8G8B8A8_TYPELESS: storage that UNORM and UNORM_SRGB views share
-	case 28: // R8G8B8A8_UNORM
+	case Dds::Format::R8G8B8A8_TYPELESS: // storage that UNORM and UNORM_SRGB views share
+	case Dds::Format::R8G8B8A8_UNORM:
 		return Plain(GL_RGBA8, GL_RGBA, GL_UNSIGNED_BYTE, 4);
-	case 29: // R8G8B8A8_UNORM_SRGB
+	case Dds::Format::R8G8B8A8_UNORM_SRGB:
 		return Plain(GL_SRGB8_ALPHA8, GL_RGBA, GL_UNSIGNED_BYTE, 4);
-	case 34: // R16G16_FLOAT
+	case Dds::Format::R16G16_FLOAT:
 		return Plain(GL_RG16F, GL_RG, GL_HALF_FLOAT, 4);
-	case 40: // D32_FLOAT
+	case Dds::Format::D32_FLOAT:
 		return Depth(GL_DEPTH_COMPONENT32F, GL_DEPTH_COMPONENT, GL_FLOAT, false);
-	case 41: // R32_FLOAT
+	case Dds::Format::R32_FLOAT:
 		return Plain(GL_R32F, GL_RED, GL_FLOAT, 4);
-	case 45: // D24_UNORM_S8_UINT
+	case Dds::Format::D24_UNORM_S8_UINT:
 		return Depth(GL_DEPTH24_STENCIL8, GL_DEPTH_STENCIL, GL_UNSIGNED_INT_24_8, true);
-	case 54: // R16_FLOAT
+	case Dds::Format::R16_FLOAT:
 		return Plain(GL_R16F, GL_RED, GL_HALF_FLOAT, 2);
-	case 61: // R8_UNORM
+	case Dds::Format::R8_UNORM:
 		return Plain(GL_R8, GL_RED, GL_UNSIGNED_BYTE, 1);
-	case 71: // BC1_UNORM: Direct3D's BC1 always has a 1-bit alpha
+	case Dds::Format::BC1_UNORM: // Direct3D's BC1 always has a 1-bit alpha
 		return Block(GL_COMPRESSED_RGBA_S3TC_DXT1_EXT, 8, false);
-	case 72: // BC1_UNORM_SRGB
+	case Dds::Format::BC1_UNORM_SRGB:
 		return Block(GL_COMPRESSED_SRGB_ALPHA_S3TC_DXT1_EXT, 8, true);
-	case 74: // BC2_UNORM
+	case Dds::Format::BC2_UNORM:
 		return Block(GL_COMPRESSED_RGBA_S3TC_DXT3_EXT, 16, false);
-	case 75: // BC2_UNORM_SRGB
+	case Dds::Format::BC2_UNORM_SRGB:
 		return Block(GL_COMPRESSED_SRGB_ALPHA_S3TC_DXT3_EXT, 16, true);
-	case 77: // BC3_UNORM
+	case Dds::Format::BC3_UNORM:
 		return Block(GL_COMPRESSED_RGBA_S3TC_DXT5_EXT, 16, false);
-	case 78: // BC3_UNORM_SRGB
+	case Dds::Format::BC3_UNORM_SRGB:
 		return Block(GL_COMPRESSED_SRGB_ALPHA_S3TC_DXT5_EXT, 16, true);
-	case 87: // B8G8R8A8_UNORM
+	case Dds::Format::B8G8R8A8_UNORM:
 		return Plain(GL_RGBA8, GL_BGRA, GL_UNSIGNED_BYTE, 4);
-	case 91: // B8G8R8A8_UNORM_SRGB
+	case Dds::Format::B8G8R8A8_UNORM_SRGB:
 		return Plain(GL_SRGB8_ALPHA8, GL_BGRA, GL_UNSIGNED_BYTE, 4);
 	default:
 		return FormatInfo{};

@@ -37,7 +37,8 @@ bool ReadRenderTarget(Context& aContext, const RenderTargetView& aView, std::vec
 	if (info.myUploadType != GL_UNSIGNED_BYTE || info.myBlockBytes != 4)
 	{
 		ReportError(__LINE__, "Gpu::ReadRenderTarget",
-		            "Format %u is not an 8-bit RGBA target; read it as floats", aView.GetFormat());
+		            "Format %u is not an 8-bit RGBA target; read it as floats",
+		            static_cast<unsigned>(aView.GetFormat()));
 		return false;
 	}
 	someBytes.resize(static_cast<size_t>(aView.GetWidth()) * static_cast<size_t>(aView.GetHeight()) * 4);
@@ -49,7 +50,8 @@ bool ReadRenderTarget(Context& aContext, const RenderTargetView& aView, std::vec
 	const FormatInfo info = GetFormatInfo(aView.GetFormat());
 	if (!info.IsSupported() || info.myDepthFlag || info.myCompressedFlag)
 	{
-		ReportError(__LINE__, "Gpu::ReadRenderTarget", "Format %u is not a colour target", aView.GetFormat());
+		ReportError(__LINE__, "Gpu::ReadRenderTarget", "Format %u is not a colour target",
+		            static_cast<unsigned>(aView.GetFormat()));
 		return false;
 	}
 	someValues.resize(static_cast<size_t>(aView.GetWidth()) * static_cast<size_t>(aView.GetHeight()) * 4);

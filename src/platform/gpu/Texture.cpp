@@ -90,7 +90,8 @@ bool Texture::Init(Context& aContext, const TextureDesc& aDesc)
 	const FormatInfo info = GetFormatInfo(aDesc.myFormat);
 	if (!info.IsSupported())
 	{
-		ReportError(__LINE__, function, "Texture '%s': unsupported DXGI format %u", label, aDesc.myFormat);
+		ReportError(__LINE__, function, "Texture '%s': unsupported DXGI format %u", label,
+		            static_cast<unsigned>(aDesc.myFormat));
 		return false;
 	}
 	const bool volumeFlag = aDesc.myKind == TextureKind::Texture3D;
@@ -260,14 +261,14 @@ bool Texture::Upload(int aMip, int aSlice, const void* someData, uint32_t aRowPi
 	return true;
 }
 
-bool Texture::CanViewAs(uint32_t aFormat) const
+bool Texture::CanViewAs(Dds::Format aFormat) const
 {
 	const FormatInfo info = GetFormatInfo(aFormat);
 	return info.IsSupported() && ViewClass(info) == ViewClass(GetFormatInfo(myDesc.myFormat));
 }
 
 template <typename ViewType>
-ViewType* Texture::AddView(GLenum aTarget, uint32_t aFormat, int aFirstMip, int aMipCount, int aFirstSlice,
+ViewType* Texture::AddView(GLenum aTarget, Dds::Format aFormat, int aFirstMip, int aMipCount, int aFirstSlice,
                            int aSliceCount, const char* aKind)
 {
 	auto view = std::make_unique<ViewType>();
@@ -282,7 +283,7 @@ ViewType* Texture::AddView(GLenum aTarget, uint32_t aFormat, int aFirstMip, int 
 
 ShaderResourceView* Texture::CreateShaderResourceView(const ShaderResourceDesc& aDesc)
 {
-	const uint32_t format = aDesc.myFormat == 0 ? myDesc.myFormat : aDesc.myFormat;
+	const Dds::Format format = aDesc.myFormat == Dds::Format::UNKNOWN ? myDesc.myFormat : aDesc.myFormat;
 	const int slices = GetSliceCount();
 	const int layers = myTarget == GL_TEXTURE_3D ? 1 : slices;
 	const int mipCount = aDesc.myMipCount == 0 ? myDesc.myMipLevels - aDesc.myFirstMip : aDesc.myMipCount;
@@ -293,8 +294,9 @@ ShaderResourceView* Texture::CreateShaderResourceView(const ShaderResourceDesc& 
 	{
 		ReportError(__LINE__, "Gpu::Texture::CreateShaderResourceView",
 		            "Texture '%s' (format %u): no view of format %u, mips %d+%d, slices %d+%d",
-		            myDesc.myLabel.c_str(), myDesc.myFormat, format, aDesc.myFirstMip, mipCount,
-		            aDesc.myFirstSlice, sliceCount);
+		            myDesc.myLabel.c_str(), static_cast<unsigned>(myDesc.myFormat),
+		            static_cast<unsigned>(format), aDesc.myFirstMip, mipCount, aDesc.myFirstSlice,
+		            sliceCount);
 		return nullptr;
 	}
 	GLenum target = myTarget;
@@ -314,7 +316,7 @@ ShaderResourceView* Texture::CreateShaderResourceView(const ShaderResourceDesc& 
 RenderTargetView* Texture::CreateRenderTargetView(const RenderTargetDesc& aDesc)
 {
 	const char* function = "Gpu::Texture::CreateRenderTargetView";
-	const uint32_t format = aDesc.myFormat == 0 ? myDesc.myFormat : aDesc.myFormat;
+	const Dds::Format format = aDesc.myFormat == Dds::Format::UNKNOWN ? myDesc.myFormat : aDesc.myFormat;
 	const FormatInfo info = GetFormatInfo(format);
 	const int slices = myTarget == GL_TEXTURE_3D ? GetMipDepth(aDesc.myMip) : myDesc.myArraySize;
 	const int sliceCount = aDesc.mySliceCount == 0 ? slices - aDesc.myFirstSlice : aDesc.mySliceCount;
@@ -324,8 +326,8 @@ RenderTargetView* Texture::CreateRenderTargetView(const RenderTargetDesc& aDesc)
 	{
 		ReportError(__LINE__, function,
 		            "Texture '%s' (format %u): no render target of format %u at mip %d, slices %d+%d",
-		            myDesc.myLabel.c_str(), myDesc.myFormat, format, aDesc.myMip, aDesc.myFirstSlice,
-		            sliceCount);
+		            myDesc.myLabel.c_str(), static_cast<unsigned>(myDesc.myFormat),
+		            static_cast<unsigned>(format), aDesc.myMip, aDesc.myFirstSlice, sliceCount);
 		return nullptr;
 	}
 	const GLenum target = myTarget == GL_TEXTURE_3D ? GL_TEXTURE_3D
@@ -337,7 +339,7 @@ RenderTargetView* Texture::CreateRenderTargetView(const RenderTargetDesc& aDesc)
 DepthStencilView* Texture::CreateDepthStencilView(const DepthStencilDesc& aDesc)
 {
 	const char* function = "Gpu::Texture::CreateDepthStencilView";
-	const uint32_t format = aDesc.myFormat == 0 ? myDesc.myFormat : aDesc.myFormat;
+	const Dds::Format format = aDesc.myFormat == Dds::Format::UNKNOWN ? myDesc.myFormat : aDesc.myFormat;
 	const int sliceCount =
 	    aDesc.mySliceCount == 0 ? myDesc.myArraySize - aDesc.myFirstSlice : aDesc.mySliceCount;
 	if (myName == 0 || !CanViewAs(format) || !GetFormatInfo(format).myDepthFlag ||
@@ -346,8 +348,8 @@ DepthStencilView* Texture::CreateDepthStencilView(const DepthStencilDesc& aDesc)
 	{
 		ReportError(__LINE__, function,
 		            "Texture '%s' (format %u): no depth view of format %u at mip %d, slices %d+%d",
-		            myDesc.myLabel.c_str(), myDesc.myFormat, format, aDesc.myMip, aDesc.myFirstSlice,
-		            sliceCount);
+		            myDesc.myLabel.c_str(), static_cast<unsigned>(myDesc.myFormat),
+		            static_cast<unsigned>(format), aDesc.myMip, aDesc.myFirstSlice, sliceCount);
 		return nullptr;
 	}
 	const GLenum target = sliceCount > 1 ? GL_TEXTURE_2D_ARRAY : GL_TEXTURE_2D;

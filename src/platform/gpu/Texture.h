@@ -6,7 +6,7 @@
 //   desc.myWidth = desc.myHeight = 128;
 //   desc.myArraySize = 6;              // faces +X, -X, +Y, -Y, +Z, -Z
 //   desc.myMipLevels = 0;              // the whole chain
-//   desc.myFormat = 10;                // DXGI R16G16B16A16_FLOAT
+//   desc.myFormat = Dds::Format::R16G16B16A16_FLOAT;
 //   desc.myLabel = "room cubemap";
 //   Gpu::Texture cube;
 //   if (!cube.Init(device.GetContext(), desc)) { ... reported already ... }
@@ -45,10 +45,10 @@ struct TextureDesc
 	TextureKind myKind = TextureKind::Texture2D;
 	int myWidth = 1;
 	int myHeight = 1;
-	int myDepth = 1;       // 3D only
-	int myArraySize = 1;   // layers of a 2D texture, faces of a cube
-	int myMipLevels = 1;   // 0: down to 1x1
-	uint32_t myFormat = 0; // DXGI number
+	int myDepth = 1;     // 3D only
+	int myArraySize = 1; // layers of a 2D texture, faces of a cube
+	int myMipLevels = 1; // 0: down to 1x1
+	Dds::Format myFormat = Dds::Format::UNKNOWN;
 	std::string myLabel;
 };
 
@@ -90,10 +90,10 @@ public:
 
 private:
 	template <typename ViewType>
-	ViewType* AddView(GLenum aTarget, uint32_t aFormat, int aFirstMip, int aMipCount, int aFirstSlice,
+	ViewType* AddView(GLenum aTarget, Dds::Format aFormat, int aFirstMip, int aMipCount, int aFirstSlice,
 	                  int aSliceCount, const char* aKind);
 	// glTextureView reinterprets only within a format's view class.
-	bool CanViewAs(uint32_t aFormat) const;
+	bool CanViewAs(Dds::Format aFormat) const;
 
 	Context* myContext = nullptr;
 	TextureDesc myDesc;

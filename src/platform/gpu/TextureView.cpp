@@ -15,7 +15,7 @@ namespace
 std::atomic<uint64_t> ourNextUniqueId{1};
 } // namespace
 
-bool View::InitView(Texture& aTexture, GLenum aTarget, uint32_t aFormat, int aFirstMip, int aMipCount,
+bool View::InitView(Texture& aTexture, GLenum aTarget, Dds::Format aFormat, int aFirstMip, int aMipCount,
                     int aFirstSlice, int aSliceCount, const char* aKind)
 {
 	myTexture = &aTexture;

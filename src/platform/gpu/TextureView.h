@@ -17,6 +17,8 @@
 #include <epoxy/gl.h>
 #include <string>
 
+#include "platform/dds/Format.h"
+
 namespace Gpu
 {
 class Texture;
@@ -32,10 +34,10 @@ enum class ViewDimension
 	Texture3D,
 };
 
-// A format of 0 keeps the texture's; counts of 0 take everything from the first.
+// An UNKNOWN format keeps the texture's; counts of 0 take everything from the first.
 struct ShaderResourceDesc
 {
-	uint32_t myFormat = 0;
+	Dds::Format myFormat = Dds::Format::UNKNOWN;
 	ViewDimension myDimension = ViewDimension::Automatic;
 	int myFirstMip = 0;
 	int myMipCount = 0;
@@ -47,7 +49,7 @@ struct ShaderResourceDesc
 // above 1 (0: all from the first) attaches the slices as a layered target.
 struct RenderTargetDesc
 {
-	uint32_t myFormat = 0;
+	Dds::Format myFormat = Dds::Format::UNKNOWN;
 	int myMip = 0;
 	int myFirstSlice = 0;
 	int mySliceCount = 1;
@@ -66,7 +68,7 @@ public:
 	uint64_t GetUniqueId() const { return myUniqueId; }
 	GLuint GetName() const { return myName; }
 	GLenum GetTarget() const { return myTarget; }
-	uint32_t GetFormat() const { return myFormat; }
+	Dds::Format GetFormat() const { return myFormat; }
 	Texture& GetTexture() const { return *myTexture; }
 	// Size of the view's first mip.
 	int GetWidth() const { return myWidth; }
@@ -79,7 +81,7 @@ public:
 protected:
 	friend class Texture;
 
-	bool InitView(Texture& aTexture, GLenum aTarget, uint32_t aFormat, int aFirstMip, int aMipCount,
+	bool InitView(Texture& aTexture, GLenum aTarget, Dds::Format aFormat, int aFirstMip, int aMipCount,
 	              int aFirstSlice, int aSliceCount, const char* aKind);
 	virtual void Destroy();
 
@@ -87,7 +89,7 @@ protected:
 	uint64_t myUniqueId = 0;
 	GLuint myName = 0;
 	GLenum myTarget = 0;
-	uint32_t myFormat = 0;
+	Dds::Format myFormat = Dds::Format::UNKNOWN;
 	int myWidth = 0;
 	int myHeight = 0;
 	int mySliceCount = 0;

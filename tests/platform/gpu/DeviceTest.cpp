@@ -41,7 +41,7 @@ TEST_F(DeviceTest, ContextIsCoreProfile45WithDirect3DConventions)
 
 TEST_F(DeviceTest, ContextMovesBetweenThreads)
 {
-	Gpu::Texture* target = MakeTarget(DxgiFormat::Rgba8, 8, 8);
+	Gpu::Texture* target = MakeTarget(Dds::Format::R8G8B8A8_UNORM, 8, 8);
 	ASSERT_NE(target, nullptr);
 	Gpu::RenderTargetView* view = target->CreateRenderTargetView();
 	myDevice.ReleaseCurrent();
@@ -79,18 +79,20 @@ TEST_F(DeviceTest, BadInitIsReportedNotFatal)
 	    << reports[1];
 	// The failed device left the shared display alone.
 	EXPECT_TRUE(myDevice.MakeCurrent());
-	EXPECT_NE(MakeTarget(DxgiFormat::Rgba8, 4, 4), nullptr);
+	EXPECT_NE(MakeTarget(Dds::Format::R8G8B8A8_UNORM, 4, 4), nullptr);
 }
 
 // Every format the engine uses makes storage of the intended GL format and
 // accepts an upload of its own layout.
 TEST_F(DeviceTest, EveryEngineFormatMapsToWorkingStorage)
 {
-	const uint32_t formats[] = {28, 29, 27, 87, 91, 71, 72, 74, 75, 77, 78,
+	// By number, as files carry them: the enum must keep DXGI's values.
+	const uint32_t numbers[] = {28, 29, 27, 87, 91, 71, 72, 74, 75, 77, 78,
 	                            10, 41, 2,  34, 26, 24, 61, 54, 45, 40};
-	for (const uint32_t format : formats)
+	for (const uint32_t number : numbers)
 	{
-		SCOPED_TRACE(format);
+		const Dds::Format format = static_cast<Dds::Format>(number);
+		SCOPED_TRACE(number);
 		const Gpu::FormatInfo info = Gpu::GetFormatInfo(format);
 		ASSERT_TRUE(info.IsSupported());
 		Gpu::Texture* texture = MakeTarget(format, 8, 8);
@@ -106,28 +108,30 @@ TEST_F(DeviceTest, EveryEngineFormatMapsToWorkingStorage)
 		EXPECT_TRUE(texture->Upload(0, 0, zeros.data(), info.RowBytes(8)));
 		EXPECT_EQ(glGetError(), static_cast<GLenum>(GL_NO_ERROR));
 	}
-	EXPECT_EQ(Gpu::GetFormatInfo(42).RowBytes(7), 0u);
-	EXPECT_EQ(Gpu::GetFormatInfo(DxgiFormat::Bc1).RowBytes(7), 16u); // two 8-byte blocks
-	EXPECT_EQ(Gpu::GetFormatInfo(DxgiFormat::Bc1).BlockRows(5), 2u);
+	EXPECT_EQ(Gpu::GetFormatInfo(static_cast<Dds::Format>(42)).RowBytes(7), 0u);
+	EXPECT_EQ(Gpu::GetFormatInfo(Dds::Format::BC1_UNORM).RowBytes(7), 16u); // two 8-byte blocks
+	EXPECT_EQ(Gpu::GetFormatInfo(Dds::Format::BC1_UNORM).BlockRows(5), 2u);
 }
 
 TEST_F(DeviceTest, UnsupportedFormatAndBadDescriptionsFailCleanly)
 {
-	static_assert(!Gpu::GetFormatInfo(0).IsSupported() && !Gpu::GetFormatInfo(9999).IsSupported());
-	EXPECT_EQ(MakeTarget(9999, 8, 8), nullptr);
+	constexpr Dds::Format outOfEnum = static_cast<Dds::Format>(9999);
+	static_assert(!Gpu::GetFormatInfo(Dds::Format::UNKNOWN).IsSupported() &&
+	              !Gpu::GetFormatInfo(outOfEnum).IsSupported());
+	EXPECT_EQ(MakeTarget(outOfEnum, 8, 8), nullptr);
 	Gpu::TextureDesc cube;
 	cube.myKind = Gpu::TextureKind::TextureCube;
 	cube.myWidth = 8;
 	cube.myHeight = 4;
 	cube.myArraySize = 6;
-	cube.myFormat = DxgiFormat::Rgba8;
+	cube.myFormat = Dds::Format::R8G8B8A8_UNORM;
 	cube.myLabel = "oblong cube";
 	EXPECT_EQ(MakeTexture(cube), nullptr);
-	EXPECT_EQ(MakeTarget(DxgiFormat::Rgba8, 8, 8, 5), nullptr); // 8x8 has 4 mips
+	EXPECT_EQ(MakeTarget(Dds::Format::R8G8B8A8_UNORM, 8, 8, 5), nullptr); // 8x8 has 4 mips
 
-	Gpu::Texture* texture = MakeTarget(DxgiFormat::Rgba8, 8, 8);
+	Gpu::Texture* texture = MakeTarget(Dds::Format::R8G8B8A8_UNORM, 8, 8);
 	ASSERT_NE(texture, nullptr);
-	EXPECT_EQ(texture->CreateRenderTargetView({.myFormat = DxgiFormat::Rgba16Float}), nullptr);
+	EXPECT_EQ(texture->CreateRenderTargetView({.myFormat = Dds::Format::R16G16B16A16_FLOAT}), nullptr);
 	EXPECT_EQ(texture->CreateRenderTargetView({.myMip = 1}), nullptr);
 	EXPECT_EQ(texture->CreateDepthStencilView(), nullptr);
 	const uint8_t row[4] = {};

@@ -8,9 +8,9 @@ using FramebufferCacheTest = GpuTest;
 
 TEST_F(FramebufferCacheTest, SameViewsShareOneFramebuffer)
 {
-	Gpu::Texture* first = MakeTarget(DxgiFormat::Rgba8, 16, 16);
-	Gpu::Texture* second = MakeTarget(DxgiFormat::Rgba16Float, 16, 16);
-	Gpu::Texture* depth = MakeTarget(DxgiFormat::D24S8, 16, 16);
+	Gpu::Texture* first = MakeTarget(Dds::Format::R8G8B8A8_UNORM, 16, 16);
+	Gpu::Texture* second = MakeTarget(Dds::Format::R16G16B16A16_FLOAT, 16, 16);
+	Gpu::Texture* depth = MakeTarget(Dds::Format::D24_UNORM_S8_UINT, 16, 16);
 	ASSERT_TRUE(first && second && depth);
 	Gpu::RenderTargetView* a = first->CreateRenderTargetView();
 	Gpu::RenderTargetView* b = second->CreateRenderTargetView();
@@ -44,7 +44,7 @@ TEST_F(FramebufferCacheTest, SameViewsShareOneFramebuffer)
 // framebuffer that really draws into it.
 TEST_F(FramebufferCacheTest, RecreatedViewNeverFindsAStaleFramebuffer)
 {
-	Gpu::Texture* first = MakeTarget(DxgiFormat::Rgba8, 8, 8);
+	Gpu::Texture* first = MakeTarget(Dds::Format::R8G8B8A8_UNORM, 8, 8);
 	ASSERT_NE(first, nullptr);
 	Gpu::RenderTargetView* old = first->CreateRenderTargetView();
 	const GLuint oldName = old->GetName();

@@ -5,10 +5,10 @@
 // expects one takes it with TakeReports(), and any left over fails the test.
 
 #include <cstdlib>
-#include <dlfcn.h>
-#include <link.h>
 #include <cstring>
+#include <dlfcn.h>
 #include <gtest/gtest.h>
+#include <link.h>
 #include <memory>
 #include <string>
 #include <vector>
@@ -24,8 +24,7 @@
 inline void PinLoadedGlLibraries()
 {
 	dl_iterate_phdr(
-	    [](dl_phdr_info* anInfo, size_t, void*) -> int
-	    {
+	    [](dl_phdr_info* anInfo, size_t, void*) -> int {
 		    const std::string name = anInfo->dlpi_name != nullptr ? anInfo->dlpi_name : "";
 		    for (const char* library : {"_dri.so", "libgallium", "libEGL_mesa", "libglapi", "libGLX_mesa"})
 		    {
@@ -90,7 +89,7 @@ protected:
 		return myTextures.back().get();
 	}
 
-	Gpu::Texture* MakeTarget(uint32_t aFormat, int aWidth, int aHeight, int aMipLevels = 1)
+	Gpu::Texture* MakeTarget(Dds::Format aFormat, int aWidth, int aHeight, int aMipLevels = 1)
 	{
 		Gpu::TextureDesc desc;
 		desc.myWidth = aWidth;
@@ -118,17 +117,3 @@ protected:
 	CoreReport::Handler myPreviousHandler = nullptr;
 	static inline std::vector<std::string> ourReports;
 };
-
-// DXGI numbers used by the tests.
-namespace DxgiFormat
-{
-constexpr uint32_t Rgba32Float = 2;
-constexpr uint32_t Rgba16Float = 10;
-constexpr uint32_t Rgba8Typeless = 27;
-constexpr uint32_t Rgba8 = 28;
-constexpr uint32_t Rgba8Srgb = 29;
-constexpr uint32_t D32Float = 40;
-constexpr uint32_t D24S8 = 45;
-constexpr uint32_t Bc1 = 71;
-constexpr uint32_t Bgra8 = 87;
-} // namespace DxgiFormat

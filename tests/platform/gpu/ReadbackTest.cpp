@@ -34,8 +34,8 @@ std::vector<uint8_t> ReadPng(const std::string& aPath, int& aWidth, int& aHeight
 // so orientation mistakes show (red must be top left).
 TEST_F(ReadbackTest, RenderedTargetSurvivesAPngRoundTrip)
 {
-	Gpu::Texture* picture = MakeTarget(DxgiFormat::Rgba8, 64, 32);
-	Gpu::Texture* tile = MakeTarget(DxgiFormat::Rgba8, 32, 16);
+	Gpu::Texture* picture = MakeTarget(Dds::Format::R8G8B8A8_UNORM, 64, 32);
+	Gpu::Texture* tile = MakeTarget(Dds::Format::R8G8B8A8_UNORM, 32, 16);
 	ASSERT_TRUE(picture && tile);
 	Gpu::RenderTargetView* tileView = tile->CreateRenderTargetView();
 	const float colors[4][4] = {{1, 0, 0, 1}, {0, 1, 0, 1}, {0, 0, 1, 1}, {1, 1, 1, 1}};
@@ -80,9 +80,9 @@ TEST_F(ReadbackTest, FloatTargetsReadBackAsFloats)
 {
 	// Values a half float holds exactly, beyond 0..1 both ways.
 	const float color[4] = {0.25f, -2.0f, 1000.0f, 1.0f};
-	for (const uint32_t format : {DxgiFormat::Rgba16Float, DxgiFormat::Rgba32Float})
+	for (const Dds::Format format : {Dds::Format::R16G16B16A16_FLOAT, Dds::Format::R32G32B32A32_FLOAT})
 	{
-		SCOPED_TRACE(format);
+		SCOPED_TRACE(Dds::FormatName(format));
 		Gpu::Texture* target = MakeTarget(format, 4, 4);
 		ASSERT_NE(target, nullptr);
 		Gpu::RenderTargetView* view = target->CreateRenderTargetView();

@@ -37,7 +37,7 @@ std::array<float, 4> ToColor(std::array<uint8_t, 4> aColor)
 
 TEST_F(TextureTest, ClearedTargetReadsBackExactly)
 {
-	Gpu::Texture* target = MakeTarget(DxgiFormat::Rgba8, 64, 32);
+	Gpu::Texture* target = MakeTarget(Dds::Format::R8G8B8A8_UNORM, 64, 32);
 	ASSERT_NE(target, nullptr);
 	Gpu::RenderTargetView* view = target->CreateRenderTargetView();
 	ASSERT_NE(view, nullptr);
@@ -51,10 +51,10 @@ TEST_F(TextureTest, ClearedTargetReadsBackExactly)
 // A clear is Direct3D's: neither the scissor test nor a disabled write mask stops it.
 TEST_F(TextureTest, ClearIgnoresScissorAndWriteMasks)
 {
-	Gpu::Texture* target = MakeTarget(DxgiFormat::Rgba8, 16, 16);
+	Gpu::Texture* target = MakeTarget(Dds::Format::R8G8B8A8_UNORM, 16, 16);
 	ASSERT_NE(target, nullptr);
 	Gpu::RenderTargetView* view = target->CreateRenderTargetView();
-	GetContext().GetStateCache().SetColorWriteFlag(false);
+	GetContext().GetStateCache().SetColorWriteMask(0);
 	GetContext().GetStateCache().SetScissorTestFlag(true);
 	glScissor(0, 0, 1, 1);
 	const std::array<uint8_t, 4> color = {255, 0, 255, 255};
@@ -65,7 +65,7 @@ TEST_F(TextureTest, ClearIgnoresScissorAndWriteMasks)
 TEST_F(TextureTest, SrgbTargetsEncodeAndTypelessViewsReinterpret)
 {
 	const float half[4] = {0.5f, 0.5f, 0.5f, 0.5f};
-	Gpu::Texture* srgb = MakeTarget(DxgiFormat::Rgba8Srgb, 8, 8);
+	Gpu::Texture* srgb = MakeTarget(Dds::Format::R8G8B8A8_UNORM_SRGB, 8, 8);
 	ASSERT_NE(srgb, nullptr);
 	Gpu::RenderTargetView* srgbView = srgb->CreateRenderTargetView();
 	GetContext().ClearRenderTargetView(*srgbView, half);
@@ -75,10 +75,12 @@ TEST_F(TextureTest, SrgbTargetsEncodeAndTypelessViewsReinterpret)
 	EXPECT_NEAR(pixels[3], 128, 1); // alpha stays linear
 
 	// One TYPELESS storage, seen as UNORM and as sRGB.
-	Gpu::Texture* typeless = MakeTarget(DxgiFormat::Rgba8Typeless, 8, 8);
+	Gpu::Texture* typeless = MakeTarget(Dds::Format::R8G8B8A8_TYPELESS, 8, 8);
 	ASSERT_NE(typeless, nullptr);
-	Gpu::RenderTargetView* asSrgb = typeless->CreateRenderTargetView({.myFormat = DxgiFormat::Rgba8Srgb});
-	Gpu::RenderTargetView* asUnorm = typeless->CreateRenderTargetView({.myFormat = DxgiFormat::Rgba8});
+	Gpu::RenderTargetView* asSrgb =
+	    typeless->CreateRenderTargetView({.myFormat = Dds::Format::R8G8B8A8_UNORM_SRGB});
+	Gpu::RenderTargetView* asUnorm =
+	    typeless->CreateRenderTargetView({.myFormat = Dds::Format::R8G8B8A8_UNORM});
 	ASSERT_NE(asSrgb, nullptr);
 	ASSERT_NE(asUnorm, nullptr);
 	GetContext().ClearRenderTargetView(*asSrgb, half);
@@ -96,7 +98,7 @@ TEST_F(TextureTest, CubeFaceViewsAreSeparateTargets)
 	desc.myWidth = desc.myHeight = 16;
 	desc.myArraySize = 6;
 	desc.myMipLevels = 0;
-	desc.myFormat = DxgiFormat::Rgba8;
+	desc.myFormat = Dds::Format::R8G8B8A8_UNORM;
 	desc.myLabel = "cube";
 	Gpu::Texture* cube = MakeTexture(desc);
 	ASSERT_NE(cube, nullptr);
@@ -136,7 +138,7 @@ TEST_F(TextureTest, CubeFaceViewsAreSeparateTargets)
 
 TEST_F(TextureTest, MipViewsTargetOneLevelEach)
 {
-	Gpu::Texture* target = MakeTarget(DxgiFormat::Rgba8, 32, 16, 0);
+	Gpu::Texture* target = MakeTarget(Dds::Format::R8G8B8A8_UNORM, 32, 16, 0);
 	ASSERT_NE(target, nullptr);
 	ASSERT_EQ(target->GetMipLevels(), 6);
 	std::vector<Gpu::RenderTargetView*> mips;
@@ -162,7 +164,7 @@ TEST_F(TextureTest, UploadKeepsRowOrderAndChannelOrder)
 {
 	const uint8_t rgba[2][4][4] = {{{255, 0, 0, 255}, {0, 255, 0, 255}, {0, 0, 255, 255}, {9, 9, 9, 255}},
 	                               {{1, 2, 3, 4}, {5, 6, 7, 8}, {10, 20, 30, 40}, {50, 60, 70, 80}}};
-	Gpu::Texture* plain = MakeTarget(DxgiFormat::Rgba8, 4, 2);
+	Gpu::Texture* plain = MakeTarget(Dds::Format::R8G8B8A8_UNORM, 4, 2);
 	ASSERT_NE(plain, nullptr);
 	ASSERT_TRUE(plain->Upload(0, 0, rgba, 16));
 
@@ -178,7 +180,7 @@ TEST_F(TextureTest, UploadKeepsRowOrderAndChannelOrder)
 			bgra[y][x * 4 + 3] = rgba[y][x][3];
 		}
 	}
-	Gpu::Texture* swizzled = MakeTarget(DxgiFormat::Bgra8, 4, 2);
+	Gpu::Texture* swizzled = MakeTarget(Dds::Format::B8G8R8A8_UNORM, 4, 2);
 	ASSERT_NE(swizzled, nullptr);
 	ASSERT_TRUE(swizzled->Upload(0, 0, bgra, 20));
 
@@ -193,8 +195,8 @@ TEST_F(TextureTest, UploadKeepsRowOrderAndChannelOrder)
 
 TEST_F(TextureTest, CopiesMoveWholeTexturesAndSubresources)
 {
-	Gpu::Texture* source = MakeTarget(DxgiFormat::Rgba8, 8, 8, 2);
-	Gpu::Texture* copy = MakeTarget(DxgiFormat::Rgba8, 8, 8, 2);
+	Gpu::Texture* source = MakeTarget(Dds::Format::R8G8B8A8_UNORM, 8, 8, 2);
+	Gpu::Texture* copy = MakeTarget(Dds::Format::R8G8B8A8_UNORM, 8, 8, 2);
 	ASSERT_NE(source, nullptr);
 	ASSERT_NE(copy, nullptr);
 	const std::array<uint8_t, 4> top = {10, 20, 30, 255};
@@ -210,7 +212,7 @@ TEST_F(TextureTest, CopiesMoveWholeTexturesAndSubresources)
 	cubeDesc.myKind = Gpu::TextureKind::TextureCube;
 	cubeDesc.myWidth = cubeDesc.myHeight = 8;
 	cubeDesc.myArraySize = 6;
-	cubeDesc.myFormat = DxgiFormat::Rgba8;
+	cubeDesc.myFormat = Dds::Format::R8G8B8A8_UNORM;
 	Gpu::Texture* cube = MakeTexture(cubeDesc);
 	ASSERT_NE(cube, nullptr);
 	Gpu::RenderTargetView* face = cube->CreateRenderTargetView({.myFirstSlice = 5});
@@ -230,7 +232,7 @@ TEST_F(TextureTest, CopiesMoveWholeTexturesAndSubresources)
 		}
 	}
 
-	Gpu::Texture* other = MakeTarget(DxgiFormat::Rgba16Float, 8, 8, 2);
+	Gpu::Texture* other = MakeTarget(Dds::Format::R16G16B16A16_FLOAT, 8, 8, 2);
 	ASSERT_NE(other, nullptr);
 	EXPECT_FALSE(GetContext().CopyResource(*other, *source));
 	EXPECT_FALSE(GetContext().CopySubresourceRegion(*cube, 0, 5, 6, 6, 0, *source, 1, 0)); // past the edge
@@ -244,7 +246,7 @@ TEST_F(TextureTest, VolumeSlicesAndDepthTargets)
 	Gpu::TextureDesc volumeDesc;
 	volumeDesc.myKind = Gpu::TextureKind::Texture3D;
 	volumeDesc.myWidth = volumeDesc.myHeight = volumeDesc.myDepth = 4;
-	volumeDesc.myFormat = DxgiFormat::Rgba8;
+	volumeDesc.myFormat = Dds::Format::R8G8B8A8_UNORM;
 	Gpu::Texture* volume = MakeTexture(volumeDesc);
 	ASSERT_NE(volume, nullptr);
 	Gpu::RenderTargetView* slice1 = volume->CreateRenderTargetView({.myFirstSlice = 1});
@@ -258,9 +260,9 @@ TEST_F(TextureTest, VolumeSlicesAndDepthTargets)
 	ExpectUniform(GetContext(), *slice1, red);
 	ExpectUniform(GetContext(), *slice2, blue);
 
-	for (const uint32_t format : {DxgiFormat::D32Float, DxgiFormat::D24S8})
+	for (const Dds::Format format : {Dds::Format::D32_FLOAT, Dds::Format::D24_UNORM_S8_UINT})
 	{
-		SCOPED_TRACE(format);
+		SCOPED_TRACE(Dds::FormatName(format));
 		Gpu::Texture* depth = MakeTarget(format, 8, 4);
 		ASSERT_NE(depth, nullptr);
 		Gpu::DepthStencilView* view = depth->CreateDepthStencilView();
