@@ -16,6 +16,8 @@ PACKAGES=(
 	clang
 	# GPU layer: OpenGL through libepoxy on EGL, Mesa's llvmpipe for headless runs, PNG output
 	libepoxy-dev libegl-dev libgl1-mesa-dri libegl-mesa0 libpng-dev
+	# windows to present into (X11), and a virtual X server for the window tests
+	libx11-dev xvfb
 )
 
 missing=()

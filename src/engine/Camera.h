@@ -10,6 +10,8 @@ class Camera
 public:
 	// The aspect ratio is the engine's resolution width over height, taken once:
 	// a later change of resolution does not reach an existing camera.
+	// Takes the aspect ratio from the engine's SetupInfo (its defaults when no engine exists).
+	Camera();
 	explicit Camera(float anAspectRatio);
 
 	float GetFov() const { return myFov; }

@@ -51,8 +51,12 @@ constexpr Facts GetFacts(Format aFormat)
 		return {"D32_FLOAT", 4, false, false};
 	case Format::R32_FLOAT:
 		return {"R32_FLOAT", 4, false, false};
+	case Format::R24G8_TYPELESS:
+		return {"R24G8_TYPELESS", 4, false, false};
 	case Format::D24_UNORM_S8_UINT:
 		return {"D24_UNORM_S8_UINT", 4, false, false};
+	case Format::R24_UNORM_X8_TYPELESS:
+		return {"R24_UNORM_X8_TYPELESS", 4, false, false};
 	case Format::R8G8_UNORM:
 		return {"R8G8_UNORM", 2, false, false};
 	case Format::R16_FLOAT:

@@ -35,7 +35,9 @@ enum class Format : uint32_t
 	R16G16_FLOAT = 34,
 	D32_FLOAT = 40,
 	R32_FLOAT = 41,
+	R24G8_TYPELESS = 44,   // depth buffers that shaders also read
 	D24_UNORM_S8_UINT = 45,
+	R24_UNORM_X8_TYPELESS = 46,
 	R8G8_UNORM = 49,
 	R16_FLOAT = 54,
 	R8_UNORM = 61,

@@ -1,5 +1,7 @@
 #include "platform/gpu/Context.h"
 
+#include <algorithm>
+
 #include "platform/gpu/Buffer.h"
 #include "platform/gpu/Formats.h"
 #include "platform/gpu/Report.h"
@@ -77,11 +79,44 @@ void Context::Destroy()
 	myStateCache.BindReadFramebuffer(0);
 }
 
+void Context::ClearState()
+{
+	myStateCache.BindDrawFramebuffer(0);
+	myStateCache.BindReadFramebuffer(0);
+	myStateCache.UseProgram(0);
+	myInputLayout = nullptr;
+	for (VertexBinding& binding : myVertexBuffers)
+	{
+		binding = VertexBinding();
+	}
+	myIndexBuffer = 0;
+	myIndexBufferSize = 0;
+	myIndexOffset = 0;
+	myBuffersDirtyFlag = true;
+	myTopology = PrimitiveTopology::TriangleList;
+	for (int unit = 0; unit < StateCache::ourSamplerUnitCount; ++unit)
+	{
+		myStateCache.BindSampler(unit, 0);
+	}
+	myStateCache.SetBlendState(BlendState());
+	myStateCache.SetDepthStencilState(DepthStencilState());
+	myStateCache.SetRasterizerState(RasterizerState());
+	LUMORA_GL_CHECK("Gpu::Context::ClearState");
+}
+
+void Context::Flush()
+{
+	glFlush();
+}
+
 bool Context::SetRenderTargets(std::span<RenderTargetView* const> someColorViews,
                                const DepthStencilView* aDepthView)
 {
 	const GLuint framebuffer = myFramebufferCache.Get(someColorViews, aDepthView);
-	if (framebuffer == 0 && (!someColorViews.empty() || aDepthView))
+	const bool anyViewFlag =
+	    aDepthView != nullptr || std::any_of(someColorViews.begin(), someColorViews.end(),
+	                                         [](RenderTargetView* aView) { return aView; });
+	if (framebuffer == 0 && anyViewFlag)
 	{
 		return false;
 	}

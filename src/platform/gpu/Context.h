@@ -50,6 +50,12 @@ public:
 	void Init();
 	void Destroy();
 
+	// Direct3D's ClearState: no render targets, program, input layout, buffers or
+	// samplers bound, and the default blend, depth and rasterizer states.
+	void ClearState();
+	// Hands the queued commands to the GPU without waiting for them.
+	void Flush();
+
 	// Null entries leave a slot empty. Returns false (reported) when GL refuses the combination.
 	bool SetRenderTargets(std::span<RenderTargetView* const> someColorViews,
 	                      const DepthStencilView* aDepthView);

@@ -75,9 +75,71 @@ void GLAPIENTRY ForwardDebugMessage(GLenum, GLenum aType, GLuint anId, GLenum aS
 	}
 }
 #endif
+
+EGLConfig ChooseConfig(EGLDisplay aDisplay, EGLint aSurfaceType)
+{
+	const EGLint attributes[] = {EGL_SURFACE_TYPE,
+	                             aSurfaceType,
+	                             EGL_RENDERABLE_TYPE,
+	                             EGL_OPENGL_BIT,
+	                             EGL_RED_SIZE,
+	                             8,
+	                             EGL_GREEN_SIZE,
+	                             8,
+	                             EGL_BLUE_SIZE,
+	                             8,
+	                             EGL_ALPHA_SIZE,
+	                             8,
+	                             EGL_NONE};
+	EGLConfig config = nullptr;
+	EGLint configCount = 0;
+	if (!eglChooseConfig(aDisplay, attributes, &config, 1, &configCount) || configCount < 1)
+	{
+		return nullptr;
+	}
+	return config;
+}
+
+// A window surface needs a config of the window's own visual: on a 24-bit window
+// that is one without alpha (the back buffer is a texture, so nothing is lost).
+EGLConfig ChooseWindowConfig(EGLDisplay aDisplay, unsigned long aVisualId)
+{
+	const EGLint attributes[] = {EGL_SURFACE_TYPE,
+	                             EGL_WINDOW_BIT,
+	                             EGL_RENDERABLE_TYPE,
+	                             EGL_OPENGL_BIT,
+	                             EGL_RED_SIZE,
+	                             8,
+	                             EGL_GREEN_SIZE,
+	                             8,
+	                             EGL_BLUE_SIZE,
+	                             8,
+	                             EGL_NONE};
+	EGLint configCount = 0;
+	if (!eglChooseConfig(aDisplay, attributes, nullptr, 0, &configCount) || configCount < 1)
+	{
+		return nullptr;
+	}
+	std::vector<EGLConfig> configs(static_cast<size_t>(configCount));
+	if (!eglChooseConfig(aDisplay, attributes, configs.data(), configCount, &configCount))
+	{
+		return nullptr;
+	}
+	for (EGLint index = 0; index < configCount; ++index)
+	{
+		EGLint visualId = 0;
+		if (eglGetConfigAttrib(aDisplay, configs[static_cast<size_t>(index)], EGL_NATIVE_VISUAL_ID,
+		                       &visualId) &&
+		    static_cast<unsigned long>(visualId) == aVisualId)
+		{
+			return configs[static_cast<size_t>(index)];
+		}
+	}
+	return nullptr;
+}
 } // namespace
 
-bool Device::Init(int aWidth, int aHeight)
+bool Device::Init(int aWidth, int aHeight, WindowHandle aWindow)
 {
 	const char* function = "Gpu::Device::Init";
 	if (IsInitialized())
@@ -85,6 +147,7 @@ bool Device::Init(int aWidth, int aHeight)
 		ReportError(__LINE__, function, "The device is already initialized");
 		return false;
 	}
+	myFailure = DeviceFailure::NoDevice;
 	if (aWidth < 1 || aHeight < 1)
 	{
 		ReportError(__LINE__, function, "Bad back-buffer size %dx%d", aWidth, aHeight);
@@ -92,60 +155,128 @@ bool Device::Init(int aWidth, int aHeight)
 	}
 	myWidth = aWidth;
 	myHeight = aHeight;
+	myEglError = EGL_SUCCESS;
+	myRendererName.clear();
+	myVersionName.clear();
 
+	if (aWindow != 0 ? InitWindow(aWindow) : InitHeadless())
+	{
+		myFailure = DeviceFailure::None;
+		return true;
+	}
+	ReleaseDisplay();
+	myWindow.Destroy();
+	if (myFailure == DeviceFailure::VersionTooLow)
+	{
+		ReportError(__LINE__, function, "OpenGL 4.5 core profile is needed; %s offers only OpenGL %s",
+		            myRendererName.c_str(), myVersionName.c_str());
+	}
+	else if (aWindow == 0)
+	{
+		const char* clientExtensions = eglQueryString(EGL_NO_DISPLAY, EGL_EXTENSIONS);
+		ReportError(__LINE__, function,
+		            "No OpenGL 4.5 core context could be made (EGL error 0x%04x; surfaceless platform %s)",
+		            myEglError,
+		            HasExtension(clientExtensions, "EGL_MESA_platform_surfaceless") ? "present" : "missing");
+	}
+	return false;
+}
+
+bool Device::InitHeadless()
+{
 	const char* clientExtensions = eglQueryString(EGL_NO_DISPLAY, EGL_EXTENSIONS);
 	if (HasExtension(clientExtensions, "EGL_MESA_platform_surfaceless") &&
 	    HasExtension(clientExtensions, "EGL_EXT_platform_base"))
 	{
-		myDisplay = eglGetPlatformDisplayEXT(EGL_PLATFORM_SURFACELESS_MESA, EGL_DEFAULT_DISPLAY, nullptr);
-		if (myDisplay != EGL_NO_DISPLAY && eglInitialize(myDisplay, nullptr, nullptr) && CreateContext(true))
+		if (OpenDisplay(
+		        eglGetPlatformDisplayEXT(EGL_PLATFORM_SURFACELESS_MESA, EGL_DEFAULT_DISPLAY, nullptr)) &&
+		    HasExtension(eglQueryString(myDisplay, EGL_EXTENSIONS), "EGL_KHR_surfaceless_context") &&
+		    CreateContext(SurfaceKind::Surfaceless, ChooseConfig(myDisplay, 0)))
 		{
 			return true;
 		}
 		ReleaseDisplay();
+		if (myFailure == DeviceFailure::VersionTooLow)
+		{
+			return false; // the same driver answers the pbuffer path
+		}
 	}
-	myDisplay = eglGetDisplay(EGL_DEFAULT_DISPLAY);
-	if (myDisplay != EGL_NO_DISPLAY && eglInitialize(myDisplay, nullptr, nullptr) && CreateContext(false))
-	{
-		return true;
-	}
-	ReleaseDisplay();
-	ReportError(__LINE__, function,
-	            "No OpenGL 4.5 core context could be made (EGL error 0x%04x; surfaceless platform %s)",
-	            eglGetError(),
-	            HasExtension(clientExtensions, "EGL_MESA_platform_surfaceless") ? "present" : "missing");
-	return false;
+	return OpenDisplay(eglGetDisplay(EGL_DEFAULT_DISPLAY)) &&
+	       CreateContext(SurfaceKind::Pbuffer, ChooseConfig(myDisplay, EGL_PBUFFER_BIT));
 }
 
-bool Device::CreateContext(bool aSurfacelessFlag)
+bool Device::InitWindow(WindowHandle aWindow)
 {
+	const char* function = "Gpu::Device::Init";
+	if (!myWindow.Init(aWindow, function))
+	{
+		return false;
+	}
+	const char* clientExtensions = eglQueryString(EGL_NO_DISPLAY, EGL_EXTENSIONS);
+	const bool x11Flag = HasExtension(clientExtensions, "EGL_EXT_platform_base") &&
+	                     (HasExtension(clientExtensions, "EGL_KHR_platform_x11") ||
+	                      HasExtension(clientExtensions, "EGL_EXT_platform_x11"));
+	if (!x11Flag ||
+	    !OpenDisplay(eglGetPlatformDisplayEXT(EGL_PLATFORM_X11_KHR, myWindow.GetDisplay(), nullptr)))
+	{
+		ReportError(__LINE__, function, "EGL cannot use X display '%s' (X11 platform %s, EGL error 0x%04x)",
+		            myWindow.GetDisplayName().c_str(), x11Flag ? "present" : "missing", eglGetError());
+		return false;
+	}
+	const EGLConfig config = ChooseWindowConfig(myDisplay, myWindow.GetVisualId());
+	if (config == nullptr)
+	{
+		ReportError(__LINE__, function, "No EGL config draws into window 0x%lx (X visual 0x%lx)", aWindow,
+		            myWindow.GetVisualId());
+		return false;
+	}
+	myWindowConfig = config;
+	if (!myWindow.GetSize(mySurfaceWidth, mySurfaceHeight) || !CreateContext(SurfaceKind::Window, config))
+	{
+		if (myFailure != DeviceFailure::VersionTooLow)
+		{
+			ReportError(__LINE__, function,
+			            "No OpenGL 4.5 core context for window 0x%lx on X display '%s' (EGL error 0x%04x)",
+			            aWindow, myWindow.GetDisplayName().c_str(), myEglError);
+		}
+		return false;
+	}
+	myWindow.Show();
+	return true;
+}
+
+bool Device::OpenDisplay(EGLDisplay aDisplay)
+{
+	if (aDisplay == EGL_NO_DISPLAY || !eglInitialize(aDisplay, nullptr, nullptr))
+	{
+		myEglError = eglGetError();
+		return false;
+	}
+	myDisplay = aDisplay;
 	AddDisplayUser(myDisplay);
-	if (!eglBindAPI(EGL_OPENGL_API))
+	return true;
+}
+
+bool Device::CreateContext(SurfaceKind aKind, EGLConfig aConfig)
+{
+	if (aConfig == nullptr || !eglBindAPI(EGL_OPENGL_API))
 	{
+		myEglError = eglGetError();
 		return false;
 	}
-	if (aSurfacelessFlag &&
-	    !HasExtension(eglQueryString(myDisplay, EGL_EXTENSIONS), "EGL_KHR_surfaceless_context"))
+	if (aKind == SurfaceKind::Pbuffer)
 	{
-		return false;
+		const EGLint surfaceAttributes[] = {EGL_WIDTH, myWidth, EGL_HEIGHT, myHeight, EGL_NONE};
+		mySurface = eglCreatePbufferSurface(myDisplay, aConfig, surfaceAttributes);
 	}
-	const EGLint configAttributes[] = {EGL_SURFACE_TYPE,
-	                                   aSurfacelessFlag ? 0 : EGL_PBUFFER_BIT,
-	                                   EGL_RENDERABLE_TYPE,
-	                                   EGL_OPENGL_BIT,
-	                                   EGL_RED_SIZE,
-	                                   8,
-	                                   EGL_GREEN_SIZE,
-	                                   8,
-	                                   EGL_BLUE_SIZE,
-	                                   8,
-	                                   EGL_ALPHA_SIZE,
-	                                   8,
-	                                   EGL_NONE};
-	EGLConfig config = nullptr;
-	EGLint configCount = 0;
-	if (!eglChooseConfig(myDisplay, configAttributes, &config, 1, &configCount) || configCount < 1)
+	else if (aKind == SurfaceKind::Window)
 	{
+		mySurface = eglCreateWindowSurface(myDisplay, aConfig,
+		                                   static_cast<EGLNativeWindowType>(myWindow.GetHandle()), nullptr);
+	}
+	if (aKind != SurfaceKind::Surfaceless && mySurface == EGL_NO_SURFACE)
+	{
+		myEglError = eglGetError();
 		return false;
 	}
 #ifdef NDEBUG
@@ -162,26 +293,53 @@ bool Device::CreateContext(bool aSurfacelessFlag)
 	                                    EGL_CONTEXT_OPENGL_DEBUG,
 	                                    debugFlag,
 	                                    EGL_NONE};
-	myContextHandle = eglCreateContext(myDisplay, config, EGL_NO_CONTEXT, contextAttributes);
+	myContextHandle = eglCreateContext(myDisplay, aConfig, EGL_NO_CONTEXT, contextAttributes);
 	if (myContextHandle == EGL_NO_CONTEXT)
 	{
+		myEglError = eglGetError();
+		ProbeLowerVersion(aConfig);
 		return false;
 	}
-	if (!aSurfacelessFlag)
+	mySurfacelessFlag = aKind == SurfaceKind::Surfaceless;
+	// Not MakeCurrent: a failure here is one of several attempts, reported by Init.
+	if (!eglMakeCurrent(myDisplay, mySurface, mySurface, myContextHandle))
 	{
-		const EGLint surfaceAttributes[] = {EGL_WIDTH, myWidth, EGL_HEIGHT, myHeight, EGL_NONE};
-		mySurface = eglCreatePbufferSurface(myDisplay, config, surfaceAttributes);
-		if (mySurface == EGL_NO_SURFACE)
-		{
-			return false;
-		}
-	}
-	mySurfacelessFlag = aSurfacelessFlag;
-	if (!MakeCurrent())
-	{
+		myEglError = eglGetError();
 		return false;
 	}
+	return SetUpContext();
+}
 
+void Device::ProbeLowerVersion(EGLConfig aConfig)
+{
+	// No attributes: the driver's best context of any profile and version.
+	const EGLContext probe = eglCreateContext(myDisplay, aConfig, EGL_NO_CONTEXT, nullptr);
+	if (probe == EGL_NO_CONTEXT)
+	{
+		return;
+	}
+	if (eglMakeCurrent(myDisplay, mySurface, mySurface, probe))
+	{
+		// GL_MAJOR_VERSION exists from 3.0 on; older contexts leave the zeros.
+		GLint major = 0;
+		GLint minor = 0;
+		glGetIntegerv(GL_MAJOR_VERSION, &major);
+		glGetIntegerv(GL_MINOR_VERSION, &minor);
+		const GLubyte* version = glGetString(GL_VERSION);
+		const GLubyte* renderer = glGetString(GL_RENDERER);
+		if (version != nullptr && major * 10 + minor < 45)
+		{
+			myVersionName = reinterpret_cast<const char*>(version);
+			myRendererName = renderer != nullptr ? reinterpret_cast<const char*>(renderer) : "";
+			myFailure = DeviceFailure::VersionTooLow;
+		}
+		eglMakeCurrent(myDisplay, EGL_NO_SURFACE, EGL_NO_SURFACE, EGL_NO_CONTEXT);
+	}
+	eglDestroyContext(myDisplay, probe);
+}
+
+bool Device::SetUpContext()
+{
 	// A driver may hand out a compatible higher version, never a lower one that passes.
 	GLint major = 0;
 	GLint minor = 0;
@@ -189,12 +347,13 @@ bool Device::CreateContext(bool aSurfacelessFlag)
 	glGetIntegerv(GL_MAJOR_VERSION, &major);
 	glGetIntegerv(GL_MINOR_VERSION, &minor);
 	glGetIntegerv(GL_CONTEXT_PROFILE_MASK, &profile);
-	if (major * 10 + minor < 45 || (profile & GL_CONTEXT_CORE_PROFILE_BIT) == 0)
-	{
-		return false;
-	}
 	myRendererName = reinterpret_cast<const char*>(glGetString(GL_RENDERER));
 	myVersionName = reinterpret_cast<const char*>(glGetString(GL_VERSION));
+	if (major * 10 + minor < 45 || (profile & GL_CONTEXT_CORE_PROFILE_BIT) == 0)
+	{
+		myFailure = DeviceFailure::VersionTooLow;
+		return false;
+	}
 #ifndef NDEBUG
 	glEnable(GL_DEBUG_OUTPUT);
 	glEnable(GL_DEBUG_OUTPUT_SYNCHRONOUS);
@@ -226,6 +385,7 @@ void Device::ReleaseDisplay()
 		eglTerminate(myDisplay);
 	}
 	myDisplay = EGL_NO_DISPLAY;
+	mySurfacelessFlag = false;
 }
 
 void Device::Destroy()
@@ -237,6 +397,9 @@ void Device::Destroy()
 	MakeCurrent();
 	myContext.Destroy();
 	ReleaseDisplay();
+	// The X connection goes after the EGL display that draws through it.
+	myWindow.Destroy();
+	mySwapInterval = -1;
 	// EGL keeps per-thread state (the bound API, the last error) until this.
 	eglReleaseThread();
 	myRendererName.clear();
@@ -264,5 +427,85 @@ void Device::ReleaseCurrent()
 	{
 		eglMakeCurrent(myDisplay, EGL_NO_SURFACE, EGL_NO_SURFACE, EGL_NO_CONTEXT);
 	}
+}
+} // namespace Gpu
+
+namespace Gpu
+{
+bool Device::GetWindowSize(int& aWidth, int& aHeight) const
+{
+	if (!HasWindow())
+	{
+		ReportError(__LINE__, "Gpu::Device::GetWindowSize", "The device has no window");
+		return false;
+	}
+	return myWindow.GetSize(aWidth, aHeight);
+}
+
+bool Device::UpdateWindowSurface(int aWidth, int aHeight)
+{
+	const char* function = "Gpu::Device::UpdateWindowSurface";
+	if (!IsInitialized() || !HasWindow())
+	{
+		ReportError(__LINE__, function, "The device has no window");
+		return false;
+	}
+	if (aWidth == mySurfaceWidth && aHeight == mySurfaceHeight)
+	{
+		return true;
+	}
+	// Mesa's software path sizes a window's framebuffer when the surface is made and
+	// after each swap, so the first frame after a resize would be cut to the old
+	// size. A new surface takes the window's size at once.
+	eglMakeCurrent(myDisplay, EGL_NO_SURFACE, EGL_NO_SURFACE, EGL_NO_CONTEXT);
+	eglDestroySurface(myDisplay, mySurface);
+	mySurface = eglCreateWindowSurface(myDisplay, myWindowConfig,
+	                                   static_cast<EGLNativeWindowType>(myWindow.GetHandle()), nullptr);
+	mySwapInterval = -1; // the interval belongs to the surface
+	if (mySurface == EGL_NO_SURFACE)
+	{
+		ReportError(__LINE__, function, "Cannot make a surface for window 0x%lx again (EGL error 0x%04x)",
+		            myWindow.GetHandle(), eglGetError());
+		eglMakeCurrent(myDisplay, EGL_NO_SURFACE, EGL_NO_SURFACE, myContextHandle);
+		return false;
+	}
+	mySurfaceWidth = aWidth;
+	mySurfaceHeight = aHeight;
+	if (!eglMakeCurrent(myDisplay, mySurface, mySurface, myContextHandle))
+	{
+		ReportError(__LINE__, function, "eglMakeCurrent failed (EGL error 0x%04x)", eglGetError());
+		return false;
+	}
+	return true;
+}
+
+bool Device::SwapBuffers(int aSyncInterval)
+{
+	const char* function = "Gpu::Device::SwapBuffers";
+	if (!IsInitialized() || !HasWindow())
+	{
+		ReportError(__LINE__, function, "The device has no window to show");
+		return false;
+	}
+	if (aSyncInterval != mySwapInterval)
+	{
+		// Applies to the surface of the current context; the driver clamps it to its range.
+		if (!eglSwapInterval(myDisplay, aSyncInterval))
+		{
+			ReportError(__LINE__, function, "eglSwapInterval(%d) failed (EGL error 0x%04x)", aSyncInterval,
+			            eglGetError());
+			return false;
+		}
+		mySwapInterval = aSyncInterval;
+	}
+	if (!eglSwapBuffers(myDisplay, mySurface))
+	{
+		ReportError(__LINE__, function, "eglSwapBuffers failed on window 0x%lx (EGL error 0x%04x)",
+		            myWindow.GetHandle(), eglGetError());
+		return false;
+	}
+	// Mesa's software path puts the image through this connection and may leave it queued.
+	myWindow.Flush();
+	return true;
 }
 } // namespace Gpu

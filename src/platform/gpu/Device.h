@@ -2,7 +2,12 @@
 // Device: the GL context that every GPU object of the editor lives in.
 //
 //   Gpu::Device device;
-//   if (!device.Init(160, 90)) { ... reported: no OpenGL 4.5 core context ... }
+//   if (!device.Init(160, 90, window))        // window 0: headless
+//   {
+//       if (device.GetFailure() == Gpu::DeviceFailure::VersionTooLow) { ... GetVersionName() says what there
+//       is ... }
+//       ...
+//   }
 //   device.ReleaseCurrent();      // the UI thread lets go when it clears the busy flag
 //   ...                           // on the render thread, holding the busy flag:
 //   device.MakeCurrent();
@@ -12,19 +17,31 @@
 //   device.Destroy();             // with the context current: GPU objects first
 //
 // Init(width, height) is the headless device: EGL surfaceless on Mesa, or a
-// pbuffer of that size where the surfaceless platform is missing. The context is
-// OpenGL 4.5 core (with the debug flag in debug builds) and is left current on
-// the calling thread. A GL context is current on one thread at a time: whichever
-// thread holds the editor's busy flag calls MakeCurrent before touching the GPU
-// and ReleaseCurrent when it clears the flag.
+// pbuffer of that size where the surfaceless platform is missing. Init(width,
+// height, window) opens the X display named by $DISPLAY, makes an EGL window
+// surface on that X11 window and maps the window; a Gpu::SwapChain then presents
+// into it. Either way the context is OpenGL 4.5 core (with the debug flag in
+// debug builds), runs under the Direct3D conventions of Gpu::Context, and is left
+// current on the calling thread. A GL context is current on one thread at a time:
+// whichever thread holds the editor's busy flag calls MakeCurrent before touching
+// the GPU and ReleaseCurrent when it clears the flag.
 
 #include <epoxy/egl.h>
 #include <string>
 
 #include "platform/gpu/Context.h"
+#include "platform/gpu/WindowX11.h"
 
 namespace Gpu
 {
+// Why the last Init failed, for the engine's message to the user.
+enum class DeviceFailure
+{
+	None,
+	NoDevice,      // no display, no window, or no GL context at all
+	VersionTooLow, // a GL context exists, but not OpenGL 4.5 core
+};
+
 class Device
 {
 public:
@@ -33,32 +50,66 @@ public:
 	Device(const Device&) = delete;
 	Device& operator=(const Device&) = delete;
 
-	bool Init(int aWidth, int aHeight);
+	bool Init(int aWidth, int aHeight, WindowHandle aWindow = 0);
 	void Destroy();
 
 	bool MakeCurrent();
 	void ReleaseCurrent();
 
 	bool IsInitialized() const { return myContextHandle != EGL_NO_CONTEXT; }
+	DeviceFailure GetFailure() const { return myFailure; }
 	Context& GetContext() { return myContext; }
 	int GetWidth() const { return myWidth; }
 	int GetHeight() const { return myHeight; }
-	// GL_RENDERER and GL_VERSION as the driver reports them ("llvmpipe (LLVM 15.0.6, 256 bits)").
+	// GL_RENDERER and GL_VERSION as the driver reports them ("llvmpipe (LLVM 15.0.6, 256 bits)");
+	// after a VersionTooLow failure, those of the best context the driver could make.
 	const std::string& GetRendererName() const { return myRendererName; }
 	const std::string& GetVersionName() const { return myVersionName; }
 	// True when the display is EGL's surfaceless platform rather than the pbuffer fallback.
 	bool IsSurfaceless() const { return mySurfacelessFlag; }
 
+	bool HasWindow() const { return myWindow.IsInitialized(); }
+	WindowHandle GetWindow() const { return myWindow.GetHandle(); }
+	// The window's size now; false (reported) without a window or when it is gone.
+	bool GetWindowSize(int& aWidth, int& aHeight) const;
+	// Gives the window's framebuffer the window's new size, with the context current on
+	// this thread (the EGL surface is made anew). Nothing happens when the size is unchanged.
+	bool UpdateWindowSurface(int aWidth, int aHeight);
+	// Shows what was drawn into the window's default framebuffer, after aSyncInterval
+	// vertical blanks (0: at once; the driver clamps to what it supports).
+	bool SwapBuffers(int aSyncInterval);
+
 private:
-	bool CreateContext(bool aSurfacelessFlag);
+	enum class SurfaceKind
+	{
+		Surfaceless,
+		Pbuffer,
+		Window,
+	};
+
+	bool InitHeadless();
+	bool InitWindow(WindowHandle aWindow);
+	bool OpenDisplay(EGLDisplay aDisplay);
+	bool CreateContext(SurfaceKind aKind, EGLConfig aConfig);
+	// After a failed 4.5 core request: reads the version of a plain context, if one can be made.
+	void ProbeLowerVersion(EGLConfig aConfig);
+	// Everything a new context needs, the same for windows and headless devices.
+	bool SetUpContext();
 	void ReleaseDisplay();
 
 	EGLDisplay myDisplay = EGL_NO_DISPLAY;
 	EGLContext myContextHandle = EGL_NO_CONTEXT;
 	EGLSurface mySurface = EGL_NO_SURFACE;
+	EGLConfig myWindowConfig = nullptr;
+	int mySurfaceWidth = 0; // the window's size when its surface was made
+	int mySurfaceHeight = 0;
+	WindowX11 myWindow;
 	Context myContext;
+	DeviceFailure myFailure = DeviceFailure::None;
 	int myWidth = 0;
 	int myHeight = 0;
+	int mySwapInterval = -1;         // not set yet
+	EGLint myEglError = EGL_SUCCESS; // of the last failed attempt, for the report
 	bool mySurfacelessFlag = false;
 	std::string myRendererName;
 	std::string myVersionName;

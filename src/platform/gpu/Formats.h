@@ -108,20 +108,25 @@ constexpr FormatInfo GetFormatInfo(Dds::Format aFormat)
 		return Depth(GL_DEPTH_COMPONENT32F, GL_DEPTH_COMPONENT, GL_FLOAT, false);
 	case Dds::Format::R32_FLOAT:
 		return Plain(GL_R32F, GL_RED, GL_FLOAT, 4);
+	case Dds::Format::R24G8_TYPELESS:        // storage of a depth buffer that shaders read
+	case Dds::Format::R24_UNORM_X8_TYPELESS: // its depth as a texture
 	case Dds::Format::D24_UNORM_S8_UINT:
 		return Depth(GL_DEPTH24_STENCIL8, GL_DEPTH_STENCIL, GL_UNSIGNED_INT_24_8, true);
 	case Dds::Format::R16_FLOAT:
 		return Plain(GL_R16F, GL_RED, GL_HALF_FLOAT, 2);
 	case Dds::Format::R8_UNORM:
 		return Plain(GL_R8, GL_RED, GL_UNSIGNED_BYTE, 1);
+	case Dds::Format::BC1_TYPELESS: // storage that UNORM and UNORM_SRGB views share
 	case Dds::Format::BC1_UNORM: // Direct3D's BC1 always has a 1-bit alpha
 		return Block(GL_COMPRESSED_RGBA_S3TC_DXT1_EXT, 8, false);
 	case Dds::Format::BC1_UNORM_SRGB:
 		return Block(GL_COMPRESSED_SRGB_ALPHA_S3TC_DXT1_EXT, 8, true);
+	case Dds::Format::BC2_TYPELESS: // storage that UNORM and UNORM_SRGB views share
 	case Dds::Format::BC2_UNORM:
 		return Block(GL_COMPRESSED_RGBA_S3TC_DXT3_EXT, 16, false);
 	case Dds::Format::BC2_UNORM_SRGB:
 		return Block(GL_COMPRESSED_SRGB_ALPHA_S3TC_DXT3_EXT, 16, true);
+	case Dds::Format::BC3_TYPELESS: // storage that UNORM and UNORM_SRGB views share
 	case Dds::Format::BC3_UNORM:
 		return Block(GL_COMPRESSED_RGBA_S3TC_DXT5_EXT, 16, false);
 	case Dds::Format::BC3_UNORM_SRGB:

@@ -51,6 +51,11 @@ GLuint FramebufferCache::Get(std::span<RenderTargetView* const> someColorViews,
 		key.myColorIds[slot] = someColorViews[slot] ? someColorViews[slot]->GetUniqueId() : 0;
 	}
 	key.myDepthId = aDepthView ? aDepthView->GetUniqueId() : 0;
+	if (key == Key())
+	{
+		// Nothing bound (Direct3D allows it): no framebuffer, rather than an incomplete one.
+		return 0;
+	}
 	const auto found = std::find_if(myEntries.begin(), myEntries.end(),
 	                                [&key](const Entry& anEntry) { return anEntry.myKey == key; });
 	if (found != myEntries.end())

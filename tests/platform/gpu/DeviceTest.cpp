@@ -2,7 +2,11 @@
 #include "platform/gpu/Formats.h"
 #include "platform/gpu/Readback.h"
 
+#include <cstdio>
+#include <spawn.h>
+#include <sys/wait.h>
 #include <thread>
+#include <unistd.h>
 
 #include "GpuTest.h"
 
@@ -180,3 +184,109 @@ TEST_F(DeviceTest, BuffersStartZeroAndOnlyDynamicOnesChange)
 	dynamic.Destroy();
 }
 } // namespace
+
+// Mesa reads MESA_GL_VERSION_OVERRIDE once per process, so a driver that offers
+// only an older GL is played by a child process: this test's binary again, run
+// for this test alone with the variable set, which reports how Init failed.
+namespace
+{
+constexpr const char* ourProbeVariable = "LUMORA_DEVICE_PROBE";
+
+struct ProbeResult
+{
+	int myExitCode = -1;
+	std::string myOutput;
+};
+
+ProbeResult RunProbe(const char* aGlVersion)
+{
+	const testing::TestInfo* test = testing::UnitTest::GetInstance()->current_test_info();
+	const std::string filter = std::string("--gtest_filter=") + test->test_suite_name() + "." + test->name();
+	std::vector<std::string> environment = {std::string(ourProbeVariable) + "=1",
+	                                        std::string("MESA_GL_VERSION_OVERRIDE=") + aGlVersion};
+	for (char** entry = environ; *entry != nullptr; ++entry)
+	{
+		if (std::strncmp(*entry, "MESA_GL_VERSION_OVERRIDE=", 25) != 0)
+		{
+			environment.emplace_back(*entry);
+		}
+	}
+	std::vector<char*> environmentPointers;
+	for (std::string& entry : environment)
+	{
+		environmentPointers.push_back(entry.data());
+	}
+	environmentPointers.push_back(nullptr);
+	char* arguments[] = {const_cast<char*>("gpu_tests"), const_cast<char*>(filter.c_str()), nullptr};
+
+	int pipeEnds[2];
+	ProbeResult result;
+	if (pipe(pipeEnds) != 0)
+	{
+		return result;
+	}
+	posix_spawn_file_actions_t actions;
+	posix_spawn_file_actions_init(&actions);
+	posix_spawn_file_actions_adddup2(&actions, pipeEnds[1], STDOUT_FILENO);
+	posix_spawn_file_actions_adddup2(&actions, pipeEnds[1], STDERR_FILENO);
+	posix_spawn_file_actions_addclose(&actions, pipeEnds[0]);
+	pid_t child = -1;
+	const int spawned =
+	    posix_spawn(&child, "/proc/self/exe", &actions, nullptr, arguments, environmentPointers.data());
+	posix_spawn_file_actions_destroy(&actions);
+	close(pipeEnds[1]);
+	char buffer[4096];
+	for (ssize_t count; spawned == 0 && (count = read(pipeEnds[0], buffer, sizeof(buffer))) > 0;)
+	{
+		result.myOutput.append(buffer, static_cast<size_t>(count));
+	}
+	close(pipeEnds[0]);
+	int status = 0;
+	if (spawned == 0 && waitpid(child, &status, 0) == child && WIFEXITED(status))
+	{
+		result.myExitCode = WEXITSTATUS(status);
+	}
+	return result;
+}
+} // namespace
+
+TEST(DeviceFailureTest, OlderGlIsVersionTooLowNotNoDevice)
+{
+	if (std::getenv(ourProbeVariable) != nullptr)
+	{
+		// The child: report through standard error, answer with the failure's number.
+		Gpu::Device device;
+		const bool initializedFlag = device.Init(16, 16);
+		std::printf("probe: %s; version '%s'\n", initializedFlag ? "initialized" : "failed",
+		            device.GetVersionName().c_str());
+		std::fflush(stdout);
+		device.Destroy();
+		_exit(static_cast<int>(device.GetFailure()));
+	}
+	{
+		Gpu::Device device;
+		if (!device.Init(16, 16))
+		{
+			const char* ci = std::getenv("CI");
+			if (ci && std::strcmp(ci, "true") == 0)
+			{
+				FAIL() << "No OpenGL 4.5 core context under CI";
+			}
+			GTEST_SKIP() << "No OpenGL 4.5 core context";
+		}
+		PinLoadedGlLibraries();
+		EXPECT_EQ(device.GetFailure(), Gpu::DeviceFailure::None);
+		device.Destroy();
+	}
+
+	const ProbeResult older = RunProbe("4.1");
+	EXPECT_EQ(older.myExitCode, static_cast<int>(Gpu::DeviceFailure::VersionTooLow)) << older.myOutput;
+	EXPECT_NE(older.myOutput.find("Gpu::Device::Init"), std::string::npos) << older.myOutput;
+	EXPECT_NE(older.myOutput.find("OpenGL 4.5 core profile is needed"), std::string::npos) << older.myOutput;
+	EXPECT_NE(older.myOutput.find("version '4.1"), std::string::npos) << older.myOutput;
+
+	// The same child with the driver's own version initializes: the probe itself is sound.
+	const ProbeResult current = RunProbe("4.5");
+	EXPECT_EQ(current.myExitCode, static_cast<int>(Gpu::DeviceFailure::None)) << current.myOutput;
+	EXPECT_NE(current.myOutput.find("probe: initialized"), std::string::npos) << current.myOutput;
+}

@@ -1,0 +1,22 @@
+# Compiles every effect source under data/ into its
+# .fxal beside it, with lumora-fxc, as part of the default build. Each command has
+# a depfile listing the includes, so editing an include recompiles its effects.
+# lumora-fxc validates with a headless GL context (llvmpipe on a build machine).
+# Sources are named relative to the repository root, as the engine names them.
+file(GLOB_RECURSE LUMORA_EFFECT_SOURCES CONFIGURE_DEPENDS "${LUMORA_SOURCE_ROOT}/data/*.fx")
+set(LUMORA_EFFECT_OUTPUTS)
+foreach(source IN LISTS LUMORA_EFFECT_SOURCES)
+  file(RELATIVE_PATH relative "${LUMORA_SOURCE_ROOT}" "${source}")
+  string(MAKE_C_IDENTIFIER "${relative}" depname)
+  set(output "${source}al")
+  set(depfile "${CMAKE_BINARY_DIR}/effects/${depname}.d")
+  add_custom_command(OUTPUT "${output}"
+    COMMAND lumora_fxc "${relative}" -o "${relative}al" --depfile "${depfile}"
+    DEPENDS "${source}" lumora_fxc
+    DEPFILE "${depfile}"
+    WORKING_DIRECTORY "${LUMORA_SOURCE_ROOT}"
+    COMMENT "Compiling effect ${relative}"
+    VERBATIM)
+  list(APPEND LUMORA_EFFECT_OUTPUTS "${output}")
+endforeach()
+add_custom_target(lumora_effects ALL DEPENDS ${LUMORA_EFFECT_OUTPUTS})

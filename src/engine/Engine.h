@@ -1,0 +1,105 @@
+#pragma once
+// Engine: the process-wide owner of the GPU device, the swap chain on the host's
+// window, the back buffer and the depth buffer, and the resource containers.
+//
+//   Gpu::WindowHandle window = 0;               // 0: headless, else an X11 window id
+//   if (!Zeph::Engine::Create(window, 1280, 720)) { ... }   // still call ShutDown
+//   Zeph::Engine* engine = Zeph::Engine::GetInstance();
+//   ... draw into engine->GetBackBufferView() ...
+//   engine->Present();
+//   Zeph::Engine::ShutDown();                   // GetInstance() is null afterwards
+//
+// The GL context is current on one thread at a time: the thread that works with the
+// engine makes it current (MakeContextCurrent) and releases it when it hands over.
+// Create leaves it current on the creating thread.
+
+#include <atomic>
+#include <memory>
+
+#include "engine/EffectContainer.h"
+#include "engine/SetupInfo.h"
+#include "engine/TextureContainer.h"
+#include "platform/gpu/Device.h"
+#include "platform/gpu/SwapChain.h"
+#include "platform/gpu/Texture.h"
+
+namespace Zeph
+{
+class Engine
+{
+public:
+	enum class DriverType
+	{
+		HARDWARE,
+	};
+
+	static bool Create(Gpu::WindowHandle& aWindowHandle, int aWidth, int aHeight);
+	static void ShutDown();
+	static Engine* GetInstance() { return ourInstance; }
+
+	TextureContainer& GetTextureContainer() { return myTextureContainer; }
+	EffectContainer& GetEffectContainer() { return myEffectContainer; }
+	SetupInfo& GetSetupInfo() { return mySetupInfo; }
+	const SetupInfo& GetSetupInfo() const { return mySetupInfo; }
+
+	Gpu::Device& GetDevice() { return myDevice; }
+	Gpu::Context& GetContext() { return myDevice.GetContext(); }
+	Gpu::Texture* GetBackBuffer() { return mySwapChain.GetBuffer(); }
+	Gpu::RenderTargetView* GetBackBufferView() const { return myBackBufferView; }
+	Gpu::DepthStencilView* GetDepthStencilView() const { return myDepthStencilView; }
+	Gpu::ShaderResourceView* GetDepthShaderView() const { return myDepthShaderView; }
+	int GetFeatureLevel() const { return myFeatureLevel; }
+	unsigned int GetMultisampleQuality() const { return myMultisampleQuality; }
+
+	// (Re)creates the back buffer and the depth buffer at the given size and binds
+	// them with a full viewport; start-up runs it, and so does a resize.
+	bool SetupRenderTargets(int aWidth, int aHeight);
+
+	// The set-up flag: waits, 1 ms at a time, while another caller holds it, then
+	// takes it. Render-target set-up and the texture container's copies hold it.
+	void AcquireSetupFlag();
+	void ReleaseSetupFlag();
+	bool IsSettingUpTargets() const { return myIsSettingUpTargets.load(); }
+
+	bool MakeContextCurrent() { return myDevice.MakeCurrent(); }
+	void ReleaseContext() { myDevice.ReleaseCurrent(); }
+
+	virtual void Present();
+	virtual ~Engine();
+
+private:
+	Engine() = default;
+	Engine(const Engine&) = delete;
+	Engine& operator=(const Engine&) = delete;
+
+	bool Init(Gpu::WindowHandle aWindowHandle, int aWidth, int aHeight);
+	bool D3DDeviceSetup(int aWidth, int aHeight);
+	bool SwapChainSetup(int aWidth, int aHeight);
+	bool CreateTargets(int aWidth, int aHeight);
+	void ReleaseTargets();
+
+	std::atomic<bool> myIsSettingUpTargets = false;
+	bool myUseMultisampling = false;
+	unsigned int myMultisampleQuality = 0;
+	DriverType myDriverType = DriverType::HARDWARE;
+	// The GL version the context was made with, as major * 10 + minor (45 for 4.5).
+	int myFeatureLevel = 0;
+	Gpu::Device myDevice; // the device with its immediate context
+	Gpu::SwapChain mySwapChain;
+	Gpu::RenderTargetView* myBackBufferView = nullptr;
+	Gpu::DepthStencilView* myDepthStencilView = nullptr;
+	std::unique_ptr<Gpu::Texture> myDepthTexture;
+	Gpu::ShaderResourceView* myDepthShaderView = nullptr;
+	Gpu::WindowHandle myWindow = 0;
+	TextureContainer myTextureContainer;
+	EffectContainer myEffectContainer;
+	// A container that takes only DDS files; nothing loads through it yet, and it is
+	// cleared with the others at shutdown.
+	TextureContainer myDdsTextureContainer{{".dds", ".DDS"}};
+	SetupInfo mySetupInfo;
+	unsigned int myRefreshRateNumerator = 60;
+	unsigned int myRefreshRateDenominator = 1;
+
+	static Engine* ourInstance;
+};
+} // namespace Zeph

@@ -1,0 +1,120 @@
+#pragma once
+// The fixture for engine tests that need a GPU: a log in a scratch directory (no
+// level fatal, so reports can be read back), and an engine created on request.
+// Without a GL context the test is skipped, except under CI=true. Every critical
+// report fails the test unless the test took it with TakeLog().
+
+#include <bitset>
+#include <gtest/gtest.h>
+#include <string>
+#include <vector>
+
+#include "core/Matrix44.h"
+#include "engine/Debug.h"
+#include "engine/Engine.h"
+#include "platform/gpu/Buffer.h"
+#include "platform/gpu/InputLayout.h"
+#include "support/GlSupport.h"
+#include "support/TestSupport.h"
+
+class EngineTest : public testing::Test
+{
+protected:
+	void SetUp() override
+	{
+		myLogPath = myScratch.File("DebugLogger.txt");
+		ASSERT_TRUE(Debug::Create(myLogPath, std::bitset<4>(0)));
+	}
+
+	void TearDown() override
+	{
+		Zeph::Engine::ShutDown();
+		const std::string rest = TakeLog();
+		Debug::Destroy();
+		EXPECT_EQ(rest.find("CRITICAL ERROR"), std::string::npos) << "Unexpected reports:\n" << rest;
+	}
+
+	// Creates the engine headless (or on aWindow); skips the test when no GL context can be made.
+	bool CreateEngine(int aWidth, int aHeight, Gpu::WindowHandle aWindow = 0)
+	{
+		Gpu::WindowHandle window = aWindow;
+		if (Zeph::Engine::Create(window, aWidth, aHeight))
+		{
+			TestSupport::PinLoadedGlLibraries();
+			return true;
+		}
+		const std::string log = TakeLog();
+		if (log.find("D3DCreateDevice Failed.") != std::string::npos && !TestSupport::IsCi())
+		{
+			SkipWithoutGl();
+			return false;
+		}
+		ADD_FAILURE() << "Engine::Create failed:\n" << log;
+		return false;
+	}
+
+	// GTEST_SKIP returns from the function it is in, so it lives in a void one.
+	static void SkipWithoutGl() { GTEST_SKIP() << "No OpenGL 4.5 core context"; }
+
+	// The log written since the last call.
+	std::string TakeLog()
+	{
+		const std::string all = TestSupport::ReadWholeFile(myLogPath);
+		const std::string rest = all.size() > myLogTaken ? all.substr(myLogTaken) : std::string();
+		myLogTaken = all.size();
+		return rest;
+	}
+
+	struct ColorVertex
+	{
+		float myPosition[3];
+		float myColor[4];
+	};
+
+	// Draws a quad of one colour through an effect pass whose inputs are POSITION and
+	// COLOR (the engine's coloured-vertex layout), covering clip-space x in
+	// [left, right] and y in [bottom, top], wound clockwise as the default culling wants.
+	static bool DrawQuad(Gpu::Context& aContext, Fx::Pass& aPass, float aLeft, float aBottom, float aRight,
+	                     float aTop, const float aColor[4])
+	{
+		const ColorVertex vertices[6] = {
+		    {{aLeft, aBottom, 0.5f}, {aColor[0], aColor[1], aColor[2], aColor[3]}},
+		    {{aLeft, aTop, 0.5f}, {aColor[0], aColor[1], aColor[2], aColor[3]}},
+		    {{aRight, aTop, 0.5f}, {aColor[0], aColor[1], aColor[2], aColor[3]}},
+		    {{aLeft, aBottom, 0.5f}, {aColor[0], aColor[1], aColor[2], aColor[3]}},
+		    {{aRight, aTop, 0.5f}, {aColor[0], aColor[1], aColor[2], aColor[3]}},
+		    {{aRight, aBottom, 0.5f}, {aColor[0], aColor[1], aColor[2], aColor[3]}},
+		};
+		Gpu::BufferDesc bufferDesc;
+		bufferDesc.mySize = sizeof(vertices);
+		bufferDesc.myLabel = "test quad";
+		Gpu::Buffer buffer;
+		if (!buffer.Init(bufferDesc, vertices))
+		{
+			return false;
+		}
+		const Gpu::InputElement elements[] = {
+		    {"POSITION", 0, Dds::Format::R32G32B32_FLOAT, 0, 0},
+		    {"COLOR", 0, Dds::Format::R32G32B32A32_FLOAT, 0, 12},
+		};
+		Gpu::InputLayout layout;
+		bool result = layout.Init(aContext, elements, aPass.GetVertexInputs(), "test quad layout");
+		if (result)
+		{
+			aContext.SetInputLayout(&layout);
+			aContext.SetVertexBuffer(0, &buffer, sizeof(ColorVertex), 0);
+			aContext.SetPrimitiveTopology(Gpu::PrimitiveTopology::TriangleList);
+			result = aPass.Apply(aContext);
+			aContext.Draw(6, 0);
+			aContext.SetInputLayout(nullptr);
+			aContext.SetVertexBuffer(0, nullptr, 0, 0);
+		}
+		layout.Destroy();
+		buffer.Destroy();
+		return result;
+	}
+
+	TestSupport::ScratchDir myScratch;
+	std::string myLogPath;
+	size_t myLogTaken = 0;
+};

@@ -1,0 +1,83 @@
+// Two threads take turns with the engine's GL context, as the editor's render loop
+// and user-interface thread do through the busy flag: each makes the context
+// current, creates textures and draws, releases it and hands over.
+
+#include <atomic>
+#include <thread>
+
+#include "EngineFixture.h"
+#include "engine/Texture.h"
+#include "platform/gpu/Readback.h"
+
+TEST_F(EngineTest, TwoThreadsTakingTurnsCreateTexturesAndDrawWithoutErrors)
+{
+	if (!CreateEngine(64, 64))
+	{
+		return;
+	}
+	Zeph::Engine* engine = Zeph::Engine::GetInstance();
+	engine->ReleaseContext();
+
+	constexpr int rounds = 8;
+	std::atomic<int> turn = 0;
+	std::atomic<int> failures = 0;
+	auto work = [&](int anId) {
+		for (int round = 0; round < rounds; ++round)
+		{
+			while (turn.load(std::memory_order_acquire) != anId)
+			{
+				std::this_thread::yield();
+			}
+			if (!engine->MakeContextCurrent())
+			{
+				++failures;
+			}
+			else
+			{
+				Gpu::Context& context = engine->GetContext();
+				Zeph::Effect* effect =
+				    engine->GetEffectContainer().GetEffect("Data/Shaders/Misc/Vertex_PosCol.fx");
+				Zeph::Texture target(32, 32, Dds::Format::R8G8B8A8_UNORM);
+				if (effect == nullptr || target.GetRenderTargetView() == nullptr)
+				{
+					++failures;
+				}
+				else
+				{
+					Matrix44<float> identity;
+					effect->SetWorldMatrix(identity);
+					effect->SetViewMatrix(identity);
+					effect->SetProjectionMatrix(identity);
+					const float black[4] = {0.0f, 0.0f, 0.0f, 1.0f};
+					const float color[4] = {static_cast<float>(anId), static_cast<float>(round) / rounds,
+					                        0.5f, 1.0f};
+					context.ClearRenderTargetView(*target.GetRenderTargetView(), black);
+					Gpu::RenderTargetView* const targets[] = {target.GetRenderTargetView()};
+					context.SetRenderTargets(targets, nullptr);
+					Gpu::Viewport viewport;
+					viewport.myWidth = 32.0f;
+					viewport.myHeight = 32.0f;
+					context.SetViewport(viewport);
+					Fx::Pass* pass = effect->GetTechnique()->GetPassByIndex(0);
+					std::vector<uint8_t> pixels;
+					if (pass == nullptr || !DrawQuad(context, *pass, -1.0f, -1.0f, 1.0f, 1.0f, color) ||
+					    !Gpu::ReadRenderTarget(context, *target.GetRenderTargetView(), pixels) ||
+					    pixels[0] != (anId == 0 ? 0 : 255) ||
+					    std::abs(pixels[1] - static_cast<int>(std::lround(color[1] * 255.0f))) > 1)
+					{
+						++failures;
+					}
+					context.SetRenderTargets({}, nullptr);
+				}
+			}
+			engine->ReleaseContext();
+			turn.store(1 - anId, std::memory_order_release);
+		}
+	};
+	std::thread first(work, 0);
+	std::thread second(work, 1);
+	first.join();
+	second.join();
+	EXPECT_EQ(failures.load(), 0);
+	EXPECT_TRUE(engine->MakeContextCurrent());
+}

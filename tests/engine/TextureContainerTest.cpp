@@ -1,0 +1,176 @@
+// Textures through the engine's container: sharing by name, retrying missing files,
+// the sRGB conversion, cube and volume files, render-target textures.
+
+#include <filesystem>
+
+#include "EngineFixture.h"
+#include "engine/Texture.h"
+#include "engine/TextureContainer.h"
+#include "platform/dds/DdsFile.h"
+
+namespace
+{
+// Writes a DDS file of one colour per slice and mip (RGBA8 bytes: slice, mip, 0x80, 0xff).
+void WriteDds(const std::string& aPath, Dds::Format aFormat, uint32_t aSize, uint32_t anArraySize,
+              uint32_t aDepth, uint32_t someMisc)
+{
+	Dds::ImageInfo info;
+	info.myWidth = aSize;
+	info.myHeight = aSize;
+	info.myDepth = aDepth;
+	info.myArraySize = anArraySize;
+	info.myMipLevels = 2;
+	info.myMiscFlags = someMisc;
+	info.myFormat = aFormat;
+	info.myResourceDimension =
+	    aDepth > 1 ? Dds::ResourceDimension::Texture3D : Dds::ResourceDimension::Texture2D;
+	Dds::Image image;
+	std::string error;
+	ASSERT_TRUE(image.Init(info, error)) << error;
+	for (uint32_t item = 0; item < anArraySize; ++item)
+	{
+		for (uint32_t mip = 0; mip < info.myMipLevels; ++mip)
+		{
+			uint8_t* bytes = image.Data(mip, item);
+			const uint64_t size = image.SubresourceSize(mip);
+			for (uint64_t at = 0; at + 3 < size; at += 4)
+			{
+				bytes[at] = static_cast<uint8_t>(item * 40);
+				bytes[at + 1] = static_cast<uint8_t>(mip * 100);
+				bytes[at + 2] = 0x80;
+				bytes[at + 3] = 0xff;
+			}
+		}
+	}
+	ASSERT_TRUE(Dds::SaveToFile(aPath, image, error)) << error;
+}
+} // namespace
+
+TEST_F(EngineTest, TheSameNameGivesTheSameTextureAndAMissingFileIsTriedAgain)
+{
+	if (!CreateEngine(64, 64))
+	{
+		return;
+	}
+	Zeph::TextureContainer& container = Zeph::Engine::GetInstance()->GetTextureContainer();
+	const std::string path = myScratch.File("textures/albedo.dds");
+	std::filesystem::create_directories(myScratch.Path() / "textures");
+
+	EXPECT_EQ(container.GetTexture(path, false), nullptr) << "not written yet";
+	EXPECT_EQ(container.GetCount(), 0u);
+	EXPECT_EQ(TakeLog().find("CRITICAL ERROR"), std::string::npos)
+	    << "a missing texture is the caller's to report";
+
+	WriteDds(path, Dds::Format::R8G8B8A8_UNORM, 16, 1, 1, 0);
+	Zeph::Texture* texture = container.GetTexture(path, false);
+	ASSERT_NE(texture, nullptr) << "the second request tries the file again";
+	EXPECT_EQ(texture->GetFileName(), path);
+	EXPECT_EQ(texture->GetImageInfo().myWidth, 16u);
+	EXPECT_EQ(texture->GetImageInfo().myMipLevels, 2u);
+
+	std::filesystem::remove(path);
+	EXPECT_EQ(container.GetTexture(path, true), texture) << "the second request does not touch the file";
+	EXPECT_EQ(texture->GetShaderResourceView()->GetFormat(), Dds::Format::R8G8B8A8_UNORM)
+	    << "the sRGB flag of a later request changes nothing";
+	EXPECT_EQ(container.GetCount(), 1u);
+
+	WriteDds(path, Dds::Format::R8G8B8A8_UNORM, 8, 1, 1, 0);
+	container.Clear();
+	EXPECT_EQ(container.GetCount(), 0u);
+	Zeph::Texture* reloaded = container.GetTexture(path, false);
+	ASSERT_NE(reloaded, nullptr);
+	EXPECT_EQ(reloaded->GetImageInfo().myWidth, 8u) << "cleared: the file is read again";
+
+	TestSupport::WriteWholeFile(myScratch.File("textures/broken.dds"), "DDS |not really");
+	EXPECT_EQ(container.GetTexture(myScratch.File("textures/broken.dds"), false), nullptr);
+
+	Zeph::TextureContainer ddsOnly({".dds", ".DDS"});
+	EXPECT_EQ(ddsOnly.GetTexture(myScratch.File("textures/albedo.png"), false), nullptr);
+	EXPECT_NE(TakeLog().find("Not a texture file this container takes"), std::string::npos);
+	EXPECT_NE(ddsOnly.GetTexture(path, false), nullptr);
+}
+
+TEST_F(EngineTest, TexturesLoadWithSrgbViewsCubeViewsAndReportOtherDimensions)
+{
+	if (!CreateEngine(64, 64))
+	{
+		return;
+	}
+	const struct
+	{
+		const char* name;
+		Dds::Format fileFormat;
+		uint32_t arraySize;
+		uint32_t depth;
+		uint32_t misc;
+		bool srgb;
+		Dds::Format viewFormat;
+		GLenum viewTarget;
+		bool reported;
+	} cases[] = {
+	    {"plain.dds", Dds::Format::R8G8B8A8_UNORM, 1, 1, 0, false, Dds::Format::R8G8B8A8_UNORM, GL_TEXTURE_2D,
+	     false},
+	    {"srgb.dds", Dds::Format::R8G8B8A8_UNORM, 1, 1, 0, true, Dds::Format::R8G8B8A8_UNORM_SRGB,
+	     GL_TEXTURE_2D, false},
+	    {"stored-srgb.dds", Dds::Format::R8G8B8A8_UNORM_SRGB, 1, 1, 0, false,
+	     Dds::Format::R8G8B8A8_UNORM_SRGB, GL_TEXTURE_2D, false},
+	    {"bc1.dds", Dds::Format::BC1_UNORM, 1, 1, 0, true, Dds::Format::BC1_UNORM_SRGB, GL_TEXTURE_2D, false},
+	    {"float.dds", Dds::Format::R16G16B16A16_FLOAT, 1, 1, 0, true, Dds::Format::R16G16B16A16_FLOAT,
+	     GL_TEXTURE_2D, false},
+	    {"cube.dds", Dds::Format::R8G8B8A8_UNORM, 6, 1, Dds::MiscTextureCube, false,
+	     Dds::Format::R8G8B8A8_UNORM, GL_TEXTURE_CUBE_MAP, false},
+	    {"srgb-cube.dds", Dds::Format::R8G8B8A8_UNORM, 6, 1, Dds::MiscTextureCube, true,
+	     Dds::Format::R8G8B8A8_UNORM_SRGB, GL_TEXTURE_CUBE_MAP, false},
+	    {"array.dds", Dds::Format::R8G8B8A8_UNORM, 3, 1, 0, false, Dds::Format::R8G8B8A8_UNORM, GL_TEXTURE_2D,
+	     false},
+	    // Only 2D files are converted, but the flag is not dropped: the volume is viewed as sRGB.
+	    {"volume.dds", Dds::Format::R8G8B8A8_UNORM, 1, 4, 0, true, Dds::Format::R8G8B8A8_UNORM_SRGB,
+	     GL_TEXTURE_3D, true},
+	};
+	Zeph::TextureContainer& container = Zeph::Engine::GetInstance()->GetTextureContainer();
+	for (const auto& test : cases)
+	{
+		SCOPED_TRACE(test.name);
+		const std::string path = myScratch.File(test.name);
+		WriteDds(path, test.fileFormat, 16, test.arraySize, test.depth, test.misc);
+		Zeph::Texture* texture = container.GetTexture(path, test.srgb);
+		ASSERT_NE(texture, nullptr) << TakeLog();
+		ASSERT_NE(texture->GetShaderResourceView(), nullptr);
+		EXPECT_EQ(texture->GetShaderResourceView()->GetFormat(), test.viewFormat);
+		EXPECT_EQ(texture->GetShaderResourceView()->GetTarget(), test.viewTarget);
+		EXPECT_EQ(texture->GetImageInfo().myFormat, test.fileFormat) << "the image information is the file's";
+		EXPECT_EQ(texture->GetImageInfo().myArraySize, test.arraySize);
+		EXPECT_EQ(texture->GetRenderTargetView(), nullptr);
+		const std::string log = TakeLog();
+		EXPECT_EQ(log.find("INVALID TEXTURE FORMAT") != std::string::npos, test.reported) << log;
+		if (test.reported)
+		{
+			EXPECT_NE(log.find("Zeph::Texture::BindTextureToView"), std::string::npos);
+		}
+	}
+}
+
+TEST_F(EngineTest, RenderTargetTexturesHaveBothViewsAndReportFailures)
+{
+	if (!CreateEngine(64, 64))
+	{
+		return;
+	}
+	Zeph::Texture target(96, 48, Dds::Format::R16G16B16A16_FLOAT);
+	ASSERT_NE(target.GetRenderTargetView(), nullptr);
+	ASSERT_NE(target.GetShaderResourceView(), nullptr);
+	EXPECT_EQ(target.GetRenderTargetView()->GetWidth(), 96);
+	EXPECT_EQ(target.GetShaderResourceView()->GetFormat(), Dds::Format::R16G16B16A16_FLOAT);
+	EXPECT_EQ(target.GetImageInfo().myWidth, 96u);
+	EXPECT_EQ(target.GetImageInfo().myHeight, 48u);
+	EXPECT_EQ(target.GetImageInfo().myFormat, Dds::Format::UNKNOWN)
+	    << "only the size is set for a render target";
+	EXPECT_EQ(target.GetFileName(), "empty");
+
+	Zeph::Texture broken(0, 48, Dds::Format::R8G8B8A8_UNORM);
+	EXPECT_EQ(broken.GetRenderTargetView(), nullptr);
+	EXPECT_EQ(broken.GetShaderResourceView(), nullptr);
+	const std::string log = TakeLog();
+	EXPECT_NE(log.find("Couldn't Create Texture2D"), std::string::npos) << log;
+	EXPECT_NE(log.find("Zeph::Texture::Texture"), std::string::npos);
+}

@@ -1,0 +1,205 @@
+// Compiling effect sources: messages with the right file and line, rejected
+// declarations, and what a compiled file says about techniques, passes,
+// states, variables and vertex inputs.
+
+#include <filesystem>
+#include <map>
+
+#include "GpuTest.h"
+#include "platform/fx/CompiledFormat.h"
+#include "platform/fx/Compiler.h"
+#include "support/TestSupport.h"
+
+namespace
+{
+using FxCompilerTest = GpuTest;
+
+// A pass that compiles, for sources whose problem lies elsewhere.
+const char* const ourGoodStages = R"(vertex V
+{
+	in vec3 POSITION;
+	void main() { gl_Position = vec4(POSITION, 1.0); }
+}
+fragment F
+{
+	out vec4 oColor;
+	void main() { oColor = vec4(1.0); }
+}
+)";
+
+struct BadSource
+{
+	const char* myCase;
+	std::string mySource;
+	std::map<std::string, std::string> myIncludes; // name in the scratch directory -> text
+	std::string myExpected;                        // "FILE" stands for the scratch directory
+};
+} // namespace
+
+TEST_F(FxCompilerTest, ErrorsNameTheFileAndLine)
+{
+	const std::string pass = "technique T { pass P { VertexShader = V; PixelShader = F; } }\n";
+	const std::vector<BadSource> cases = {
+	    {"GLSL error in the source",
+	     std::string(ourGoodStages) + "float Broken()\n{\n\treturn missing;\n}\n" + pass,
+	     {},
+	     "FILE/Main.fx(13): error: `missing' undeclared"},
+	    {"GLSL error in an include",
+	     "#include \"Common/Inc.fxh\"\n" + std::string(ourGoodStages) + pass,
+	     {{"Common/Inc.fxh", "// shared\nfloat Broken() { return missing; }\n"}},
+	     "FILE/Common/Inc.fxh(2): error: `missing' undeclared"},
+	    {"unknown state",
+	     std::string(ourGoodStages) + "technique T\n{\n\tpass P\n\t{\n\t\tVertexShader = V;\n"
+	                                  "\t\tPixelShader = F;\n\t\tBlending = true;\n\t}\n}\n",
+	     {},
+	     "FILE/Main.fx(17): error: unknown state 'Blending' in pass 'P' of technique 'T'"},
+	    {"unknown state value",
+	     std::string(ourGoodStages) +
+	         "technique T { pass P { VertexShader = V; PixelShader = F; CullMode = Sometimes; } }\n",
+	     {},
+	     "FILE/Main.fx(11): error: 'Sometimes' is not a value of CullMode (NONE, FRONT, BACK)"},
+	    {"include cycle",
+	     "#include \"A.fxh\"\n" + std::string(ourGoodStages) + pass,
+	     {{"A.fxh", "#include \"B.fxh\"\n"}, {"B.fxh", "\n#include \"a.fxh\"\n"}},
+	     "FILE/B.fxh(2): error: include cycle: FILE/Main.fx -> FILE/A.fxh -> FILE/B.fxh -> FILE/A.fxh"},
+	    {"missing include",
+	     "\n#include \"Nowhere.fxh\"\n" + std::string(ourGoodStages) + pass,
+	     {},
+	     "FILE/Main.fx(2): error: cannot open include file 'Nowhere.fxh'"},
+	    {"uniform block",
+	     "uniform Frame { mat4 World; };\n" + std::string(ourGoodStages) + pass,
+	     {},
+	     "FILE/Main.fx(1): error: uniform block 'Frame' is not supported"},
+	    {"missing stage",
+	     std::string(ourGoodStages) + "technique T { pass P { VertexShader = W; PixelShader = F; } }\n",
+	     {},
+	     "FILE/Main.fx(11): error: VertexShader 'W' names no stage block"},
+	    {"stage of the wrong kind",
+	     std::string(ourGoodStages) + "technique T { pass P { VertexShader = F; PixelShader = F; } }\n",
+	     {},
+	     "FILE/Main.fx(11): error: VertexShader 'F' is a fragment block"},
+	    {"sampler state for no sampler",
+	     "uniform vec4 Tint;\nsampler Tint { Filter = ANISOTROPIC; }\n" + std::string(ourGoodStages) + pass,
+	     {},
+	     "FILE/Main.fx(2): error: sampler state 'Tint' names no sampler uniform"},
+	    {"unknown sampler state",
+	     "uniform sampler2D Tex;\nsampler Tex { Wrap = Clamp; }\n" + std::string(ourGoodStages) + pass,
+	     {},
+	     "FILE/Main.fx(2): error: unknown sampler state 'Wrap' in sampler 'Tex'"},
+	    {"version line",
+	     "#version 330\n" + std::string(ourGoodStages) + pass,
+	     {},
+	     "FILE/Main.fx(1): error: remove the #version line"},
+	    {"vertex input without a semantic",
+	     "vertex V { in vec3 aPosition; void main() {} }\n"
+	     "fragment F { out vec4 o; void main() { o = vec4(1); } }\n" +
+	         pass,
+	     {},
+	     "FILE/Main.fx(1): error: vertex input 'aPosition' must be named by its semantic"},
+	    {"link error",
+	     "vertex V { in vec3 POSITION; out vec4 vColor; void main() { vColor = vec4(1); "
+	     "gl_Position = vec4(POSITION, 1); } }\n"
+	     "fragment F { in vec3 vColor; out vec4 o; void main() { o = vec4(vColor, 1); } }\n" +
+	         pass,
+	     {},
+	     "FILE/Main.fx(1): technique 'T', pass 'P': error:"},
+	};
+	for (const BadSource& bad : cases)
+	{
+		TestSupport::ScratchDir scratch;
+		for (const auto& [name, text] : bad.myIncludes)
+		{
+			std::filesystem::create_directories(std::filesystem::path(scratch.File(name)).parent_path());
+			TestSupport::WriteWholeFile(scratch.File(name), text);
+		}
+		Fx::CompileOutput output;
+		EXPECT_FALSE(Fx::CompileFromMemory(bad.mySource, scratch.File("Main.fx"), output)) << bad.myCase;
+		std::string expected = bad.myExpected;
+		for (size_t at = expected.find("FILE"); at != std::string::npos; at = expected.find("FILE"))
+		{
+			expected.replace(at, 4, scratch.Path().string());
+		}
+		EXPECT_NE(output.myMessages.find(expected), std::string::npos)
+		    << bad.myCase << "\nexpected: " << expected << "\nmessages:\n"
+		    << output.myMessages;
+		EXPECT_TRUE(output.myCompiled.empty()) << bad.myCase;
+	}
+}
+
+TEST_F(FxCompilerTest, VertexPosColDescribesItsTechniquesStatesAndInputs)
+{
+	Fx::CompileOutput output;
+	ASSERT_TRUE(Fx::CompileFromFile("data/SHADERS/MISC/vertex_poscol.fx", output)) << output.myMessages;
+	ASSERT_EQ(output.myDependencies.size(), 2u);
+	EXPECT_EQ(output.myDependencies[1], "data/Shaders/Common/Transforms.fxh");
+	Fx::EffectDesc desc;
+	std::string error;
+	ASSERT_TRUE(Fx::ReadCompiled(output.myCompiled, desc, error)) << error;
+
+	ASSERT_EQ(desc.myVariables.size(), 4u);
+	const char* const names[] = {"World", "View", "Projection"};
+	for (size_t index = 0; index < 3; ++index)
+	{
+		EXPECT_EQ(desc.myVariables[index].myName, names[index]);
+		EXPECT_EQ(desc.myVariables[index].myType, Fx::VariableType::Mat4);
+	}
+	EXPECT_EQ(desc.myVariables[3].myName, "FarPlane");
+	EXPECT_EQ(desc.myVariables[3].myType, Fx::VariableType::Float);
+	ASSERT_EQ(desc.myTechniques.size(), 2u);
+	const Fx::PassDesc& solid = desc.myTechniques[0].myPasses.at(0);
+	const Fx::PassDesc& wire = desc.myTechniques[1].myPasses.at(0);
+	const std::vector<Fx::VertexInput> inputs = {{"POSITION", "POSITION", 0, Fx::VariableType::Vec3, 0},
+	                                             {"COLOR", "COLOR", 0, Fx::VariableType::Vec4, 1}};
+	EXPECT_EQ(solid.myInputs, inputs);
+	EXPECT_EQ(wire.myInputs, inputs);
+	// Render declares the depth and rasterizer groups, so it leaves blending as it finds it.
+	EXPECT_EQ(solid.myStateGroups, Fx::StateGroup::DepthStencil | Fx::StateGroup::Rasterizer);
+	EXPECT_EQ(solid.myRasterizer, (Gpu::RasterizerState{.myCullMode = Gpu::CullMode::Back}));
+	EXPECT_EQ(wire.myStateGroups, Fx::StateGroup::Rasterizer);
+	EXPECT_EQ(wire.myRasterizer, (Gpu::RasterizerState{.myFillMode = Gpu::FillMode::Wireframe,
+	                                                   .myCullMode = Gpu::CullMode::None}));
+
+	// The build's compiled file is the same bytes but for the spelling of the source path.
+	Fx::CompileOutput again;
+	ASSERT_TRUE(Fx::CompileFromFile("data/Shaders/Misc/Vertex_PosCol.fx", again)) << again.myMessages;
+	const std::string built = TestSupport::ReadWholeFile("data/Shaders/Misc/Vertex_PosCol.fxal");
+	EXPECT_EQ(std::string(again.myCompiled.begin(), again.myCompiled.end()), built);
+}
+
+TEST_F(FxCompilerTest, SamplerDeclarationsMapOntoSamplerDescriptions)
+{
+	const std::string source = R"(uniform sampler2D Declared;
+uniform samplerCube Undeclared[2];
+uniform sampler2DShadow Shadow;
+sampler Declared { Filter = ANISOTROPIC; MaxAnisotropy = 8; AddressU = Mirror; AddressV = Border;
+	BorderColor = float4(1, 0.5, 0, 1); MinLOD = 1; MaxLOD = 4.5; }
+sampler Shadow { Filter = COMPARISON_MIN_MAG_MIP_LINEAR; ComparisonFunc = LESS_EQUAL; }
+)" + std::string(ourGoodStages) +
+	                           "technique T { pass P { VertexShader = V; PixelShader = F; } }\n";
+	Fx::CompileOutput output;
+	ASSERT_TRUE(Fx::CompileFromMemory(source, "Samplers.fx", output)) << output.myMessages;
+	Fx::EffectDesc desc;
+	std::string error;
+	ASSERT_TRUE(Fx::ReadCompiled(output.myCompiled, desc, error)) << error;
+	ASSERT_EQ(desc.myVariables.size(), 3u);
+
+	const Gpu::SamplerDesc& declared = desc.myVariables[0].mySampler;
+	EXPECT_EQ(declared.myFilter, Gpu::Filter::Anisotropic);
+	EXPECT_EQ(declared.myMaxAnisotropy, 8.0f);
+	EXPECT_EQ(declared.myAddressU, Gpu::TextureAddress::Mirror);
+	EXPECT_EQ(declared.myAddressV, Gpu::TextureAddress::Border);
+	EXPECT_EQ(declared.myAddressW, Gpu::TextureAddress::Clamp); // Direct3D's default for what is not said
+	EXPECT_EQ(declared.myBorderColor[1], 0.5f);
+	EXPECT_EQ(declared.myMaxLod, 4.5f);
+	const Fx::VariableDesc& undeclared = desc.myVariables[1];
+	EXPECT_EQ(undeclared.mySampler.myFilter, Gpu::Filter::Linear);
+	EXPECT_EQ(undeclared.mySampler.myAddressV, Gpu::TextureAddress::Wrap);
+	EXPECT_EQ(undeclared.myElementCount, 2);
+	const Gpu::SamplerDesc& shadow = desc.myVariables[2].mySampler;
+	EXPECT_TRUE(shadow.myComparisonFlag);
+	EXPECT_EQ(shadow.myComparison, Gpu::Comparison::LessEqual);
+	// Units follow the declaration order; the array takes two.
+	EXPECT_EQ(desc.myVariables[0].myUnit, 0);
+	EXPECT_EQ(undeclared.myUnit, 1);
+	EXPECT_EQ(desc.myVariables[2].myUnit, 3);
+}

@@ -1,0 +1,473 @@
+// The swap chain: its back buffer as a render target, headless and in an X11
+// window under Xvfb, where the test reads back what the window shows.
+
+#include <array>
+#include <chrono>
+#include <cmath>
+#include <functional>
+#include <thread>
+#include <vector>
+
+#include "GpuTest.h"
+#include "platform/gpu/Readback.h"
+#include "platform/gpu/SwapChain.h"
+
+#include "XServer.h"
+
+namespace
+{
+using Pixel = std::array<uint8_t, 4>;
+
+uint8_t SrgbEncoded(float aLinear)
+{
+	const float encoded =
+	    aLinear <= 0.0031308f ? aLinear * 12.92f : 1.055f * std::pow(aLinear, 1.0f / 2.4f) - 0.055f;
+	return static_cast<uint8_t>(std::lround(encoded * 255.0f));
+}
+
+// The bytes a target of this format stores for a linear colour, in R, G, B, A order.
+Pixel Stored(const float aColor[4], Dds::Format aFormat)
+{
+	const bool srgbFlag =
+	    aFormat == Dds::Format::R8G8B8A8_UNORM_SRGB || aFormat == Dds::Format::B8G8R8A8_UNORM_SRGB;
+	Pixel pixel;
+	for (int channel = 0; channel < 4; ++channel)
+	{
+		pixel[channel] = srgbFlag && channel < 3
+		                     ? SrgbEncoded(aColor[channel])
+		                     : static_cast<uint8_t>(std::lround(aColor[channel] * 255.0f));
+	}
+	return pixel;
+}
+
+Pixel At(const std::vector<uint8_t>& someBytes, int aWidth, int anX, int aY)
+{
+	const size_t at = (static_cast<size_t>(aY) * static_cast<size_t>(aWidth) + static_cast<size_t>(anX)) * 4;
+	if (someBytes.size() < at + 4)
+	{
+		return {};
+	}
+	return {someBytes[at], someBytes[at + 1], someBytes[at + 2], someBytes[at + 3]};
+}
+
+constexpr Dds::Format ourFormats[] = {Dds::Format::R8G8B8A8_UNORM_SRGB, Dds::Format::R8G8B8A8_UNORM,
+                                      Dds::Format::B8G8R8A8_UNORM_SRGB, Dds::Format::B8G8R8A8_UNORM};
+constexpr float ourClearColor[4] = {0.6f, 0.2f, 1.0f, 1.0f};
+constexpr float ourQuadColor[4] = {1.0f, 0.6f, 0.0f, 1.0f};
+
+bool Contains(const std::string& aText, const char* aPart)
+{
+	return aText.find(aPart) != std::string::npos;
+}
+} // namespace
+
+using SwapChainTest = GpuTest;
+
+TEST_F(SwapChainTest, HeadlessBackBufferIsARenderTargetOfTheAskedSizeAndFormat)
+{
+	for (const Dds::Format format : ourFormats)
+	{
+		SCOPED_TRACE(static_cast<unsigned>(format));
+		Gpu::SwapChain swapChain;
+		ASSERT_TRUE(swapChain.Init(myDevice, 48, 20, format));
+		EXPECT_FALSE(swapChain.HasWindow());
+		EXPECT_EQ(swapChain.GetFormat(), format);
+		Gpu::Texture* buffer = swapChain.GetBuffer();
+		ASSERT_NE(buffer, nullptr);
+		GLint width = 0;
+		GLint height = 0;
+		glGetTextureLevelParameteriv(buffer->GetName(), 0, GL_TEXTURE_WIDTH, &width);
+		glGetTextureLevelParameteriv(buffer->GetName(), 0, GL_TEXTURE_HEIGHT, &height);
+		EXPECT_EQ(width, 48);
+		EXPECT_EQ(height, 20);
+
+		Gpu::RenderTargetView* view = buffer->CreateRenderTargetView();
+		ASSERT_NE(view, nullptr);
+		GetContext().ClearRenderTargetView(*view, ourClearColor);
+		std::vector<uint8_t> bytes;
+		ASSERT_TRUE(Gpu::ReadRenderTarget(GetContext(), *view, bytes));
+		EXPECT_EQ(At(bytes, 48, 0, 0), Stored(ourClearColor, format));
+		EXPECT_EQ(At(bytes, 48, 47, 19), Stored(ourClearColor, format));
+		EXPECT_TRUE(swapChain.Present(0));
+		EXPECT_TRUE(swapChain.Present(1));
+		swapChain.Destroy();
+		EXPECT_EQ(swapChain.GetBuffer(), nullptr);
+	}
+}
+
+TEST_F(SwapChainTest, ResizeBuffersReplacesTheBufferAndItsViews)
+{
+	Gpu::SwapChain swapChain;
+	ASSERT_TRUE(swapChain.Init(myDevice, 32, 16, Dds::Format::R8G8B8A8_UNORM_SRGB));
+	Gpu::RenderTargetView* views[] = {swapChain.GetBuffer()->CreateRenderTargetView()};
+	ASSERT_TRUE(GetContext().SetRenderTargets(views, nullptr));
+	const size_t framebufferCount = GetContext().GetFramebufferCache().GetEntryCount();
+
+	ASSERT_TRUE(swapChain.ResizeBuffers(64, 8, Dds::Format::UNKNOWN));
+	EXPECT_EQ(swapChain.GetWidth(), 64);
+	EXPECT_EQ(swapChain.GetHeight(), 8);
+	EXPECT_EQ(swapChain.GetFormat(), Dds::Format::R8G8B8A8_UNORM_SRGB);
+	// The old view's framebuffer went with it, so nothing can draw into freed storage.
+	EXPECT_EQ(GetContext().GetFramebufferCache().GetEntryCount(), framebufferCount - 1);
+	Gpu::RenderTargetView* view = swapChain.GetBuffer()->CreateRenderTargetView();
+	ASSERT_NE(view, nullptr);
+	EXPECT_EQ(view->GetWidth(), 64);
+	EXPECT_EQ(view->GetHeight(), 8);
+
+	ASSERT_TRUE(swapChain.ResizeBuffers(16, 16, Dds::Format::B8G8R8A8_UNORM));
+	EXPECT_EQ(swapChain.GetFormat(), Dds::Format::B8G8R8A8_UNORM);
+	view = swapChain.GetBuffer()->CreateRenderTargetView();
+	ASSERT_NE(view, nullptr);
+	const float red[4] = {1.0f, 0.0f, 0.0f, 1.0f};
+	GetContext().ClearRenderTargetView(*view, red);
+	std::vector<uint8_t> bytes;
+	ASSERT_TRUE(Gpu::ReadRenderTarget(GetContext(), *view, bytes));
+	EXPECT_EQ(bytes.size(), 16u * 16u * 4u);
+	EXPECT_EQ(At(bytes, 16, 15, 15), (Pixel{255, 0, 0, 255}));
+	swapChain.Destroy();
+}
+
+TEST_F(SwapChainTest, BadRequestsAreReportedAndChangeNothing)
+{
+	Gpu::SwapChain swapChain;
+	EXPECT_FALSE(swapChain.Present(0));
+	EXPECT_FALSE(swapChain.ResizeBuffers(8, 8, Dds::Format::UNKNOWN));
+	Gpu::Device noDevice;
+	EXPECT_FALSE(swapChain.Init(noDevice, 8, 8, Dds::Format::R8G8B8A8_UNORM));
+	EXPECT_FALSE(swapChain.Init(myDevice, 8, 8, Dds::Format::R16G16B16A16_FLOAT));
+	EXPECT_FALSE(swapChain.Init(myDevice, 0, 8, Dds::Format::R8G8B8A8_UNORM)); // no window to size from
+	EXPECT_EQ(swapChain.GetBuffer(), nullptr);
+	EXPECT_EQ(TakeReports().size(), 5u);
+
+	ASSERT_TRUE(swapChain.Init(myDevice, 8, 4, Dds::Format::R8G8B8A8_UNORM));
+	Gpu::RenderTargetView* view = swapChain.GetBuffer()->CreateRenderTargetView();
+	EXPECT_FALSE(swapChain.Init(myDevice, 8, 4, Dds::Format::R8G8B8A8_UNORM));
+	EXPECT_FALSE(swapChain.ResizeBuffers(16, 16, Dds::Format::R32_FLOAT));
+	EXPECT_FALSE(swapChain.ResizeBuffers(-1, 4, Dds::Format::UNKNOWN));
+	EXPECT_FALSE(swapChain.ResizeBuffers(1 << 20, 4, Dds::Format::UNKNOWN));
+	EXPECT_FALSE(swapChain.Present(5));
+	EXPECT_FALSE(swapChain.Present(-1));
+	const std::vector<std::string> reports = TakeReports();
+	ASSERT_EQ(reports.size(), 6u);
+	EXPECT_TRUE(Contains(reports[0], "Gpu::SwapChain::Init: The swap chain is already initialized"))
+	    << reports[0];
+	EXPECT_TRUE(
+	    Contains(reports[1], "Gpu::SwapChain::ResizeBuffers: Cannot make a 16x16 back buffer of format 41"))
+	    << reports[1];
+	EXPECT_TRUE(Contains(reports[4], "Gpu::SwapChain::Present: Bad sync interval 5")) << reports[4];
+
+	// The refused resizes left the buffer and its view alone.
+	EXPECT_EQ(swapChain.GetWidth(), 8);
+	GetContext().ClearRenderTargetView(*view, ourClearColor);
+	std::vector<uint8_t> bytes;
+	ASSERT_TRUE(Gpu::ReadRenderTarget(GetContext(), *view, bytes));
+	EXPECT_EQ(At(bytes, 8, 7, 3), Stored(ourClearColor, Dds::Format::R8G8B8A8_UNORM));
+	swapChain.Destroy();
+}
+
+// A device and swap chain on a 320x240 X11 window of an X server the suite
+// starts (or finds). A headless device from GpuTest stays beside it; the window
+// device's context is current during the test.
+class SwapChainWindowTest : public GpuTest
+{
+protected:
+	static void SetUpTestSuite()
+	{
+		ourServer = new XServer;
+		ourServerFlag = ourServer->Start();
+	}
+
+	static void TearDownTestSuite()
+	{
+		delete ourServer;
+		ourServer = nullptr;
+	}
+
+	void SetUp() override
+	{
+		GpuTest::SetUp();
+		if (IsSkipped() || HasFailure())
+		{
+			return;
+		}
+		if (!ourServerFlag)
+		{
+			const char* ci = std::getenv("CI");
+			if (ci && std::strcmp(ci, "true") == 0 && XServer::IsXvfbInstalled())
+			{
+				FAIL() << ourServer->GetReason();
+			}
+			GTEST_SKIP() << ourServer->GetReason();
+		}
+		myDisplay = XOpenDisplay(nullptr);
+		ASSERT_NE(myDisplay, nullptr);
+		myWindow = XCreateSimpleWindow(myDisplay, DefaultRootWindow(myDisplay), 0, 0, 320, 240, 0, 0, 0);
+		XSync(myDisplay, False);
+		ASSERT_TRUE(myWindowDevice.Init(320, 240, myWindow)) << Joined();
+		EXPECT_EQ(myWindowDevice.GetWindow(), myWindow);
+		// The device mapped the window through its own connection.
+		XWindowAttributes attributes{};
+		for (int attempt = 0; attempt < 200; ++attempt)
+		{
+			XGetWindowAttributes(myDisplay, myWindow, &attributes);
+			if (attributes.map_state == IsViewable)
+			{
+				break;
+			}
+			std::this_thread::sleep_for(std::chrono::milliseconds(10));
+		}
+		ASSERT_EQ(attributes.map_state, IsViewable);
+		InitQuadProgram();
+	}
+
+	void TearDown() override
+	{
+		if (myWindowDevice.IsInitialized())
+		{
+			myWindowDevice.MakeCurrent();
+			myWindowDevice.GetContext().GetStateCache().ForgetProgram(myProgram);
+			glDeleteProgram(myProgram);
+			mySwapChain.Destroy();
+			myWindowDevice.Destroy();
+		}
+		if (myDisplay != nullptr)
+		{
+			XDestroyWindow(myDisplay, myWindow);
+			XCloseDisplay(myDisplay);
+		}
+		GpuTest::TearDown();
+	}
+
+	// Clears the back buffer and draws a quad over the top half of the view (clip y 0..1).
+	void DrawFrame(const float aClearColor[4])
+	{
+		Gpu::Context& context = myWindowDevice.GetContext();
+		Gpu::RenderTargetView* views[] = {mySwapChain.GetBuffer()->CreateRenderTargetView()};
+		ASSERT_NE(views[0], nullptr);
+		ASSERT_TRUE(context.SetRenderTargets(views, nullptr));
+		context.SetViewport({.myWidth = static_cast<float>(mySwapChain.GetWidth()),
+		                     .myHeight = static_cast<float>(mySwapChain.GetHeight())});
+		context.ClearRenderTargetView(*views[0], aClearColor);
+		context.SetRasterizerState({.myCullMode = Gpu::CullMode::None});
+		context.GetStateCache().UseProgram(myProgram);
+		context.SetInputLayout(nullptr);
+		context.SetPrimitiveTopology(Gpu::PrimitiveTopology::TriangleStrip);
+		context.Draw(4, 0);
+		ASSERT_TRUE(Gpu::ReadRenderTarget(context, *views[0], myBackBuffer));
+	}
+
+	// The window's pixels as RGBA (alpha 255), row 0 at the top. Another client
+	// (the device's connection) draws them, so wait until aShownFlag says the frame
+	// has arrived, or a few seconds pass.
+	std::vector<uint8_t> ReadWindow(int aWidth, int aHeight,
+	                                const std::function<bool(const std::vector<uint8_t>&)>& aShownFlag)
+	{
+		std::vector<uint8_t> pixels;
+		for (int attempt = 0; attempt < 100; ++attempt)
+		{
+			XImage* image = XGetImage(myDisplay, myWindow, 0, 0, static_cast<unsigned>(aWidth),
+			                          static_cast<unsigned>(aHeight), AllPlanes, ZPixmap);
+			if (image == nullptr)
+			{
+				ADD_FAILURE() << "XGetImage failed";
+				return {};
+			}
+			pixels.clear();
+			for (int y = 0; y < aHeight; ++y)
+			{
+				for (int x = 0; x < aWidth; ++x)
+				{
+					const unsigned long value = XGetPixel(image, x, y);
+					pixels.push_back(static_cast<uint8_t>((value & image->red_mask) >> 16));
+					pixels.push_back(static_cast<uint8_t>((value & image->green_mask) >> 8));
+					pixels.push_back(static_cast<uint8_t>(value & image->blue_mask));
+					pixels.push_back(255);
+				}
+			}
+			XDestroyImage(image);
+			if (aShownFlag(pixels))
+			{
+				break;
+			}
+			std::this_thread::sleep_for(std::chrono::milliseconds(20));
+		}
+		return pixels;
+	}
+
+	// The back buffer's bytes as the window should show them: no alpha channel.
+	std::vector<uint8_t> OpaqueBackBuffer() const
+	{
+		std::vector<uint8_t> opaque = myBackBuffer;
+		for (size_t at = 3; at < opaque.size(); at += 4)
+		{
+			opaque[at] = 255;
+		}
+		return opaque;
+	}
+
+	std::vector<uint8_t> ReadWindowShowingBackBuffer(int aWidth, int aHeight)
+	{
+		const std::vector<uint8_t> wanted = OpaqueBackBuffer();
+		return ReadWindow(aWidth, aHeight,
+		                  [&](const std::vector<uint8_t>& someShown) { return someShown == wanted; });
+	}
+
+	// The quad needs no vertex buffer: its corners come from gl_VertexID.
+	void InitQuadProgram()
+	{
+		const char* vertexSource = R"(#version 450 core
+const vec2 corners[4] = vec2[](vec2(-1.0, 1.0), vec2(1.0, 1.0), vec2(-1.0, 0.0), vec2(1.0, 0.0));
+void main()
+{
+	gl_Position = vec4(corners[gl_VertexID], 0.5, 1.0);
+})";
+		const std::string fragmentSource =
+		    "#version 450 core\nout vec4 oColor;\nvoid main() { oColor = vec4(" +
+		    std::to_string(ourQuadColor[0]) + ", " + std::to_string(ourQuadColor[1]) + ", " +
+		    std::to_string(ourQuadColor[2]) + ", 1.0); }\n";
+		myProgram = glCreateProgram();
+		for (const auto& [stage, source] : {std::pair{GL_VERTEX_SHADER, vertexSource},
+		                                    std::pair{GL_FRAGMENT_SHADER, fragmentSource.c_str()}})
+		{
+			const GLuint shader = glCreateShader(stage);
+			glShaderSource(shader, 1, &source, nullptr);
+			glCompileShader(shader);
+			glAttachShader(myProgram, shader);
+			glDeleteShader(shader);
+		}
+		glLinkProgram(myProgram);
+		GLint linkedFlag = GL_FALSE;
+		glGetProgramiv(myProgram, GL_LINK_STATUS, &linkedFlag);
+		char log[1024] = {};
+		glGetProgramInfoLog(myProgram, sizeof(log), nullptr, log);
+		ASSERT_EQ(linkedFlag, GL_TRUE) << log;
+	}
+
+	static inline XServer* ourServer = nullptr;
+	static inline bool ourServerFlag = false;
+	Display* myDisplay = nullptr;
+	Window myWindow = 0;
+	Gpu::Device myWindowDevice;
+	Gpu::SwapChain mySwapChain;
+	GLuint myProgram = 0;
+	std::vector<uint8_t> myBackBuffer;
+};
+
+TEST_F(SwapChainWindowTest, PresentShowsTheBackBufferUprightWithItsBytes)
+{
+	for (const Dds::Format format : {Dds::Format::R8G8B8A8_UNORM_SRGB, Dds::Format::B8G8R8A8_UNORM})
+	{
+		SCOPED_TRACE(static_cast<unsigned>(format));
+		ASSERT_TRUE(mySwapChain.Init(myWindowDevice, 0, 0, format)); // the window's size
+		EXPECT_TRUE(mySwapChain.HasWindow());
+		EXPECT_EQ(mySwapChain.GetWidth(), 320);
+		EXPECT_EQ(mySwapChain.GetHeight(), 240);
+		DrawFrame(ourClearColor);
+		ASSERT_TRUE(mySwapChain.Present(0));
+
+		const std::vector<uint8_t> window = ReadWindowShowingBackBuffer(320, 240);
+		const Pixel quad = Stored(ourQuadColor, format);
+		const Pixel clear = Stored(ourClearColor, format);
+		// Direct3D's orientation: the top rows of the view are the top rows of the window.
+		EXPECT_EQ(At(window, 320, 0, 0), quad);
+		EXPECT_EQ(At(window, 320, 319, 119), quad);
+		EXPECT_EQ(At(window, 320, 0, 120), clear);
+		EXPECT_EQ(At(window, 320, 319, 239), clear);
+		// Every byte arrives as the back buffer stored it (sRGB-encoded, not decoded or encoded again).
+		EXPECT_TRUE(window == OpaqueBackBuffer());
+		Gpu::SavePng("/tmp/lumora-swapchain-window.png", 320, 240, window.data());
+		mySwapChain.Destroy();
+	}
+}
+
+TEST_F(SwapChainWindowTest, ResizeBuffersFollowsTheWindow)
+{
+	ASSERT_TRUE(mySwapChain.Init(myWindowDevice, 320, 240, Dds::Format::R8G8B8A8_UNORM_SRGB));
+	XResizeWindow(myDisplay, myWindow, 400, 300);
+	XSync(myDisplay, False);
+	ASSERT_TRUE(mySwapChain.ResizeBuffers(0, 0, Dds::Format::UNKNOWN));
+	EXPECT_EQ(mySwapChain.GetWidth(), 400);
+	EXPECT_EQ(mySwapChain.GetHeight(), 300);
+	DrawFrame(ourClearColor);
+	ASSERT_TRUE(mySwapChain.Present(1));
+	std::vector<uint8_t> window = ReadWindowShowingBackBuffer(400, 300);
+	EXPECT_TRUE(window == OpaqueBackBuffer());
+	Gpu::SavePng("/tmp/lumora-swapchain-resized.png", 400, 300, window.data());
+
+	// A back buffer smaller than the window is stretched over all of it.
+	const float blackColor[4] = {0.0f, 0.0f, 0.0f, 1.0f};
+	ASSERT_TRUE(mySwapChain.ResizeBuffers(200, 150, Dds::Format::UNKNOWN));
+	DrawFrame(blackColor);
+	ASSERT_TRUE(mySwapChain.Present(0));
+	const Pixel quad = Stored(ourQuadColor, Dds::Format::R8G8B8A8_UNORM_SRGB);
+	const Pixel black = {0, 0, 0, 255};
+	window = ReadWindow(400, 300, [&](const std::vector<uint8_t>& someShown) {
+		return At(someShown, 400, 399, 0) == quad && At(someShown, 400, 0, 299) == black;
+	});
+	EXPECT_EQ(At(window, 400, 399, 0), quad);
+	EXPECT_EQ(At(window, 400, 399, 140), quad);
+	EXPECT_EQ(At(window, 400, 399, 160), black);
+	EXPECT_EQ(At(window, 400, 0, 299), black);
+	Gpu::SavePng("/tmp/lumora-swapchain-stretched.png", 400, 300, window.data());
+}
+
+TEST_F(SwapChainWindowTest, RenderThreadPresentsWhileHoldingTheContext)
+{
+	ASSERT_TRUE(mySwapChain.Init(myWindowDevice, 320, 240, Dds::Format::R8G8B8A8_UNORM_SRGB));
+	myWindowDevice.ReleaseCurrent();
+	bool presentedFlag = false;
+	std::thread renderThread([&] {
+		if (myWindowDevice.MakeCurrent())
+		{
+			DrawFrame(ourQuadColor);
+			presentedFlag = mySwapChain.Present(1);
+			myWindowDevice.ReleaseCurrent();
+		}
+	});
+	renderThread.join();
+	ASSERT_TRUE(presentedFlag);
+	ASSERT_TRUE(myWindowDevice.MakeCurrent());
+	const std::vector<uint8_t> window = ReadWindowShowingBackBuffer(320, 240);
+	EXPECT_EQ(At(window, 320, 160, 200), Stored(ourQuadColor, Dds::Format::R8G8B8A8_UNORM_SRGB));
+	EXPECT_TRUE(window == OpaqueBackBuffer());
+}
+
+TEST_F(SwapChainWindowTest, BadWindowOrDisplayIsReportedNotFatal)
+{
+	const std::string display = std::getenv("DISPLAY");
+	struct Case
+	{
+		const char* myDisplay; // null: unset
+		Window myWindow;
+		const char* myMessage;
+	};
+	const Case cases[] = {
+	    {display.c_str(), 0x3fffffff, "does not exist on X display"},
+	    {display.c_str(), DefaultRootWindow(myDisplay) + 0x123456, "does not exist on X display"},
+	    {":997", myWindow, "Cannot open the X display ':997'"},
+	    {nullptr, myWindow, "$DISPLAY is not set"},
+	};
+	for (const Case& aCase : cases)
+	{
+		SCOPED_TRACE(aCase.myMessage);
+		if (aCase.myDisplay != nullptr)
+		{
+			setenv("DISPLAY", aCase.myDisplay, 1);
+		}
+		else
+		{
+			unsetenv("DISPLAY");
+		}
+		Gpu::Device device;
+		EXPECT_FALSE(device.Init(64, 64, aCase.myWindow));
+		EXPECT_EQ(device.GetFailure(), Gpu::DeviceFailure::NoDevice);
+		const std::vector<std::string> reports = TakeReports();
+		ASSERT_EQ(reports.size(), 1u);
+		EXPECT_TRUE(Contains(reports[0], aCase.myMessage)) << reports[0];
+	}
+	setenv("DISPLAY", display.c_str(), 1);
+	// The window device is untouched and still presents.
+	ASSERT_TRUE(myWindowDevice.MakeCurrent());
+	ASSERT_TRUE(mySwapChain.Init(myWindowDevice, 0, 0, Dds::Format::R8G8B8A8_UNORM));
+	EXPECT_TRUE(mySwapChain.Present(0));
+}
