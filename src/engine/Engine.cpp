@@ -72,6 +72,9 @@ bool Engine::D3DDeviceSetup(int aWidth, int aHeight)
 {
 	if (!myDevice.Init(aWidth, aHeight, myWindow))
 	{
+		// The driver's side of the story, logged without ending the process; the
+		// report after it is the failure.
+		ReportDebug(__LINE__, "Zeph::Engine::D3DDeviceSetup", "%s", myDevice.GetFailureText().c_str());
 		// A context below GL 4.5 core is the feature level the engine cannot use.
 		if (myDevice.GetFailure() == Gpu::DeviceFailure::VersionTooLow)
 		{

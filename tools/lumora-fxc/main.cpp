@@ -127,8 +127,8 @@ int main(int aCount, char** someArguments)
 	Gpu::Device device;
 	if (!device.Init(64, 64))
 	{
-		std::fprintf(stderr, "%s(1): error: no OpenGL 4.5 core context to validate the effect with\n",
-		             input.c_str());
+		std::fprintf(stderr, "%s(1): error: no OpenGL 4.5 core context to validate the effect with (%s)\n",
+		             input.c_str(), device.GetFailureText().c_str());
 		return 1;
 	}
 	PinLoadedGlLibraries();

@@ -15,7 +15,8 @@ void PrintGpu()
 	Gpu::Device device;
 	if (!device.Init(16, 16))
 	{
-		std::printf("gpu:        no OpenGL 4.5 core context on this machine (see the message above)\n");
+		std::printf("gpu:        no OpenGL 4.5 core context on this machine: %s\n",
+		            device.GetFailureText().c_str());
 		return;
 	}
 	std::printf("gpu:        %s, OpenGL %s, %s\n", device.GetRendererName().c_str(),

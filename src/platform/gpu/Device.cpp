@@ -156,6 +156,7 @@ bool Device::Init(int aWidth, int aHeight, WindowHandle aWindow)
 	myWidth = aWidth;
 	myHeight = aHeight;
 	myEglError = EGL_SUCCESS;
+	myFailureText.clear();
 	myRendererName.clear();
 	myVersionName.clear();
 
@@ -168,16 +169,16 @@ bool Device::Init(int aWidth, int aHeight, WindowHandle aWindow)
 	myWindow.Destroy();
 	if (myFailure == DeviceFailure::VersionTooLow)
 	{
-		ReportError(__LINE__, function, "OpenGL 4.5 core profile is needed; %s offers only OpenGL %s",
-		            myRendererName.c_str(), myVersionName.c_str());
+		myFailureText = Describe("OpenGL 4.5 core profile is needed; %s offers only OpenGL %s",
+		                         myRendererName.c_str(), myVersionName.c_str());
 	}
 	else if (aWindow == 0)
 	{
 		const char* clientExtensions = eglQueryString(EGL_NO_DISPLAY, EGL_EXTENSIONS);
-		ReportError(__LINE__, function,
-		            "No OpenGL 4.5 core context could be made (EGL error 0x%04x; surfaceless platform %s)",
-		            myEglError,
-		            HasExtension(clientExtensions, "EGL_MESA_platform_surfaceless") ? "present" : "missing");
+		myFailureText =
+		    Describe("No OpenGL 4.5 core context could be made (EGL error 0x%04x; surfaceless platform %s)",
+		             myEglError,
+		             HasExtension(clientExtensions, "EGL_MESA_platform_surfaceless") ? "present" : "missing");
 	}
 	return false;
 }
@@ -207,8 +208,7 @@ bool Device::InitHeadless()
 
 bool Device::InitWindow(WindowHandle aWindow)
 {
-	const char* function = "Gpu::Device::Init";
-	if (!myWindow.Init(aWindow, function))
+	if (!myWindow.Init(aWindow, myFailureText))
 	{
 		return false;
 	}
@@ -219,15 +219,16 @@ bool Device::InitWindow(WindowHandle aWindow)
 	if (!x11Flag ||
 	    !OpenDisplay(eglGetPlatformDisplayEXT(EGL_PLATFORM_X11_KHR, myWindow.GetDisplay(), nullptr)))
 	{
-		ReportError(__LINE__, function, "EGL cannot use X display '%s' (X11 platform %s, EGL error 0x%04x)",
-		            myWindow.GetDisplayName().c_str(), x11Flag ? "present" : "missing", eglGetError());
+		myFailureText =
+		    Describe("EGL cannot use X display '%s' (X11 platform %s, EGL error 0x%04x)",
+		             myWindow.GetDisplayName().c_str(), x11Flag ? "present" : "missing", eglGetError());
 		return false;
 	}
 	const EGLConfig config = ChooseWindowConfig(myDisplay, myWindow.GetVisualId());
 	if (config == nullptr)
 	{
-		ReportError(__LINE__, function, "No EGL config draws into window 0x%lx (X visual 0x%lx)", aWindow,
-		            myWindow.GetVisualId());
+		myFailureText = Describe("No EGL config draws into window 0x%lx (X visual 0x%lx)", aWindow,
+		                         myWindow.GetVisualId());
 		return false;
 	}
 	myWindowConfig = config;
@@ -235,9 +236,9 @@ bool Device::InitWindow(WindowHandle aWindow)
 	{
 		if (myFailure != DeviceFailure::VersionTooLow)
 		{
-			ReportError(__LINE__, function,
-			            "No OpenGL 4.5 core context for window 0x%lx on X display '%s' (EGL error 0x%04x)",
-			            aWindow, myWindow.GetDisplayName().c_str(), myEglError);
+			myFailureText =
+			    Describe("No OpenGL 4.5 core context for window 0x%lx on X display '%s' (EGL error 0x%04x)",
+			             aWindow, myWindow.GetDisplayName().c_str(), myEglError);
 		}
 		return false;
 	}

@@ -57,7 +57,11 @@ public:
 	void ReleaseCurrent();
 
 	bool IsInitialized() const { return myContextHandle != EGL_NO_CONTEXT; }
+	// Why Init failed (no display, no window, no GL 4.5 core context, an older GL), in
+	// words for a log or a terminal. Init does not report these itself: the caller
+	// says what a missing device means to it.
 	DeviceFailure GetFailure() const { return myFailure; }
+	const std::string& GetFailureText() const { return myFailureText; }
 	Context& GetContext() { return myContext; }
 	int GetWidth() const { return myWidth; }
 	int GetHeight() const { return myHeight; }
@@ -106,6 +110,7 @@ private:
 	WindowX11 myWindow;
 	Context myContext;
 	DeviceFailure myFailure = DeviceFailure::None;
+	std::string myFailureText;
 	int myWidth = 0;
 	int myHeight = 0;
 	int mySwapInterval = -1;         // not set yet

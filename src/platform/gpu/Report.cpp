@@ -17,6 +17,16 @@ void ReportError(int aLine, const char* aFunctionName, const char* aFormat, ...)
 	CoreReport::Critical(aLine, aFunctionName, message);
 }
 
+std::string Describe(const char* aFormat, ...)
+{
+	char message[1024];
+	std::va_list arguments;
+	va_start(arguments, aFormat);
+	std::vsnprintf(message, sizeof(message), aFormat, arguments);
+	va_end(arguments);
+	return message;
+}
+
 #ifndef NDEBUG
 namespace
 {

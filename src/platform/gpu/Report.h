@@ -18,6 +18,9 @@ namespace Gpu
 void ReportError(int aLine, const char* aFunctionName, const char* aFormat, ...)
     __attribute__((format(printf, 3, 4)));
 
+// The formatted text, for failures that the caller reports (or not) in its own words.
+std::string Describe(const char* aFormat, ...) __attribute__((format(printf, 1, 2)));
+
 #ifdef NDEBUG
 inline void CheckGlErrors(int, const char*)
 {

@@ -57,20 +57,20 @@ std::string ErrorText(Display* aDisplay, int aCode)
 }
 } // namespace
 
-bool WindowX11::Init(WindowHandle aWindow, const char* aFunctionName)
+bool WindowX11::Init(WindowHandle aWindow, std::string& aFailureOut)
 {
 	const char* displayName = XDisplayName(nullptr);
 	myDisplayName = displayName != nullptr ? displayName : "";
 	if (myDisplayName.empty())
 	{
-		ReportError(__LINE__, aFunctionName, "No X display for window 0x%lx: $DISPLAY is not set", aWindow);
+		aFailureOut = Describe("No X display for window 0x%lx: $DISPLAY is not set", aWindow);
 		return false;
 	}
 	myDisplay = XOpenDisplay(nullptr);
 	if (myDisplay == nullptr)
 	{
-		ReportError(__LINE__, aFunctionName, "Cannot open the X display '%s' for window 0x%lx",
-		            myDisplayName.c_str(), aWindow);
+		aFailureOut =
+		    Describe("Cannot open the X display '%s' for window 0x%lx", myDisplayName.c_str(), aWindow);
 		return false;
 	}
 	XWindowAttributes attributes{};
@@ -83,8 +83,8 @@ bool WindowX11::Init(WindowHandle aWindow, const char* aFunctionName)
 	}
 	if (error != Success || attributes.visual == nullptr)
 	{
-		ReportError(__LINE__, aFunctionName, "Window 0x%lx does not exist on X display '%s' (%s)", aWindow,
-		            myDisplayName.c_str(), ErrorText(myDisplay, error).c_str());
+		aFailureOut = Describe("Window 0x%lx does not exist on X display '%s' (%s)", aWindow,
+		                       myDisplayName.c_str(), ErrorText(myDisplay, error).c_str());
 		Destroy();
 		return false;
 	}

@@ -33,9 +33,9 @@ public:
 	WindowX11(const WindowX11&) = delete;
 	WindowX11& operator=(const WindowX11&) = delete;
 
-	// Opens the display and checks that the window exists there. Reports under
-	// aFunctionName and returns false otherwise.
-	bool Init(WindowHandle aWindow, const char* aFunctionName);
+	// Opens the display and checks that the window exists there; false with the
+	// reason in aFailureOut otherwise (the caller decides whether that is an error).
+	bool Init(WindowHandle aWindow, std::string& aFailureOut);
 	void Destroy();
 
 	// Maps the window and sends the request on its way.

@@ -50,7 +50,7 @@ protected:
 		});
 		if (!myDevice.Init(64, 64))
 		{
-			const std::string why = Joined();
+			const std::string why = myDevice.GetFailureText() + " " + Joined();
 			ourReports.clear();
 			const char* ci = std::getenv("CI");
 			if (ci && std::strcmp(ci, "true") == 0)
