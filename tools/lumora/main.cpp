@@ -3,6 +3,7 @@
 #include <cstdio>
 #include <cstring>
 
+#include "DemoFrame.h"
 #include "lumora.h"
 #include "platform/gpu/Device.h"
 
@@ -32,9 +33,24 @@ int main(int argc, char** argv)
 		std::printf("lumora %s\n", Lumora::GetVersion());
 		return 0;
 	}
+	if (argc > 1 && std::strcmp(argv[1], "--demo-frame") == 0)
+	{
+		if (argc != 3)
+		{
+			std::fprintf(stderr, "usage: lumora --demo-frame OUT.png\n");
+			return 2;
+		}
+		if (!LumoraTool::RenderDemoFrame(argv[2], 640, 360))
+		{
+			return 1;
+		}
+		std::printf("wrote %s (640x360)\n", argv[2]);
+		return 0;
+	}
 	if (argc > 1)
 	{
-		std::fprintf(stderr, "lumora: unknown argument '%s' (this build knows --version only)\n", argv[1]);
+		std::fprintf(stderr, "lumora: unknown argument '%s' (this build knows --version and --demo-frame)\n",
+		             argv[1]);
 		return 2;
 	}
 	std::printf("Lumora %s\n%s", Lumora::GetVersion(), Lumora::GetBuildInfo().c_str());

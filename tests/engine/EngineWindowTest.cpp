@@ -1,0 +1,107 @@
+// The engine on an X11 window under Xvfb: the same frame as headless, read back
+// from what the window shows after Present.
+
+#include <chrono>
+#include <cmath>
+#include <thread>
+
+#include "EngineFixture.h"
+#include "platform/gpu/Readback.h"
+#include "platform/gpu/XServer.h"
+
+namespace
+{
+uint8_t SrgbByte(float aLinear)
+{
+	const float encoded =
+	    aLinear <= 0.0031308f ? aLinear * 12.92f : 1.055f * std::pow(aLinear, 1.0f / 2.4f) - 0.055f;
+	return static_cast<uint8_t>(std::lround(encoded * 255.0f));
+}
+
+bool Near(const uint8_t* aPixel, const float aLinear[3])
+{
+	for (int channel = 0; channel < 3; ++channel)
+	{
+		if (std::abs(aPixel[channel] - SrgbByte(aLinear[channel])) > 1)
+		{
+			return false;
+		}
+	}
+	return true;
+}
+} // namespace
+
+TEST_F(EngineTest, AFrameOnAnX11WindowShowsTheQuadAtTheTop)
+{
+	XServer server;
+	if (!server.Start())
+	{
+		if (TestSupport::IsCi() && XServer::IsXvfbInstalled())
+		{
+			FAIL() << server.GetReason();
+		}
+		GTEST_SKIP() << server.GetReason();
+	}
+	constexpr int width = 320;
+	constexpr int height = 240;
+	Display* display = XOpenDisplay(nullptr);
+	ASSERT_NE(display, nullptr);
+	const Window window = XCreateSimpleWindow(display, DefaultRootWindow(display), 0, 0, width, height, 0, 0, 0);
+	XFlush(display);
+	if (CreateEngine(width, height, window))
+	{
+		Zeph::Engine* engine = Zeph::Engine::GetInstance();
+		Gpu::Context& context = engine->GetContext();
+		Zeph::Effect* effect = engine->GetEffectContainer().GetEffect("Data/Shaders/Misc/Vertex_PosCol.fx");
+		ASSERT_NE(effect, nullptr) << TakeLog();
+		const Matrix44<float> identity;
+		effect->SetWorldMatrix(identity);
+		effect->SetViewMatrix(identity);
+		effect->SetProjectionMatrix(identity);
+		const float clearColor[4] = {0.1f, 0.2f, 0.3f, 1.0f};
+		const float quadColor[4] = {0.5f, 0.25f, 1.0f, 1.0f};
+		context.ClearRenderTargetView(*engine->GetBackBufferView(), clearColor);
+		context.ClearDepthStencilView(*engine->GetDepthStencilView(), true, true, 1.0f, 0);
+		Gpu::RenderTargetView* const targets[] = {engine->GetBackBufferView()};
+		ASSERT_TRUE(context.SetRenderTargets(targets, engine->GetDepthStencilView()));
+		ASSERT_TRUE(
+		    DrawQuad(context, *effect->GetTechnique()->GetPassByIndex(0), -0.5f, 0.2f, 0.5f, 0.9f, quadColor));
+		engine->Present();
+
+		// Another connection draws the window: wait until the frame has arrived.
+		std::vector<uint8_t> shown(static_cast<size_t>(width * height * 4));
+		bool arrivedFlag = false;
+		for (int attempt = 0; attempt < 100 && !arrivedFlag; ++attempt)
+		{
+			XImage* image = XGetImage(display, window, 0, 0, width, height, AllPlanes, ZPixmap);
+			ASSERT_NE(image, nullptr);
+			for (int y = 0; y < height; ++y)
+			{
+				for (int x = 0; x < width; ++x)
+				{
+					const unsigned long value = XGetPixel(image, x, y);
+					uint8_t* pixel = &shown[static_cast<size_t>((y * width + x) * 4)];
+					pixel[0] = static_cast<uint8_t>((value & image->red_mask) >> 16);
+					pixel[1] = static_cast<uint8_t>((value & image->green_mask) >> 8);
+					pixel[2] = static_cast<uint8_t>(value & image->blue_mask);
+					pixel[3] = 255;
+				}
+			}
+			XDestroyImage(image);
+			arrivedFlag = Near(&shown[(54 * width + 160) * 4], quadColor);
+			if (!arrivedFlag)
+			{
+				std::this_thread::sleep_for(std::chrono::milliseconds(20));
+			}
+		}
+		Gpu::SavePng(myScratch.File("window.png"), width, height, shown.data());
+		EXPECT_TRUE(arrivedFlag) << "the quad's colour, sRGB-encoded, at the centre of the top half";
+		EXPECT_TRUE(Near(&shown[0], clearColor)) << "top-left corner";
+		EXPECT_TRUE(Near(&shown[((height - 1) * width + width - 1) * 4], clearColor)) << "bottom-right corner";
+		EXPECT_TRUE(Near(&shown[(180 * width + 160) * 4], clearColor)) << "below the quad";
+		// The window goes after the engine's surface on it.
+		Zeph::Engine::ShutDown();
+	}
+	XDestroyWindow(display, window);
+	XCloseDisplay(display);
+}
