@@ -31,8 +31,9 @@ std::string GetBuildInfo()
 	info += SanitizerName();
 	info += "\nsubsystems:\n";
 	info += "  core      GrowingArray, Vector2/3/4, Matrix33/44, Intersection (Sphere, AABB, Ray)\n";
-	info += "  engine    Engine (device, swap chain, back and depth buffers), texture and effect containers,\n"
-	        "            Debug log with fatal reports, FI_File typed text/binary stream, Camera\n";
+	info +=
+	    "  engine    Engine (device, swap chain, back and depth buffers), texture and effect containers,\n"
+	    "            Debug log with fatal reports, FI_File typed text/binary stream, Camera\n";
 	info += "  xml       XML cursor and XMLElement builder on TinyXML " +
 	        std::to_string(TIXML_MAJOR_VERSION) + "." + std::to_string(TIXML_MINOR_VERSION) + "." +
 	        std::to_string(TIXML_PATCH_VERSION) + "\n";

@@ -40,7 +40,6 @@ protected:
 		Gpu::WindowHandle window = aWindow;
 		if (Zeph::Engine::Create(window, aWidth, aHeight))
 		{
-			TestSupport::PinLoadedGlLibraries();
 			return true;
 		}
 		const std::string log = TakeLog();

@@ -46,7 +46,8 @@ TEST_F(EngineTest, AFrameOnAnX11WindowShowsTheQuadAtTheTop)
 	constexpr int height = 240;
 	Display* display = XOpenDisplay(nullptr);
 	ASSERT_NE(display, nullptr);
-	const Window window = XCreateSimpleWindow(display, DefaultRootWindow(display), 0, 0, width, height, 0, 0, 0);
+	const Window window =
+	    XCreateSimpleWindow(display, DefaultRootWindow(display), 0, 0, width, height, 0, 0, 0);
 	XFlush(display);
 	if (CreateEngine(width, height, window))
 	{
@@ -64,8 +65,8 @@ TEST_F(EngineTest, AFrameOnAnX11WindowShowsTheQuadAtTheTop)
 		context.ClearDepthStencilView(*engine->GetDepthStencilView(), true, true, 1.0f, 0);
 		Gpu::RenderTargetView* const targets[] = {engine->GetBackBufferView()};
 		ASSERT_TRUE(context.SetRenderTargets(targets, engine->GetDepthStencilView()));
-		ASSERT_TRUE(
-		    DrawQuad(context, *effect->GetTechnique()->GetPassByIndex(0), -0.5f, 0.2f, 0.5f, 0.9f, quadColor));
+		ASSERT_TRUE(DrawQuad(context, *effect->GetTechnique()->GetPassByIndex(0), -0.5f, 0.2f, 0.5f, 0.9f,
+		                     quadColor));
 		engine->Present();
 
 		// Another connection draws the window: wait until the frame has arrived.
@@ -97,7 +98,8 @@ TEST_F(EngineTest, AFrameOnAnX11WindowShowsTheQuadAtTheTop)
 		Gpu::SavePng(myScratch.File("window.png"), width, height, shown.data());
 		EXPECT_TRUE(arrivedFlag) << "the quad's colour, sRGB-encoded, at the centre of the top half";
 		EXPECT_TRUE(Near(&shown[0], clearColor)) << "top-left corner";
-		EXPECT_TRUE(Near(&shown[((height - 1) * width + width - 1) * 4], clearColor)) << "bottom-right corner";
+		EXPECT_TRUE(Near(&shown[((height - 1) * width + width - 1) * 4], clearColor))
+		    << "bottom-right corner";
 		EXPECT_TRUE(Near(&shown[(180 * width + 160) * 4], clearColor)) << "below the quad";
 		// The window goes after the engine's surface on it.
 		Zeph::Engine::ShutDown();

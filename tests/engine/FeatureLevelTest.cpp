@@ -47,7 +47,6 @@ TEST(EngineFeatureLevelTest, OlderGlFailsCreateWithTheFeatureLevelReport)
 			}
 			GTEST_SKIP() << "No OpenGL 4.5 core context";
 		}
-		TestSupport::PinLoadedGlLibraries();
 		device.Destroy();
 	}
 	GTEST_FLAG_SET(death_test_style, "threadsafe");

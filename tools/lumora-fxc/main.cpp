@@ -10,10 +10,8 @@
 
 #include <cstdio>
 #include <cstring>
-#include <dlfcn.h>
 #include <filesystem>
 #include <fstream>
-#include <link.h>
 #include <string>
 
 #include "core/CoreReport.h"
@@ -23,26 +21,6 @@
 
 namespace
 {
-// Mesa unloads its driver with the EGL display, and LeakSanitizer then sees the
-// driver's process-wide allocations as leaked; keeping the GL libraries mapped
-// keeps them reachable, so a leak report from this tool is a leak of ours.
-void PinLoadedGlLibraries()
-{
-	dl_iterate_phdr(
-	    [](dl_phdr_info* anInfo, size_t, void*) -> int {
-		    const std::string name = anInfo->dlpi_name != nullptr ? anInfo->dlpi_name : "";
-		    for (const char* library : {"_dri.so", "libgallium", "libEGL_mesa", "libglapi", "libGLX_mesa"})
-		    {
-			    if (name.find(library) != std::string::npos)
-			    {
-				    dlopen(name.c_str(), RTLD_LAZY | RTLD_NOLOAD | RTLD_NODELETE);
-			    }
-		    }
-		    return 0;
-	    },
-	    nullptr);
-}
-
 bool WriteAtomically(const std::string& aPath, const void* someBytes, size_t aSize)
 {
 	const std::string target = Paths::PrepareForWrite(aPath);
@@ -131,7 +109,6 @@ int main(int aCount, char** someArguments)
 		             input.c_str(), device.GetFailureText().c_str());
 		return 1;
 	}
-	PinLoadedGlLibraries();
 	Fx::CompileOutput result;
 	const bool okFlag = Fx::CompileFromFile(input, result);
 	device.Destroy();

@@ -42,10 +42,10 @@ void AddBox(const Box& aBox, std::vector<Vertex>& someVertices, std::vector<uint
 	for (const auto& sign : signs)
 	{
 		const float shade = sign[1] > 0 ? 1.0f : 0.3f;
-		someVertices.push_back({{aBox.myCenter.x + sign[0] * aBox.myHalfSize.x,
-		                         aBox.myCenter.y + sign[1] * aBox.myHalfSize.y,
-		                         aBox.myCenter.z + sign[2] * aBox.myHalfSize.z},
-		                        {aBox.myColor[0] * shade, aBox.myColor[1] * shade, aBox.myColor[2] * shade, 1.0f}});
+		someVertices.push_back(
+		    {{aBox.myCenter.x + sign[0] * aBox.myHalfSize.x, aBox.myCenter.y + sign[1] * aBox.myHalfSize.y,
+		      aBox.myCenter.z + sign[2] * aBox.myHalfSize.z},
+		     {aBox.myColor[0] * shade, aBox.myColor[1] * shade, aBox.myColor[2] * shade, 1.0f}});
 	}
 	for (uint32_t index : ourBoxIndices)
 	{
@@ -71,11 +71,12 @@ bool Draw(Zeph::Engine& anEngine, Zeph::Effect& anEffect, const char* aTechnique
 	    {"POSITION", 0, Dds::Format::R32G32B32_FLOAT, 0, 0},
 	    {"COLOR", 0, Dds::Format::R32G32B32A32_FLOAT, 0, 12},
 	};
-	bool result = vertices.Init({Gpu::BufferKind::Vertex, someVertices.size() * sizeof(Vertex), false, "demo vertices"},
-	                            someVertices.data()) &&
-	              indices.Init({Gpu::BufferKind::Index, someIndices.size() * sizeof(uint32_t), false, "demo indices"},
-	                           someIndices.data()) &&
-	              layout.Init(context, elements, pass->GetVertexInputs(), "demo layout");
+	bool result =
+	    vertices.Init({Gpu::BufferKind::Vertex, someVertices.size() * sizeof(Vertex), false, "demo vertices"},
+	                  someVertices.data()) &&
+	    indices.Init({Gpu::BufferKind::Index, someIndices.size() * sizeof(uint32_t), false, "demo indices"},
+	                 someIndices.data()) &&
+	    layout.Init(context, elements, pass->GetVertexInputs(), "demo layout");
 	if (result)
 	{
 		context.SetInputLayout(&layout);
@@ -98,7 +99,8 @@ bool RenderWithEngine(Zeph::Engine& anEngine, const std::string& aPath, int aWid
 	Zeph::Effect* effect = anEngine.GetEffectContainer().GetEffect("Data/Shaders/Misc/Vertex_PosCol.fx");
 	if (effect == nullptr)
 	{
-		std::fprintf(stderr, "lumora: cannot load Data/Shaders/Misc/Vertex_PosCol.fx (is data/ here, built?)\n");
+		std::fprintf(stderr,
+		             "lumora: cannot load Data/Shaders/Misc/Vertex_PosCol.fx (is data/ here, built?)\n");
 		return false;
 	}
 	Zeph::Camera camera;
@@ -113,7 +115,7 @@ bool RenderWithEngine(Zeph::Engine& anEngine, const std::string& aPath, int aWid
 	std::vector<Vertex> vertices;
 	std::vector<uint32_t> indices;
 	AddBox({{0.0f, -0.1f, 0.0f}, {6.0f, 0.1f, 6.0f}, {0.55f, 0.55f, 0.6f}}, vertices, indices);
-	const float colors[][3] = {{0.9f, 0.25f, 0.2f}, {0.2f, 0.7f, 0.3f}, {0.25f, 0.4f, 0.95f},
+	const float colors[][3] = {{0.9f, 0.25f, 0.2f},  {0.2f, 0.7f, 0.3f},  {0.25f, 0.4f, 0.95f},
 	                           {0.95f, 0.75f, 0.2f}, {0.7f, 0.3f, 0.85f}, {0.2f, 0.8f, 0.85f}};
 	for (int row = 0; row < 3; ++row)
 	{
@@ -121,10 +123,11 @@ bool RenderWithEngine(Zeph::Engine& anEngine, const std::string& aPath, int aWid
 		{
 			const int at = row * 3 + column;
 			const float height = 0.4f + 0.35f * static_cast<float>((at * 5) % 7);
-			AddBox({{-3.5f + 3.5f * static_cast<float>(column), height, -3.5f + 3.5f * static_cast<float>(row)},
-			        {0.8f, height, 0.8f},
-			        {colors[at % 6][0], colors[at % 6][1], colors[at % 6][2]}},
-			       vertices, indices);
+			AddBox(
+			    {{-3.5f + 3.5f * static_cast<float>(column), height, -3.5f + 3.5f * static_cast<float>(row)},
+			     {0.8f, height, 0.8f},
+			     {colors[at % 6][0], colors[at % 6][1], colors[at % 6][2]}},
+			    vertices, indices);
 		}
 	}
 	std::vector<Vertex> wireVertices;

@@ -1,7 +1,10 @@
 #include "platform/gpu/Device.h"
 
 #include <cstring>
+#include <dlfcn.h>
+#include <link.h>
 #include <mutex>
+#include <string>
 #include <utility>
 #include <vector>
 
@@ -61,6 +64,32 @@ bool HasExtension(const char* someExtensions, const char* aName)
 		}
 	}
 	return false;
+}
+
+// Mesa unloads its driver when the last EGL display goes, and loads it again for
+// the next device (tens of milliseconds each time); worse, the driver's
+// process-wide allocations, held by its globals, then look leaked to
+// LeakSanitizer because the globals are unmapped. The first device keeps the
+// loaded GL libraries mapped for the life of the process.
+void KeepDriverLoaded()
+{
+	static std::once_flag ourOnce;
+	std::call_once(ourOnce, [] {
+		dl_iterate_phdr(
+		    [](dl_phdr_info* anInfo, size_t, void*) -> int {
+			    const std::string name = anInfo->dlpi_name != nullptr ? anInfo->dlpi_name : "";
+			    for (const char* library :
+			         {"_dri.so", "libgallium", "libEGL_mesa", "libglapi", "libGLX_mesa"})
+			    {
+				    if (name.find(library) != std::string::npos)
+				    {
+					    dlopen(name.c_str(), RTLD_LAZY | RTLD_NOLOAD | RTLD_NODELETE);
+				    }
+			    }
+			    return 0;
+		    },
+		    nullptr);
+	});
 }
 
 #ifndef NDEBUG
@@ -163,6 +192,7 @@ bool Device::Init(int aWidth, int aHeight, WindowHandle aWindow)
 	if (aWindow != 0 ? InitWindow(aWindow) : InitHeadless())
 	{
 		myFailure = DeviceFailure::None;
+		KeepDriverLoaded();
 		return true;
 	}
 	ReleaseDisplay();

@@ -274,7 +274,6 @@ TEST(DeviceFailureTest, OlderGlIsVersionTooLowNotNoDevice)
 			}
 			GTEST_SKIP() << "No OpenGL 4.5 core context";
 		}
-		PinLoadedGlLibraries();
 		EXPECT_EQ(device.GetFailure(), Gpu::DeviceFailure::None);
 		device.Destroy();
 	}

@@ -6,9 +6,7 @@
 
 #include <cstdlib>
 #include <cstring>
-#include <dlfcn.h>
 #include <gtest/gtest.h>
-#include <link.h>
 #include <memory>
 #include <string>
 #include <vector>
@@ -16,27 +14,7 @@
 #include "core/CoreReport.h"
 #include "platform/gpu/Device.h"
 #include "platform/gpu/Texture.h"
-
-// Mesa unloads its driver when the EGL display goes; the driver's process-wide
-// allocations, still held by its globals, then look leaked to LeakSanitizer
-// because those globals are unmapped. Keeping the loaded GL libraries mapped
-// leaves them reachable, so a leak report from a GPU test is a leak of ours.
-inline void PinLoadedGlLibraries()
-{
-	dl_iterate_phdr(
-	    [](dl_phdr_info* anInfo, size_t, void*) -> int {
-		    const std::string name = anInfo->dlpi_name != nullptr ? anInfo->dlpi_name : "";
-		    for (const char* library : {"_dri.so", "libgallium", "libEGL_mesa", "libglapi", "libGLX_mesa"})
-		    {
-			    if (name.find(library) != std::string::npos)
-			    {
-				    dlopen(name.c_str(), RTLD_LAZY | RTLD_NOLOAD | RTLD_NODELETE);
-			    }
-		    }
-		    return 0;
-	    },
-	    nullptr);
-}
+#include "support/GlSupport.h"
 
 class GpuTest : public testing::Test
 {
@@ -52,14 +30,12 @@ protected:
 		{
 			const std::string why = myDevice.GetFailureText() + " " + Joined();
 			ourReports.clear();
-			const char* ci = std::getenv("CI");
-			if (ci && std::strcmp(ci, "true") == 0)
+			if (TestSupport::IsCi())
 			{
 				FAIL() << "No OpenGL 4.5 core context under CI: " << why;
 			}
 			GTEST_SKIP() << "No OpenGL 4.5 core context: " << why;
 		}
-		PinLoadedGlLibraries();
 	}
 
 	void TearDown() override
