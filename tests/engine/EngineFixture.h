@@ -113,6 +113,40 @@ protected:
 		return result;
 	}
 
+	static constexpr float ourClearColor[4] = {0.1f, 0.2f, 0.3f, 1.0f};
+	static constexpr float ourQuadColor[4] = {0.5f, 0.25f, 1.0f, 1.0f};
+
+	// The acceptance frame: clears the back buffer to ourClearColor, draws a quad of
+	// ourQuadColor over clip-space x -0.5..0.5, y 0.2..0.9 (the upper part of the view)
+	// through Vertex_PosCol.fx with identity matrices, and presents.
+	bool DrawFrame()
+	{
+		Zeph::Engine* engine = Zeph::Engine::GetInstance();
+		Gpu::Context& context = engine->GetContext();
+		Zeph::Effect* effect = engine->GetEffectContainer().GetEffect("Data/Shaders/Misc/Vertex_PosCol.fx");
+		if (effect == nullptr)
+		{
+			ADD_FAILURE() << "Vertex_PosCol.fx did not load:\n" << TakeLog();
+			return false;
+		}
+		const Matrix44<float> identity;
+		effect->SetWorldMatrix(identity);
+		effect->SetViewMatrix(identity);
+		effect->SetProjectionMatrix(identity);
+		context.ClearRenderTargetView(*engine->GetBackBufferView(), ourClearColor);
+		context.ClearDepthStencilView(*engine->GetDepthStencilView(), true, true, 1.0f, 0);
+		Gpu::RenderTargetView* const targets[] = {engine->GetBackBufferView()};
+		if (!context.SetRenderTargets(targets, engine->GetDepthStencilView()) ||
+		    !DrawQuad(context, *effect->GetTechnique()->GetPassByIndex(0), -0.5f, 0.2f, 0.5f, 0.9f,
+		              ourQuadColor))
+		{
+			ADD_FAILURE() << "the frame was not drawn";
+			return false;
+		}
+		engine->Present();
+		return true;
+	}
+
 	TestSupport::ScratchDir myScratch;
 	std::string myLogPath;
 	size_t myLogTaken = 0;

@@ -18,7 +18,7 @@ uint8_t SrgbByte(float aLinear)
 	return static_cast<uint8_t>(std::lround(encoded * 255.0f));
 }
 
-bool Near(const uint8_t* aPixel, const float aLinear[3])
+bool Near(const uint8_t* aPixel, const float* aLinear)
 {
 	for (int channel = 0; channel < 3; ++channel)
 	{
@@ -51,23 +51,9 @@ TEST_F(EngineTest, AFrameOnAnX11WindowShowsTheQuadAtTheTop)
 	XFlush(display);
 	if (CreateEngine(width, height, window))
 	{
-		Zeph::Engine* engine = Zeph::Engine::GetInstance();
-		Gpu::Context& context = engine->GetContext();
-		Zeph::Effect* effect = engine->GetEffectContainer().GetEffect("Data/Shaders/Misc/Vertex_PosCol.fx");
-		ASSERT_NE(effect, nullptr) << TakeLog();
-		const Matrix44<float> identity;
-		effect->SetWorldMatrix(identity);
-		effect->SetViewMatrix(identity);
-		effect->SetProjectionMatrix(identity);
-		const float clearColor[4] = {0.1f, 0.2f, 0.3f, 1.0f};
-		const float quadColor[4] = {0.5f, 0.25f, 1.0f, 1.0f};
-		context.ClearRenderTargetView(*engine->GetBackBufferView(), clearColor);
-		context.ClearDepthStencilView(*engine->GetDepthStencilView(), true, true, 1.0f, 0);
-		Gpu::RenderTargetView* const targets[] = {engine->GetBackBufferView()};
-		ASSERT_TRUE(context.SetRenderTargets(targets, engine->GetDepthStencilView()));
-		ASSERT_TRUE(DrawQuad(context, *effect->GetTechnique()->GetPassByIndex(0), -0.5f, 0.2f, 0.5f, 0.9f,
-		                     quadColor));
-		engine->Present();
+		ASSERT_TRUE(DrawFrame());
+		const float* clearColor = ourClearColor;
+		const float* quadColor = ourQuadColor;
 
 		// Another connection draws the window: wait until the frame has arrived.
 		std::vector<uint8_t> shown(static_cast<size_t>(width * height * 4));
