@@ -1,6 +1,6 @@
 #include "platform/fx/GlProgram.h"
 
-#include <regex>
+#include <string_view>
 
 #include "platform/fx/EffectSource.h"
 
@@ -96,22 +96,75 @@ GLuint LinkPass(std::span<const GLuint> someShaders, std::span<const VertexInput
 	return program;
 }
 
+namespace
+{
+// A small cursor over one log line; each step consumes only when it matches.
+struct LineCursor
+{
+	const std::string& myText;
+	size_t myAt = 0;
+
+	bool Number(unsigned long& aValue)
+	{
+		const size_t first = myAt;
+		aValue = 0;
+		while (myAt < myText.size() && myText[myAt] >= '0' && myText[myAt] <= '9' && myAt - first < 9)
+		{
+			aValue = aValue * 10 + static_cast<unsigned long>(myText[myAt] - '0');
+			++myAt;
+		}
+		return myAt > first;
+	}
+
+	bool Literal(const char* aLiteral)
+	{
+		const std::string_view literal(aLiteral);
+		if (myText.compare(myAt, literal.size(), literal) != 0)
+		{
+			return false;
+		}
+		myAt += literal.size();
+		return true;
+	}
+
+	std::string Rest() const { return myText.substr(myAt); }
+};
+
+// Driver log formats: Mesa "0:12(5): error: ...", others "ERROR: 0:12: ..." and
+// "0(12) : error ...". True with the line number and the message when one matches.
+bool ParseLogLine(const std::string& aLine, unsigned long& aLineNumber, std::string& aMessage)
+{
+	unsigned long source = 0;
+	unsigned long column = 0;
+	LineCursor mesa{aLine};
+	if (mesa.Number(source) && mesa.Literal(":") && mesa.Number(aLineNumber) && mesa.Literal("(") &&
+	    mesa.Number(column) && mesa.Literal("): "))
+	{
+		aMessage = mesa.Rest();
+		return true;
+	}
+	LineCursor prefixed{aLine};
+	const bool errorFlag = prefixed.Literal("ERROR: ");
+	if ((errorFlag || prefixed.Literal("WARNING: ")) && prefixed.Number(source) && prefixed.Literal(":") &&
+	    prefixed.Number(aLineNumber) && prefixed.Literal(": "))
+	{
+		aMessage = (errorFlag ? "error: " : "warning: ") + prefixed.Rest();
+		return true;
+	}
+	LineCursor parenthesised{aLine};
+	if (parenthesised.Number(source) && parenthesised.Literal("(") && parenthesised.Number(aLineNumber) &&
+	    parenthesised.Literal(")") && (parenthesised.Literal(" : ") || parenthesised.Literal(": ")))
+	{
+		aMessage = parenthesised.Rest();
+		return true;
+	}
+	return false;
+}
+} // namespace
+
 std::string MapDriverLog(const std::string& aLog, const std::vector<std::string>& someFiles,
                          const std::string& aFallback)
 {
-	// Mesa: "0:12(5): error: ...", others: "ERROR: 0:12: ..." and "0(12) : error ...".
-	static const std::regex mesa(R"(^(\d+):(\d+)\(\d+\): (.*)$)");
-	static const std::regex prefixed(R"(^(ERROR|WARNING): (\d+):(\d+): (.*)$)");
-	static const std::regex parenthesised(R"(^(\d+)\((\d+)\) ?: (.*)$)");
-	// Mesa keeps the line of a #line directive but not always its source number,
-	// so included files carry their index in the line number instead.
-	auto location = [&](const std::string& aLine) {
-		const unsigned long number = std::stoul(aLine.substr(0, 9));
-		const unsigned long index = number / ourIncludeLineStride;
-		const std::string file =
-		    index < someFiles.size() ? someFiles[index] : "source " + std::to_string(index);
-		return file + "(" + std::to_string(number % ourIncludeLineStride) + "): ";
-	};
 	std::string mapped;
 	size_t start = 0;
 	while (start < aLog.size())
@@ -123,24 +176,19 @@ std::string MapDriverLog(const std::string& aLog, const std::vector<std::string>
 		{
 			continue;
 		}
-		std::smatch match;
-		if (std::regex_match(line, match, mesa))
-		{
-			mapped += location(match[2]) + match[3].str() + "\n";
-		}
-		else if (std::regex_match(line, match, prefixed))
-		{
-			mapped +=
-			    location(match[3]) + (match[1] == "ERROR" ? "error: " : "warning: ") + match[4].str() + "\n";
-		}
-		else if (std::regex_match(line, match, parenthesised))
-		{
-			mapped += location(match[2]) + match[3].str() + "\n";
-		}
-		else
+		unsigned long number = 0;
+		std::string message;
+		if (!ParseLogLine(line, number, message))
 		{
 			mapped += aFallback + ": " + line + "\n";
+			continue;
 		}
+		// Mesa keeps the line of a #line directive but not always its source number,
+		// so included files carry their index in the line number instead.
+		const unsigned long index = number / ourIncludeLineStride;
+		const std::string file =
+		    index < someFiles.size() ? someFiles[index] : "source " + std::to_string(index);
+		mapped += file + "(" + std::to_string(number % ourIncludeLineStride) + "): " + message + "\n";
 	}
 	return mapped;
 }
