@@ -21,22 +21,6 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* someData, size_t aSize);
 
 namespace
 {
-ImageInfo MakeInfo(Format aFormat, uint32_t aWidth, uint32_t aHeight, uint32_t aMips,
-                   ResourceDimension aDimension = ResourceDimension::Texture2D, uint32_t aDepth = 1,
-                   uint32_t anArraySize = 1, bool aCubeFlag = false)
-{
-	ImageInfo info;
-	info.myWidth = aWidth;
-	info.myHeight = aHeight;
-	info.myDepth = aDepth;
-	info.myArraySize = anArraySize;
-	info.myMipLevels = aMips;
-	info.myMiscFlags = aCubeFlag ? Dds::MiscTextureCube : 0;
-	info.myFormat = aFormat;
-	info.myResourceDimension = aDimension;
-	return info;
-}
-
 // An image whose bytes differ from subresource to subresource, so a swapped face
 // or mip shows up in a byte comparison.
 Dds::Image MakeImage(const ImageInfo& anInfo)
@@ -136,42 +120,31 @@ TEST(DdsFormatTest, SizesCountWholeBlocksAndPixels)
 
 TEST(DdsFormatTest, SRGBAndTypelessMaps)
 {
-	const struct
-	{
-		Format format, srgb, typeless;
-	} cases[] = {
-	    {Format::R8G8B8A8_TYPELESS, Format::R8G8B8A8_UNORM_SRGB, Format::R8G8B8A8_TYPELESS},
-	    {Format::R8G8B8A8_UNORM, Format::R8G8B8A8_UNORM_SRGB, Format::R8G8B8A8_TYPELESS},
-	    {Format::R8G8B8A8_UNORM_SRGB, Format::R8G8B8A8_UNORM_SRGB, Format::R8G8B8A8_TYPELESS},
-	    {Format::R8G8B8A8_UINT, Format::R8G8B8A8_UNORM_SRGB, Format::R8G8B8A8_TYPELESS},
-	    {Format::R8G8B8A8_SNORM, Format::R8G8B8A8_UNORM_SRGB, Format::R8G8B8A8_TYPELESS},
-	    {Format::R8G8B8A8_SINT, Format::R8G8B8A8_UNORM_SRGB, Format::R8G8B8A8_TYPELESS},
-	    {Format::BC1_TYPELESS, Format::BC1_UNORM_SRGB, Format::BC1_TYPELESS},
-	    {Format::BC1_UNORM, Format::BC1_UNORM_SRGB, Format::BC1_TYPELESS},
-	    {Format::BC1_UNORM_SRGB, Format::BC1_UNORM_SRGB, Format::BC1_TYPELESS},
-	    {Format::BC2_TYPELESS, Format::BC2_UNORM_SRGB, Format::BC2_TYPELESS},
-	    {Format::BC2_UNORM, Format::BC2_UNORM_SRGB, Format::BC2_TYPELESS},
-	    {Format::BC2_UNORM_SRGB, Format::BC2_UNORM_SRGB, Format::BC2_TYPELESS},
-	    {Format::BC3_TYPELESS, Format::BC3_UNORM_SRGB, Format::BC3_TYPELESS},
-	    {Format::BC3_UNORM, Format::BC3_UNORM_SRGB, Format::BC3_TYPELESS},
-	    {Format::BC3_UNORM_SRGB, Format::BC3_UNORM_SRGB, Format::BC3_TYPELESS},
-	    // Everything else maps to itself, B8G8R8A8 included.
-	    {Format::B8G8R8A8_UNORM, Format::B8G8R8A8_UNORM, Format::B8G8R8A8_UNORM},
-	    {Format::B8G8R8A8_TYPELESS, Format::B8G8R8A8_TYPELESS, Format::B8G8R8A8_TYPELESS},
-	    {Format::B8G8R8A8_UNORM_SRGB, Format::B8G8R8A8_UNORM_SRGB, Format::B8G8R8A8_UNORM_SRGB},
-	    {Format::B8G8R8X8_UNORM, Format::B8G8R8X8_UNORM, Format::B8G8R8X8_UNORM},
-	    {Format::R16G16B16A16_FLOAT, Format::R16G16B16A16_FLOAT, Format::R16G16B16A16_FLOAT},
-	    {Format::R10G10B10A2_UNORM, Format::R10G10B10A2_UNORM, Format::R10G10B10A2_UNORM},
-	    {Format::R32_FLOAT, Format::R32_FLOAT, Format::R32_FLOAT},
-	    {Format::D24_UNORM_S8_UINT, Format::D24_UNORM_S8_UINT, Format::D24_UNORM_S8_UINT},
-	    {Format::UNKNOWN, Format::UNKNOWN, Format::UNKNOWN},
+	// Each family: its typeless and sRGB members, then the others that map onto them.
+	const std::vector<std::vector<Format>> families = {
+	    {Format::R8G8B8A8_TYPELESS, Format::R8G8B8A8_UNORM_SRGB, Format::R8G8B8A8_UNORM,
+	     Format::R8G8B8A8_UINT, Format::R8G8B8A8_SNORM, Format::R8G8B8A8_SINT},
+	    {Format::BC1_TYPELESS, Format::BC1_UNORM_SRGB, Format::BC1_UNORM},
+	    {Format::BC2_TYPELESS, Format::BC2_UNORM_SRGB, Format::BC2_UNORM},
+	    {Format::BC3_TYPELESS, Format::BC3_UNORM_SRGB, Format::BC3_UNORM},
 	};
-	for (const auto& test : cases)
+	for (const std::vector<Format>& family : families)
 	{
-		EXPECT_EQ(Dds::ToSRGB(test.format), test.srgb) << Dds::FormatName(test.format);
-		EXPECT_EQ(Dds::ToTypeless(test.format), test.typeless) << Dds::FormatName(test.format);
-		EXPECT_EQ(Dds::IsSRGB(Dds::ToSRGB(test.format)), test.srgb != test.format || Dds::IsSRGB(test.format))
-		    << Dds::FormatName(test.format);
+		for (const Format format : family)
+		{
+			EXPECT_EQ(Dds::ToTypeless(format), family[0]) << Dds::FormatName(format);
+			EXPECT_EQ(Dds::ToSRGB(format), family[1]) << Dds::FormatName(format);
+			EXPECT_EQ(Dds::IsSRGB(format), format == family[1]) << Dds::FormatName(format);
+		}
+	}
+	// Everything else maps to itself, B8G8R8A8 included.
+	for (const Format format : {Format::B8G8R8A8_UNORM, Format::B8G8R8A8_TYPELESS, Format::B8G8R8X8_UNORM,
+	                            Format::R16G16B16A16_FLOAT, Format::R10G10B10A2_UNORM, Format::R32_FLOAT,
+	                            Format::D24_UNORM_S8_UINT, Format::UNKNOWN, Format::B8G8R8A8_UNORM_SRGB})
+	{
+		EXPECT_EQ(Dds::ToTypeless(format), format) << Dds::FormatName(format);
+		EXPECT_EQ(Dds::ToSRGB(format), format) << Dds::FormatName(format);
+		EXPECT_EQ(Dds::IsSRGB(format), format == Format::B8G8R8A8_UNORM_SRGB) << Dds::FormatName(format);
 	}
 }
 
@@ -196,7 +169,7 @@ TEST(DdsFileTest, EveryFormatRoundTripsByteForByte)
 	for (const auto& test : cases)
 	{
 		// 20x12 gives levels that are not whole blocks (5x3, 2x1, 1x1).
-		ExpectRoundTrip(scratch, MakeInfo(test.format, 20, 12, 5), test.dx10Flag,
+		ExpectRoundTrip(scratch, ImageInfo{20, 12, 1, 1, 5, 0, test.format}, test.dx10Flag,
 		                Dds::FormatName(test.format));
 	}
 }
@@ -212,19 +185,19 @@ TEST(DdsFileTest, CubesVolumesAndArraysRoundTrip)
 		uint64_t totalBytes;
 	} cases[] = {
 	    // 4 bytes x (256^2 + 128^2 + ... + 1) = 349524 per face.
-	    {"cube", MakeInfo(Format::R8G8B8A8_UNORM, 256, 256, 9, ResourceDimension::Texture2D, 1, 6, true),
-	     false, 6 * 349524ull},
-	    {"cube-srgb", MakeInfo(Format::BC1_UNORM_SRGB, 16, 16, 5, ResourceDimension::Texture2D, 1, 6, true),
-	     true, 6 * (128 + 32 + 8 + 8 + 8)},
-	    {"cube-array", MakeInfo(Format::BC3_UNORM, 8, 8, 1, ResourceDimension::Texture2D, 1, 12, true), true,
-	     12 * 64},
+	    {"cube", ImageInfo{256, 256, 1, 6, 9, Dds::MiscTextureCube, Format::R8G8B8A8_UNORM}, false,
+	     6 * 349524ull},
+	    {"cube-srgb", ImageInfo{16, 16, 1, 6, 5, Dds::MiscTextureCube, Format::BC1_UNORM_SRGB}, true,
+	     6 * (128 + 32 + 8 + 8 + 8)},
+	    {"cube-array", ImageInfo{8, 8, 1, 12, 1, Dds::MiscTextureCube, Format::BC3_UNORM}, true, 12 * 64},
 	    // 8x4x4, 4x2x2, 2x1x1, 1x1x1 texels of 8 bytes.
-	    {"volume", MakeInfo(Format::R16G16B16A16_FLOAT, 8, 4, 4, ResourceDimension::Texture3D, 4), false,
-	     1176},
-	    {"volume-bc", MakeInfo(Format::BC1_UNORM, 8, 8, 3, ResourceDimension::Texture3D, 2), false,
+	    {"volume", ImageInfo{8, 4, 4, 1, 4, 0, Format::R16G16B16A16_FLOAT, ResourceDimension::Texture3D},
+	     false, 1176},
+	    {"volume-bc", ImageInfo{8, 8, 2, 1, 3, 0, Format::BC1_UNORM, ResourceDimension::Texture3D}, false,
 	     4 * 8 * 2 + 8 + 8},
-	    {"array", MakeInfo(Format::R32_FLOAT, 4, 2, 3, ResourceDimension::Texture2D, 1, 3), true, 3 * 44},
-	    {"line", MakeInfo(Format::R8G8B8A8_UNORM, 16, 1, 5, ResourceDimension::Texture1D), true, 4 * 31},
+	    {"array", ImageInfo{4, 2, 1, 3, 3, 0, Format::R32_FLOAT}, true, 3 * 44},
+	    {"line", ImageInfo{16, 1, 1, 1, 5, 0, Format::R8G8B8A8_UNORM, ResourceDimension::Texture1D}, true,
+	     4 * 31},
 	};
 	for (const auto& test : cases)
 	{
@@ -283,7 +256,8 @@ TEST(DdsFileTest, LegacyHeadersHaveTheirFieldsAtKnownOffsets)
 	{
 		const std::string path = scratch.File(std::string(Dds::FormatName(test.format)) + ".dds");
 		std::string error;
-		ASSERT_TRUE(Dds::SaveToFile(path, MakeImage(MakeInfo(test.format, 8, 8, 2)), error)) << error;
+		ASSERT_TRUE(Dds::SaveToFile(path, MakeImage(ImageInfo{8, 8, 1, 1, 2, 0, test.format}), error))
+		    << error;
 		const std::string file = ReadWholeFile(path);
 		ASSERT_GE(file.size(), 128u);
 		EXPECT_EQ(U32At(file, test.offset), test.value) << Dds::FormatName(test.format) << ": " << test.field;
@@ -292,9 +266,9 @@ TEST(DdsFileTest, LegacyHeadersHaveTheirFieldsAtKnownOffsets)
 
 TEST(DdsFileTest, MalformedInputFailsWithAMessage)
 {
-	const std::vector<uint8_t> legacy = SaveBytes(MakeInfo(Format::BC1_UNORM, 8, 8, 4));
+	const std::vector<uint8_t> legacy = SaveBytes(ImageInfo{8, 8, 1, 1, 4, 0, Format::BC1_UNORM});
 	const std::vector<uint8_t> dx10 =
-	    SaveBytes(MakeInfo(Format::R8G8B8A8_UNORM_SRGB, 4, 4, 3, ResourceDimension::Texture2D, 1, 6, true));
+	    SaveBytes(ImageInfo{4, 4, 1, 6, 3, Dds::MiscTextureCube, Format::R8G8B8A8_UNORM_SRGB});
 	const struct
 	{
 		const char* label;
@@ -381,7 +355,7 @@ TEST(DdsFileTest, MalformedInputFailsWithAMessage)
 TEST(DdsFileTest, FailedSavesReportAndLeaveNothingBehind)
 {
 	ScratchDir scratch;
-	const Dds::Image image = MakeImage(MakeInfo(Format::BC1_UNORM, 8, 8, 1));
+	const Dds::Image image = MakeImage(ImageInfo{8, 8, 1, 1, 1, 0, Format::BC1_UNORM});
 	WriteWholeFile(scratch.File("plain"), "x");
 	fs::create_directories(scratch.File("folder.dds"));
 	WriteWholeFile(scratch.File("old.dds"), "old");
@@ -420,11 +394,11 @@ TEST(DdsFileTest, FailedSavesReportAndLeaveNothingBehind)
 TEST(DdsFuzzTest, MutatedFilesNeverCrash)
 {
 	const std::vector<std::vector<uint8_t>> seeds = {
-	    SaveBytes(MakeInfo(Format::BC1_UNORM, 8, 8, 4)),
-	    SaveBytes(MakeInfo(Format::B8G8R8X8_UNORM, 4, 2, 3)),
-	    SaveBytes(MakeInfo(Format::R8G8B8A8_UNORM_SRGB, 4, 4, 3, ResourceDimension::Texture2D, 1, 6, true)),
-	    SaveBytes(MakeInfo(Format::R16G16B16A16_FLOAT, 4, 4, 3, ResourceDimension::Texture3D, 4)),
-	    SaveBytes(MakeInfo(Format::BC3_UNORM_SRGB, 8, 4, 1, ResourceDimension::Texture2D, 1, 3)),
+	    SaveBytes(ImageInfo{8, 8, 1, 1, 4, 0, Format::BC1_UNORM}),
+	    SaveBytes(ImageInfo{4, 2, 1, 1, 3, 0, Format::B8G8R8X8_UNORM}),
+	    SaveBytes(ImageInfo{4, 4, 1, 6, 3, Dds::MiscTextureCube, Format::R8G8B8A8_UNORM_SRGB}),
+	    SaveBytes(ImageInfo{4, 4, 4, 1, 3, 0, Format::R16G16B16A16_FLOAT, ResourceDimension::Texture3D}),
+	    SaveBytes(ImageInfo{8, 4, 1, 3, 1, 0, Format::BC3_UNORM_SRGB}),
 	};
 	const uint32_t interesting[] = {
 	    0, 1, 2, 3, 4, 6, 7, 0xFF, 0x200, 0xFE00, 0x200000, 16384, 16385, 0x7FFFFFFF, 0x80000000, 0xFFFFFFFF};

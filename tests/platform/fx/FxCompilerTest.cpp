@@ -3,7 +3,6 @@
 // states, variables and vertex inputs.
 
 #include <filesystem>
-#include <map>
 
 #include "GpuTest.h"
 #include "platform/fx/CompiledFormat.h"
@@ -27,102 +26,69 @@ fragment F
 }
 )";
 
-struct BadSource
-{
-	const char* myCase;
-	std::string mySource;
-	std::map<std::string, std::string> myIncludes; // name in the scratch directory -> text
-	std::string myExpected;                        // "FILE" stands for the scratch directory
-};
 } // namespace
 
 TEST_F(FxCompilerTest, ErrorsNameTheFileAndLine)
 {
 	const std::string pass = "technique T { pass P { VertexShader = V; PixelShader = F; } }\n";
-	const std::vector<BadSource> cases = {
-	    {"GLSL error in the source",
-	     std::string(ourGoodStages) + "float Broken()\n{\n\treturn missing;\n}\n" + pass,
-	     {},
+	// Sources and the message each must give; FILE stands for the scratch directory, which
+	// holds the include files the cases use.
+	const std::pair<std::string, std::string> cases[] = {
+	    {std::string(ourGoodStages) + "float Broken()\n{\n\treturn missing;\n}\n" + pass,
 	     "FILE/Main.fx(13): error: `missing' undeclared"},
-	    {"GLSL error in an include",
-	     "#include \"Common/Inc.fxh\"\n" + std::string(ourGoodStages) + pass,
-	     {{"Common/Inc.fxh", "// shared\nfloat Broken() { return missing; }\n"}},
+	    {"#include \"Common/Inc.fxh\"\n" + std::string(ourGoodStages) + pass,
 	     "FILE/Common/Inc.fxh(2): error: `missing' undeclared"},
-	    {"unknown state",
-	     std::string(ourGoodStages) + "technique T\n{\n\tpass P\n\t{\n\t\tVertexShader = V;\n"
+	    {std::string(ourGoodStages) + "technique T\n{\n\tpass P\n\t{\n\t\tVertexShader = V;\n"
 	                                  "\t\tPixelShader = F;\n\t\tBlending = true;\n\t}\n}\n",
-	     {},
 	     "FILE/Main.fx(17): error: unknown state 'Blending' in pass 'P' of technique 'T'"},
-	    {"unknown state value",
-	     std::string(ourGoodStages) +
+	    {std::string(ourGoodStages) +
 	         "technique T { pass P { VertexShader = V; PixelShader = F; CullMode = Sometimes; } }\n",
-	     {},
 	     "FILE/Main.fx(11): error: 'Sometimes' is not a value of CullMode (NONE, FRONT, BACK)"},
-	    {"include cycle",
-	     "#include \"A.fxh\"\n" + std::string(ourGoodStages) + pass,
-	     {{"A.fxh", "#include \"B.fxh\"\n"}, {"B.fxh", "\n#include \"a.fxh\"\n"}},
+	    {"#include \"A.fxh\"\n" + std::string(ourGoodStages) + pass,
 	     "FILE/B.fxh(2): error: include cycle: FILE/Main.fx -> FILE/A.fxh -> FILE/B.fxh -> FILE/A.fxh"},
-	    {"missing include",
-	     "\n#include \"Nowhere.fxh\"\n" + std::string(ourGoodStages) + pass,
-	     {},
+	    {"\n#include \"Nowhere.fxh\"\n" + std::string(ourGoodStages) + pass,
 	     "FILE/Main.fx(2): error: cannot open include file 'Nowhere.fxh'"},
-	    {"uniform block",
-	     "uniform Frame { mat4 World; };\n" + std::string(ourGoodStages) + pass,
-	     {},
+	    {"uniform Frame { mat4 World; };\n" + std::string(ourGoodStages) + pass,
 	     "FILE/Main.fx(1): error: uniform block 'Frame' is not supported"},
-	    {"missing stage",
-	     std::string(ourGoodStages) + "technique T { pass P { VertexShader = W; PixelShader = F; } }\n",
-	     {},
+	    {std::string(ourGoodStages) + "technique T { pass P { VertexShader = W; PixelShader = F; } }\n",
 	     "FILE/Main.fx(11): error: VertexShader 'W' names no stage block"},
-	    {"stage of the wrong kind",
-	     std::string(ourGoodStages) + "technique T { pass P { VertexShader = F; PixelShader = F; } }\n",
-	     {},
+	    {std::string(ourGoodStages) + "technique T { pass P { VertexShader = F; PixelShader = F; } }\n",
 	     "FILE/Main.fx(11): error: VertexShader 'F' is a fragment block"},
-	    {"sampler state for no sampler",
-	     "uniform vec4 Tint;\nsampler Tint { Filter = ANISOTROPIC; }\n" + std::string(ourGoodStages) + pass,
-	     {},
+	    {"uniform vec4 Tint;\nsampler Tint { Filter = ANISOTROPIC; }\n" + std::string(ourGoodStages) + pass,
 	     "FILE/Main.fx(2): error: sampler state 'Tint' names no sampler uniform"},
-	    {"unknown sampler state",
-	     "uniform sampler2D Tex;\nsampler Tex { Wrap = Clamp; }\n" + std::string(ourGoodStages) + pass,
-	     {},
+	    {"uniform sampler2D Tex;\nsampler Tex { Wrap = Clamp; }\n" + std::string(ourGoodStages) + pass,
 	     "FILE/Main.fx(2): error: unknown sampler state 'Wrap' in sampler 'Tex'"},
-	    {"version line",
-	     "#version 330\n" + std::string(ourGoodStages) + pass,
-	     {},
+	    {"#version 330\n" + std::string(ourGoodStages) + pass,
 	     "FILE/Main.fx(1): error: remove the #version line"},
-	    {"vertex input without a semantic",
-	     "vertex V { in vec3 aPosition; void main() {} }\n"
+	    {"vertex V { in vec3 aPosition; void main() {} }\n"
 	     "fragment F { out vec4 o; void main() { o = vec4(1); } }\n" +
 	         pass,
-	     {},
 	     "FILE/Main.fx(1): error: vertex input 'aPosition' must be named by its semantic"},
-	    {"link error",
-	     "vertex V { in vec3 POSITION; out vec4 vColor; void main() { vColor = vec4(1); "
+	    {"vertex V { in vec3 POSITION; out vec4 vColor; void main() { vColor = vec4(1); "
 	     "gl_Position = vec4(POSITION, 1); } }\n"
 	     "fragment F { in vec3 vColor; out vec4 o; void main() { o = vec4(vColor, 1); } }\n" +
 	         pass,
-	     {},
 	     "FILE/Main.fx(1): technique 'T', pass 'P': error:"},
 	};
-	for (const BadSource& bad : cases)
+	TestSupport::ScratchDir scratch;
+	std::filesystem::create_directories(scratch.Path() / "Common");
+	TestSupport::WriteWholeFile(scratch.File("Common/Inc.fxh"),
+	                            "// shared\nfloat Broken() { return missing; }\n");
+	TestSupport::WriteWholeFile(scratch.File("A.fxh"), "#include \"B.fxh\"\n");
+	TestSupport::WriteWholeFile(scratch.File("B.fxh"), "\n#include \"a.fxh\"\n");
+	for (const auto& [source, message] : cases)
 	{
-		TestSupport::ScratchDir scratch;
-		for (const auto& [name, text] : bad.myIncludes)
-		{
-			std::filesystem::create_directories(std::filesystem::path(scratch.File(name)).parent_path());
-			TestSupport::WriteWholeFile(scratch.File(name), text);
-		}
 		Fx::CompileOutput output;
-		EXPECT_FALSE(Fx::CompileFromMemory(bad.mySource, scratch.File("Main.fx"), output)) << bad.myCase;
-		std::string expected = bad.myExpected;
+		EXPECT_FALSE(Fx::CompileFromMemory(source, scratch.File("Main.fx"), output)) << message;
+		std::string expected = message;
 		for (size_t at = expected.find("FILE"); at != std::string::npos; at = expected.find("FILE"))
 		{
 			expected.replace(at, 4, scratch.Path().string());
 		}
 		EXPECT_NE(output.myMessages.find(expected), std::string::npos)
-		    << bad.myCase << "\nexpected: " << expected << "\nmessages:\n"
+		    << "expected: " << expected << "\nmessages:\n"
 		    << output.myMessages;
-		EXPECT_TRUE(output.myCompiled.empty()) << bad.myCase;
+		EXPECT_TRUE(output.myCompiled.empty()) << message;
 	}
 }
 

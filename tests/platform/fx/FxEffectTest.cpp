@@ -9,34 +9,15 @@
 #include "platform/fx/CompiledFormat.h"
 #include "platform/fx/Compiler.h"
 #include "platform/fx/Effect.h"
-#include "platform/gpu/Buffer.h"
-#include "platform/gpu/Readback.h"
 #include "support/TestSupport.h"
 
 namespace
 {
-struct ColorVertex
-{
-	float myPosition[3];
-	uint8_t myColor[4];
-};
-
 struct SpriteVertex
 {
 	float myPosition[3];
 	float myTexCoord[2];
 };
-
-using Pixel = std::array<uint8_t, 4>;
-
-// Four corners from (aLeft, aTop) to (aRight, aBottom), clockwise on screen (y up in clip space).
-std::vector<ColorVertex> Quad(float aLeft, float aTop, float aRight, float aBottom, Pixel aColor)
-{
-	auto vertex = [&](float anX, float aY) {
-		return ColorVertex{{anX, aY, 0.5f}, {aColor[0], aColor[1], aColor[2], aColor[3]}};
-	};
-	return {vertex(aLeft, aTop), vertex(aRight, aTop), vertex(aRight, aBottom), vertex(aLeft, aBottom)};
-}
 
 std::vector<ColorVertex> Reversed(std::vector<ColorVertex> someVertices)
 {
@@ -83,10 +64,6 @@ protected:
 
 	void TearDown() override
 	{
-		for (Gpu::Buffer& buffer : myBuffers)
-		{
-			buffer.Destroy();
-		}
 		for (Gpu::InputLayout& layout : myLayouts)
 		{
 			layout.Destroy();
@@ -108,22 +85,24 @@ protected:
 	Fx::Effect* Load(const std::string& aCompiledPath)
 	{
 		const std::string bytes = TestSupport::ReadWholeFile(aCompiledPath);
-		Fx::Effect& effect = myEffects.emplace_back();
-		const std::vector<uint8_t> compiled(bytes.begin(), bytes.end());
-		EXPECT_TRUE(effect.Init(GetContext(), compiled, aCompiledPath)) << Joined();
-		return effect.GetTechniqueCount() > 0 ? &effect : nullptr;
+		return Make({bytes.begin(), bytes.end()}, aCompiledPath);
 	}
 
 	Fx::Effect* Compile(const std::string& aSource)
 	{
 		Fx::CompileOutput output;
 		EXPECT_TRUE(Fx::CompileFromMemory(aSource, "Test.fx", output)) << output.myMessages;
+		return Make(output.myCompiled, "Test.fx");
+	}
+
+	Fx::Effect* Make(const std::vector<uint8_t>& someCompiled, const std::string& aName)
+	{
 		Fx::Effect& effect = myEffects.emplace_back();
-		EXPECT_TRUE(effect.Init(GetContext(), output.myCompiled, "Test.fx")) << Joined();
+		EXPECT_TRUE(effect.Init(GetContext(), someCompiled, aName)) << Joined();
 		return effect.GetTechniqueCount() > 0 ? &effect : nullptr;
 	}
 
-	// Applies the pass and draws the vertices as quads through an input layout made from its signature.
+	// Applies the pass and draws the vertices as quads through an input layout made from its inputs.
 	template <typename Vertex> void Draw(Fx::Pass* aPass, const std::vector<Vertex>& someVertices)
 	{
 		ASSERT_NE(aPass, nullptr);
@@ -135,33 +114,15 @@ protected:
 		};
 		Gpu::InputLayout& layout = myLayouts.emplace_back();
 		ASSERT_TRUE(layout.Init(GetContext(), elements, aPass->GetVertexInputs(), "test vertices"));
-		std::vector<uint16_t> indices;
-		for (uint16_t first = 0; first < someVertices.size(); first += 4)
-		{
-			for (const uint16_t corner : {0, 1, 2, 0, 2, 3})
-			{
-				indices.push_back(static_cast<uint16_t>(first + corner));
-			}
-		}
-		Gpu::Buffer& vertices = myBuffers.emplace_back();
-		ASSERT_TRUE(vertices.Init({.mySize = someVertices.size() * sizeof(Vertex), .myLabel = "vertices"},
-		                          someVertices.data()));
-		Gpu::Buffer& indexBuffer = myBuffers.emplace_back();
-		ASSERT_TRUE(indexBuffer.Init(
-		    {.myKind = Gpu::BufferKind::Index, .mySize = indices.size() * 2, .myLabel = "indices"},
-		    indices.data()));
-		Gpu::Context& context = GetContext();
-		ASSERT_TRUE(aPass->Apply(context));
-		context.SetInputLayout(&layout);
-		ASSERT_TRUE(context.SetVertexBuffer(0, &vertices, sizeof(Vertex), 0));
-		ASSERT_TRUE(context.SetIndexBuffer(&indexBuffer, Gpu::IndexFormat::UInt16, 0));
-		ASSERT_TRUE(context.DrawIndexed(static_cast<uint32_t>(indices.size()), 0, 0));
+		ASSERT_TRUE(aPass->Apply(GetContext()));
+		GetContext().SetInputLayout(&layout);
+		DrawVertices(someVertices);
 	}
 
+	// The target's pixels, also written to /tmp/lumora-fx-<name>.png when named, to look at.
 	std::vector<uint8_t> ReadAll(const char* aPngName = nullptr)
 	{
-		std::vector<uint8_t> bytes;
-		EXPECT_TRUE(Gpu::ReadRenderTarget(GetContext(), *myTarget, bytes));
+		const std::vector<uint8_t> bytes = ReadPixels(*myTarget);
 		if (aPngName && bytes.size() == 64 * 64 * 4)
 		{
 			Gpu::SavePng(std::string("/tmp/lumora-fx-") + aPngName + ".png", 64, 64, bytes.data());
@@ -171,21 +132,15 @@ protected:
 
 	static Pixel At(const std::vector<uint8_t>& someBytes, int anX, int aY)
 	{
-		const size_t at = (static_cast<size_t>(aY) * 64 + static_cast<size_t>(anX)) * 4;
-		return at + 4 <= someBytes.size()
-		           ? Pixel{someBytes[at], someBytes[at + 1], someBytes[at + 2], someBytes[at + 3]}
-		           : Pixel{};
+		return PixelAt(someBytes, 64, anX, aY);
 	}
 
 	int CountNotClear(const std::vector<uint8_t>& someBytes)
 	{
 		int count = 0;
-		for (int y = 0; y < 64; ++y)
+		for (int at = 0; at < 64 * 64; ++at)
 		{
-			for (int x = 0; x < 64; ++x)
-			{
-				count += At(someBytes, x, y) != myClearPixel ? 1 : 0;
-			}
+			count += At(someBytes, at, 0) != myClearPixel ? 1 : 0;
 		}
 		return count;
 	}
@@ -205,7 +160,6 @@ protected:
 	Gpu::DepthStencilView* myDepth = nullptr;
 	std::deque<Fx::Effect> myEffects;
 	std::deque<Gpu::InputLayout> myLayouts;
-	std::deque<Gpu::Buffer> myBuffers;
 };
 
 TEST_F(FxEffectTest, LooksUpTechniquesPassesAndVariablesByName)
@@ -230,12 +184,12 @@ TEST_F(FxEffectTest, LooksUpTechniquesPassesAndVariablesByName)
 	EXPECT_EQ(render->GetPassByName("P1"), nullptr);
 	const std::span<const Gpu::AttributeLocation> inputs = render->GetPassByIndex(0)->GetVertexInputs();
 	ASSERT_EQ(inputs.size(), 2u);
-	EXPECT_EQ(inputs[0].mySemanticName, "POSITION");
-	EXPECT_EQ(inputs[0].mySemanticIndex, 0u);
-	EXPECT_EQ(inputs[0].myLocation, 0);
-	EXPECT_EQ(inputs[1].mySemanticName, "COLOR");
-	EXPECT_EQ(inputs[1].mySemanticIndex, 0u);
-	EXPECT_EQ(inputs[1].myLocation, 1);
+	for (const auto& [index, name] : {std::pair{0, "POSITION"}, std::pair{1, "COLOR"}})
+	{
+		EXPECT_EQ(inputs[index].mySemanticName, name);
+		EXPECT_EQ(inputs[index].mySemanticIndex, 0u);
+		EXPECT_EQ(inputs[index].myLocation, index);
+	}
 
 	EXPECT_EQ(effect->GetVariableCount(), 4);
 	Fx::Variable* world = effect->GetVariableByName("World");
@@ -259,10 +213,7 @@ TEST_F(FxEffectTest, LooksUpTechniquesPassesAndVariablesByName)
 	EXPECT_FALSE(world->SetFloatVector(values));
 	EXPECT_FALSE(world->SetMatrixArray(values, 1, 1));
 	EXPECT_FALSE(world->SetResource(nullptr));
-	const std::vector<std::string> reports = TakeReports();
-	ASSERT_EQ(reports.size(), 4u);
-	EXPECT_NE(reports[0].find("Variable 'World' is a mat4, not a float"), std::string::npos) << reports[0];
-	EXPECT_NE(reports[2].find("outside variable 'World'"), std::string::npos) << reports[2];
+	ExpectReports({{"Variable 'World' is a mat4, not a float"}, {}, {"outside variable 'World'"}, {}});
 	EXPECT_EQ(world->GetVersion(), 0u);
 }
 
@@ -311,21 +262,17 @@ TEST_F(FxEffectTest, VertexPosColTransformsByEngineMatricesAsRowVectors)
 	// v * World * View: x moves right by 0.5, then everything halves.
 	const std::array<float, 16> world = Translation(0.5f, 0.0f, 0.0f);
 	const std::array<float, 16> view = Scale(0.5f);
-	const std::array<float, 16> projection = Scale(1.0f);
+	SetIdentityCamera(*effect);
 	ASSERT_TRUE(effect->GetVariableByName("World")->SetMatrix(world.data()));
 	ASSERT_TRUE(effect->GetVariableByName("View")->SetMatrix(view.data()));
-	ASSERT_TRUE(effect->GetVariableByName("Projection")->SetMatrix(projection.data()));
 	Draw(effect->GetTechniqueByName("Render")->GetPassByIndex(0), Quad(-0.5f, 1.0f, 0.5f, 0.0f, ourOrange));
 
 	// Clip x 0..0.5 is columns 32..47; clip y 0..0.5 (up) is rows 16..31 (row 0 at the top).
 	const std::vector<uint8_t> pixels = ReadAll("vertex_poscol");
-	EXPECT_EQ(At(pixels, 40, 24), ourOrange);
-	EXPECT_EQ(At(pixels, 32, 16), ourOrange);
-	EXPECT_EQ(At(pixels, 47, 31), ourOrange);
-	EXPECT_EQ(At(pixels, 31, 24), myClearPixel);
-	EXPECT_EQ(At(pixels, 48, 24), myClearPixel);
-	EXPECT_EQ(At(pixels, 40, 15), myClearPixel);
-	EXPECT_EQ(At(pixels, 40, 32), myClearPixel);
+	for (const auto& [x, y] : {std::pair{32, 16}, std::pair{47, 31}})
+	{
+		EXPECT_EQ(At(pixels, x, y), ourOrange) << x << ", " << y;
+	}
 	EXPECT_EQ(CountNotClear(pixels), 16 * 16);
 }
 
@@ -454,10 +401,7 @@ TEST_F(FxEffectTest, DamagedAndUnlinkableEffectsAreReported)
 	const std::vector<uint8_t> truncated(bytes.begin(),
 	                                     bytes.begin() + static_cast<std::ptrdiff_t>(bytes.size() / 2));
 	EXPECT_FALSE(effect.Init(GetContext(), truncated, "half of Vertex_PosCol"));
-	std::vector<std::string> reports = TakeReports();
-	ASSERT_EQ(reports.size(), 1u);
-	EXPECT_NE(reports[0].find("'half of Vertex_PosCol' is not a usable compiled effect"), std::string::npos)
-	    << reports[0];
+	ExpectReports({{"'half of Vertex_PosCol' is not a usable compiled effect"}});
 	EXPECT_FALSE(effect.GetTechniqueByName("Render")->IsValid());
 
 	// Stages that compile alone but disagree on an interface variable.
@@ -473,10 +417,6 @@ TEST_F(FxEffectTest, DamagedAndUnlinkableEffectsAreReported)
 	fragment.replace(input, 15, "in vec3 vColor;");
 	Fx::WriteCompiled(desc, bytes);
 	EXPECT_FALSE(effect.Init(GetContext(), bytes, "mismatched"));
-	reports = TakeReports();
-	ASSERT_EQ(reports.size(), 1u);
-	EXPECT_NE(reports[0].find("'mismatched': pass 'P0' of technique 'Render' does not link"),
-	          std::string::npos)
-	    << reports[0];
+	ExpectReports({{"'mismatched': pass 'P0' of technique 'Render' does not link"}});
 	effect.Destroy();
 }

@@ -98,35 +98,26 @@ TEST(FxStalenessTest, ChangingAnIncludeMakesTheCompiledFileStale)
 	EXPECT_NE(error.find("common/shared.fxh"), std::string::npos) << error;
 }
 
-TEST(FxCompiledFormatTest, ARealCompiledFileReadsAndWritesBackTheSameBytes)
+TEST(FxCompiledFormatTest, DamagedFilesAreRefusedWithAMessageOrReadWhole)
 {
-	const std::vector<uint8_t> bytes = ReadBytes(ourVertexPosCol);
-	ASSERT_FALSE(bytes.empty()) << ourVertexPosCol << " is missing: build the lumora_effects target";
+	const std::vector<uint8_t> original = ReadBytes(ourVertexPosCol);
+	ASSERT_FALSE(original.empty()) << ourVertexPosCol << " is missing: build the lumora_effects target";
+	// The real file reads whole and writes back the same bytes.
 	Fx::EffectDesc desc;
 	std::string error;
-	ASSERT_TRUE(Fx::ReadCompiled(bytes, desc, error)) << error;
-	ASSERT_EQ(desc.myTechniques.size(), 2u);
-	EXPECT_EQ(desc.myTechniques[0].myName, "Render");
-	EXPECT_EQ(desc.myTechniques[1].myName, "RenderWireFrame");
+	ASSERT_TRUE(Fx::ReadCompiled(original, desc, error)) << error;
 	std::vector<uint8_t> again;
 	Fx::WriteCompiled(desc, again);
-	EXPECT_EQ(again, bytes);
+	EXPECT_EQ(again, original);
 
-	std::vector<uint8_t> newer = bytes;
+	std::vector<uint8_t> newer = original;
 	newer[4] = static_cast<uint8_t>(Fx::ourCompiledFormatVersion + 1);
 	EXPECT_FALSE(Fx::ReadCompiled(newer, desc, error));
 	EXPECT_NE(error.find("format version"), std::string::npos) << error;
 	uint64_t hash = 0;
 	EXPECT_FALSE(Fx::ReadSourceHash(std::vector<uint8_t>{'D', 'D', 'S', ' '}, hash, error));
 	EXPECT_NE(error.find("magic"), std::string::npos) << error;
-}
 
-TEST(FxCompiledFormatTest, DamagedFilesAreRefusedWithAMessageOrReadWhole)
-{
-	const std::vector<uint8_t> original = ReadBytes(ourVertexPosCol);
-	ASSERT_FALSE(original.empty()) << ourVertexPosCol << " is missing: build the lumora_effects target";
-	Fx::EffectDesc desc;
-	std::string error;
 	for (size_t length = 0; length < original.size(); ++length)
 	{
 		std::vector<uint8_t> truncated(original.begin(),

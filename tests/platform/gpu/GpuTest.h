@@ -3,18 +3,73 @@
 // test's thread. Without one the test is skipped, except under CI=true, where a
 // missing GL is a failure. Every report the layer makes is collected; a test that
 // expects one takes it with TakeReports(), and any left over fails the test.
+// Beside it, what the GPU suites share: pixels read back, sRGB encoding.
 
-#include <cstdlib>
-#include <cstring>
+#include <array>
+#include <cmath>
+#include <deque>
 #include <gtest/gtest.h>
 #include <memory>
 #include <string>
 #include <vector>
 
 #include "core/CoreReport.h"
+#include "platform/gpu/Buffer.h"
 #include "platform/gpu/Device.h"
+#include "platform/gpu/Readback.h"
 #include "platform/gpu/Texture.h"
 #include "support/GlSupport.h"
+
+using Pixel = std::array<uint8_t, 4>;
+
+inline uint8_t SrgbEncoded(float aLinear)
+{
+	const float encoded =
+	    aLinear <= 0.0031308f ? aLinear * 12.92f : 1.055f * std::pow(aLinear, 1.0f / 2.4f) - 0.055f;
+	return static_cast<uint8_t>(std::lround(encoded * 255.0f));
+}
+
+inline float SrgbToLinear(float anEncoded)
+{
+	return anEncoded <= 0.04045f ? anEncoded / 12.92f : std::pow((anEncoded + 0.055f) / 1.055f, 2.4f);
+}
+
+// The RGBA pixel at (anX, aY) of tightly packed rows; zero when out of range.
+inline Pixel PixelAt(const std::vector<uint8_t>& someBytes, int aWidth, int anX, int aY)
+{
+	const size_t at = (static_cast<size_t>(aY) * static_cast<size_t>(aWidth) + static_cast<size_t>(anX)) * 4;
+	return at + 4 <= someBytes.size()
+	           ? Pixel{someBytes[at], someBytes[at + 1], someBytes[at + 2], someBytes[at + 3]}
+	           : Pixel{};
+}
+
+// A vertex of the colour programs: position (clip space) and an RGBA8 colour.
+struct ColorVertex
+{
+	float myPosition[3];
+	uint8_t myColor[4];
+};
+
+// Four corners from (aLeft, aTop) to (aRight, aBottom) in clip space (y up), clockwise on screen.
+inline std::vector<ColorVertex> Quad(float aLeft, float aTop, float aRight, float aBottom, Pixel aColor,
+                                     float aDepth = 0.5f)
+{
+	auto vertex = [&](float anX, float aY) {
+		return ColorVertex{{anX, aY, aDepth}, {aColor[0], aColor[1], aColor[2], aColor[3]}};
+	};
+	return {vertex(aLeft, aTop), vertex(aRight, aTop), vertex(aRight, aBottom), vertex(aLeft, aBottom)};
+}
+
+// Skips the current test where GL (or another facility) is missing, or fails it under CI=true.
+#define LUMORA_SKIP_OR_FAIL(aWhy)                                                                            \
+	do                                                                                                       \
+	{                                                                                                        \
+		if (TestSupport::IsCi())                                                                             \
+		{                                                                                                    \
+			FAIL() << "under CI: " << (aWhy);                                                                \
+		}                                                                                                    \
+		GTEST_SKIP() << (aWhy);                                                                              \
+	} while (false)
 
 class GpuTest : public testing::Test
 {
@@ -28,18 +83,19 @@ protected:
 		});
 		if (!myDevice.Init(64, 64))
 		{
-			const std::string why = myDevice.GetFailureText() + " " + Joined();
+			const std::string why =
+			    "No OpenGL 4.5 core context: " + myDevice.GetFailureText() + " " + Joined();
 			ourReports.clear();
-			if (TestSupport::IsCi())
-			{
-				FAIL() << "No OpenGL 4.5 core context under CI: " << why;
-			}
-			GTEST_SKIP() << "No OpenGL 4.5 core context: " << why;
+			LUMORA_SKIP_OR_FAIL(why);
 		}
 	}
 
 	void TearDown() override
 	{
+		for (Gpu::Buffer& buffer : myBuffers)
+		{
+			buffer.Destroy();
+		}
 		for (std::unique_ptr<Gpu::Texture>& texture : myTextures)
 		{
 			texture->Destroy();
@@ -53,6 +109,21 @@ protected:
 	// The reports made since the last call, as "function: message".
 	static std::vector<std::string> TakeReports() { return std::exchange(ourReports, {}); }
 
+	// Expects exactly one report per entry, each containing all of that entry's parts.
+	static void ExpectReports(const std::vector<std::vector<std::string>>& someParts)
+	{
+		const std::string all = Joined();
+		const std::vector<std::string> reports = TakeReports();
+		ASSERT_EQ(reports.size(), someParts.size()) << all;
+		for (size_t index = 0; index < reports.size(); ++index)
+		{
+			for (const std::string& part : someParts[index])
+			{
+				EXPECT_NE(reports[index].find(part), std::string::npos) << part << " in: " << reports[index];
+			}
+		}
+	}
+
 	// A texture that the fixture destroys; null (with the report kept) when Init fails.
 	Gpu::Texture* MakeTexture(const Gpu::TextureDesc& aDesc)
 	{
@@ -61,19 +132,67 @@ protected:
 		{
 			return nullptr;
 		}
-		myTextures.push_back(std::move(texture));
+		return Keep(std::move(texture));
+	}
+
+	Gpu::Texture* Keep(std::unique_ptr<Gpu::Texture> aTexture)
+	{
+		if (!aTexture)
+		{
+			return nullptr;
+		}
+		myTextures.push_back(std::move(aTexture));
 		return myTextures.back().get();
 	}
 
 	Gpu::Texture* MakeTarget(Dds::Format aFormat, int aWidth, int aHeight, int aMipLevels = 1)
 	{
-		Gpu::TextureDesc desc;
-		desc.myWidth = aWidth;
-		desc.myHeight = aHeight;
-		desc.myMipLevels = aMipLevels;
-		desc.myFormat = aFormat;
-		desc.myLabel = "test target";
-		return MakeTexture(desc);
+		return MakeTexture({.myWidth = aWidth,
+		                    .myHeight = aHeight,
+		                    .myMipLevels = aMipLevels,
+		                    .myFormat = aFormat,
+		                    .myLabel = "test target"});
+	}
+
+	// Draws the vertices from a buffer the fixture keeps, with the bound program and layout:
+	// as quads (four corners each, indexed) or, without aQuadsFlag, as a triangle list.
+	template <typename Vertex>
+	void DrawVertices(const std::vector<Vertex>& someVertices, bool aQuadsFlag = true)
+	{
+		Gpu::Context& context = GetContext();
+		Gpu::Buffer& vertices = myBuffers.emplace_back();
+		ASSERT_TRUE(
+		    vertices.Init({.mySize = someVertices.size() * sizeof(Vertex), .myLabel = "test vertices"},
+		                  someVertices.data()));
+		ASSERT_TRUE(context.SetVertexBuffer(0, &vertices, sizeof(Vertex), 0));
+		context.SetPrimitiveTopology(Gpu::PrimitiveTopology::TriangleList);
+		if (!aQuadsFlag)
+		{
+			context.Draw(static_cast<uint32_t>(someVertices.size()), 0);
+			return;
+		}
+		std::vector<uint16_t> indices;
+		for (uint16_t first = 0; first < someVertices.size(); first += 4)
+		{
+			for (const uint16_t corner : {0, 1, 2, 0, 2, 3})
+			{
+				indices.push_back(static_cast<uint16_t>(first + corner));
+			}
+		}
+		Gpu::Buffer& indexBuffer = myBuffers.emplace_back();
+		ASSERT_TRUE(indexBuffer.Init(
+		    {.myKind = Gpu::BufferKind::Index, .mySize = indices.size() * 2, .myLabel = "test indices"},
+		    indices.data()));
+		ASSERT_TRUE(context.SetIndexBuffer(&indexBuffer, Gpu::IndexFormat::UInt16, 0));
+		ASSERT_TRUE(context.DrawIndexed(static_cast<uint32_t>(indices.size()), 0, 0));
+	}
+
+	// The view's RGBA8 bytes, row 0 at the top; empty (test failed) when they cannot be read.
+	std::vector<uint8_t> ReadPixels(const Gpu::RenderTargetView& aView)
+	{
+		std::vector<uint8_t> bytes;
+		EXPECT_TRUE(Gpu::ReadRenderTarget(GetContext(), aView, bytes));
+		return bytes;
 	}
 
 	Gpu::Context& GetContext() { return myDevice.GetContext(); }
@@ -90,6 +209,7 @@ protected:
 
 	Gpu::Device myDevice;
 	std::vector<std::unique_ptr<Gpu::Texture>> myTextures;
+	std::deque<Gpu::Buffer> myBuffers; // a deque: buffers cannot move
 	CoreReport::Handler myPreviousHandler = nullptr;
 	static inline std::vector<std::string> ourReports;
 };

@@ -20,12 +20,13 @@
 
 #include <X11/Xlib.h>
 #include <X11/Xutil.h>
-#include <algorithm>
 #include <chrono>
 #include <cstdlib>
 #include <fcntl.h>
+#include <fstream>
 #include <signal.h>
 #include <spawn.h>
+#include <sstream>
 #include <string>
 #include <sys/stat.h>
 #include <sys/wait.h>
@@ -123,17 +124,13 @@ private:
 	static std::string FindXvfb()
 	{
 		const char* path = std::getenv("PATH");
-		std::string directories = path != nullptr && *path != '\0' ? path : "/usr/bin:/bin";
-		size_t start = 0;
-		while (start <= directories.size())
+		std::istringstream directories(path != nullptr && *path != '\0' ? path : "/usr/bin:/bin");
+		for (std::string directory; std::getline(directories, directory, ':');)
 		{
-			const size_t end = std::min(directories.find(':', start), directories.size());
-			const std::string candidate = directories.substr(start, end - start) + "/Xvfb";
-			if (access(candidate.c_str(), X_OK) == 0)
+			if (access((directory + "/Xvfb").c_str(), X_OK) == 0)
 			{
-				return candidate;
+				return directory + "/Xvfb";
 			}
-			start = end + 1;
 		}
 		return {};
 	}
@@ -141,16 +138,10 @@ private:
 	// The process id in a display's lock file; 0 when there is none.
 	static pid_t LockOwner(int aNumber)
 	{
-		const std::string lock = "/tmp/.X" + std::to_string(aNumber) + "-lock";
-		const int file = open(lock.c_str(), O_RDONLY);
-		if (file < 0)
-		{
-			return 0;
-		}
-		char text[16] = {};
-		const ssize_t count = read(file, text, sizeof(text) - 1);
-		close(file);
-		return count > 0 ? static_cast<pid_t>(std::atol(text)) : 0;
+		std::ifstream lock("/tmp/.X" + std::to_string(aNumber) + "-lock");
+		long pid = 0;
+		lock >> pid;
+		return static_cast<pid_t>(pid);
 	}
 
 	// The first number from aFirst on with neither a lock file nor a socket.
