@@ -5,13 +5,20 @@
 # Sources are named relative to the repository root, as the engine names them.
 file(GLOB_RECURSE LUMORA_EFFECT_SOURCES CONFIGURE_DEPENDS "${LUMORA_SOURCE_ROOT}/data/*.fx")
 set(LUMORA_EFFECT_OUTPUTS)
+# Under ThreadSanitizer the compiler runs Mesa's threads too; their races are the driver's
+# (see tests/tsan.supp), and a report would fail the build.
+set(LUMORA_FXC_LAUNCH)
+if(LUMORA_TSAN)
+  set(LUMORA_FXC_LAUNCH ${CMAKE_COMMAND} -E env
+    "TSAN_OPTIONS=suppressions=${LUMORA_SOURCE_ROOT}/tests/tsan.supp")
+endif()
 foreach(source IN LISTS LUMORA_EFFECT_SOURCES)
   file(RELATIVE_PATH relative "${LUMORA_SOURCE_ROOT}" "${source}")
   string(MAKE_C_IDENTIFIER "${relative}" depname)
   set(output "${source}al")
   set(depfile "${CMAKE_BINARY_DIR}/effects/${depname}.d")
   add_custom_command(OUTPUT "${output}"
-    COMMAND lumora_fxc "${relative}" -o "${relative}al" --depfile "${depfile}"
+    COMMAND ${LUMORA_FXC_LAUNCH} $<TARGET_FILE:lumora_fxc> "${relative}" -o "${relative}al" --depfile "${depfile}"
     DEPENDS "${source}" lumora_fxc
     DEPFILE "${depfile}"
     WORKING_DIRECTORY "${LUMORA_SOURCE_ROOT}"
