@@ -5,7 +5,9 @@
 #include <thread>
 
 #include "engine/EngineReport.h"
+#include "model/ModelFactory.h"
 #include "platform/gpu/Multisample.h"
+#include "renderer/Renderer.h"
 
 namespace Zeph
 {
@@ -39,8 +41,11 @@ void Engine::ShutDown()
 	}
 	// The containers release GPU objects: the context must be current here.
 	ourInstance->myDevice.MakeCurrent();
+	ourInstance->myRenderer->Destroy();
+	ourInstance->myFontContainer.Clear();
 	ourInstance->myEffectContainer.Clear();
 	ourInstance->myTextureContainer.Clear();
+	ourInstance->myModelFactory->Clear();
 	ourInstance->myDdsTextureContainer.Clear();
 	delete ourInstance;
 	ourInstance = nullptr;
@@ -49,6 +54,9 @@ void Engine::ShutDown()
 bool Engine::Init(Gpu::WindowHandle aWindowHandle, int aWidth, int aHeight)
 {
 	myWindow = aWindowHandle;
+	// The parts exist from the start, so ShutDown finds them after a failed start-up too.
+	myModelFactory = std::make_unique<ModelFactory>();
+	myRenderer = std::make_unique<Renderer>();
 	myUseMultisampling = false;
 	myDriverType = DriverType::HARDWARE;
 	mySetupInfo = SetupInfo();
@@ -65,7 +73,11 @@ bool Engine::Init(Gpu::WindowHandle aWindowHandle, int aWidth, int aHeight)
 	{
 		return false;
 	}
-	return SetupRenderTargets(aWidth, aHeight);
+	if (!SetupRenderTargets(aWidth, aHeight))
+	{
+		return false;
+	}
+	return myRenderer->Init(aWidth, aHeight);
 }
 
 bool Engine::D3DDeviceSetup(int aWidth, int aHeight)
@@ -196,6 +208,11 @@ void Engine::ReleaseTargets()
 		myDepthTexture->Destroy();
 		myDepthTexture.reset();
 	}
+}
+
+void Engine::RenderScene()
+{
+	myRenderer->Render(myBackBufferView, myDepthStencilView);
 }
 
 void Engine::Present()

@@ -1,6 +1,8 @@
 #pragma once
 // Engine: the process-wide owner of the GPU device, the swap chain on the host's
-// window, the back buffer and the depth buffer, and the resource containers.
+// window, the back buffer and the depth buffer, the resource containers, the model
+// factory and the renderer. The last two live in src/model and src/renderer, which
+// build on the engine, so the engine holds them through pointers to declared types.
 //
 //   Gpu::WindowHandle window = 0;               // 0: headless, else an X11 window id
 //   if (!Zeph::Engine::Create(window, 1280, 720)) { ... }   // still call ShutDown
@@ -17,6 +19,7 @@
 #include <memory>
 
 #include "engine/EffectContainer.h"
+#include "engine/FontContainer.h"
 #include "engine/SetupInfo.h"
 #include "engine/TextureContainer.h"
 #include "platform/gpu/Device.h"
@@ -25,6 +28,9 @@
 
 namespace Zeph
 {
+class ModelFactory;
+class Renderer;
+
 class Engine
 {
 public:
@@ -39,6 +45,9 @@ public:
 
 	TextureContainer& GetTextureContainer() { return myTextureContainer; }
 	EffectContainer& GetEffectContainer() { return myEffectContainer; }
+	FontContainer& GetFontContainer() { return myFontContainer; }
+	ModelFactory& GetModelFactory() { return *myModelFactory; }
+	Renderer& GetRenderer() { return *myRenderer; }
 	SetupInfo& GetSetupInfo() { return mySetupInfo; }
 	const SetupInfo& GetSetupInfo() const { return mySetupInfo; }
 
@@ -64,6 +73,9 @@ public:
 	bool MakeContextCurrent() { return myDevice.MakeCurrent(); }
 	void ReleaseContext() { myDevice.ReleaseCurrent(); }
 
+	// The renderer draws one frame of what was queued into the back buffer (with the
+	// depth buffer) and presents it.
+	void RenderScene();
 	virtual void Present();
 	virtual ~Engine();
 
@@ -93,9 +105,12 @@ private:
 	Gpu::WindowHandle myWindow = 0;
 	TextureContainer myTextureContainer;
 	EffectContainer myEffectContainer;
+	FontContainer myFontContainer;
 	// A container that takes only DDS files; nothing loads through it yet, and it is
 	// cleared with the others at shutdown.
 	TextureContainer myDdsTextureContainer{{".dds", ".DDS"}};
+	std::unique_ptr<ModelFactory> myModelFactory;
+	std::unique_ptr<Renderer> myRenderer;
 	SetupInfo mySetupInfo;
 	unsigned int myRefreshRateNumerator = 60;
 	unsigned int myRefreshRateDenominator = 1;

@@ -8,6 +8,7 @@
 #include "engine/Camera.h"
 #include "engine/CameraInstance.h"
 #include "engine/Engine.h"
+#include "engine/Text.h"
 #include "platform/gpu/Buffer.h"
 #include "platform/gpu/InputLayout.h"
 #include "platform/gpu/Readback.h"
@@ -145,6 +146,15 @@ bool RenderWithEngine(Zeph::Engine& anEngine, const std::string& aPath, int aWid
 	{
 		std::fprintf(stderr, "lumora: drawing the frame failed\n");
 		return false;
+	}
+	// The editor's info line, drawn at once over the frame.
+	if (Zeph::Font* font = anEngine.GetFontContainer().GetFont("Arial"))
+	{
+		Zeph::Text info(font);
+		info.SetPosition(Vector2<float>(8.0f, 8.0f));
+		info.SetSize(14.0f);
+		info.SetText("Camera Position: 7 6 -10");
+		info.Render(true);
 	}
 	anEngine.Present();
 	std::vector<uint8_t> pixels;

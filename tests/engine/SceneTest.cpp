@@ -1,0 +1,191 @@
+// Scene objects without a GPU: instance matrices and attachments, room bounds.
+#include <gtest/gtest.h>
+#include <string>
+#include <vector>
+
+#include "core/Sphere.h"
+#include "engine/Instance.h"
+#include "engine/Room.h"
+#include "model/ModelNode.h"
+
+namespace
+{
+void ExpectMatrix(const Matrix44<float>& aMatrix, const std::vector<float>& someExpected)
+{
+	for (int i = 0; i < 16; ++i)
+	{
+		EXPECT_FLOAT_EQ(aMatrix.myMatrix[i], someExpected[static_cast<size_t>(i)]) << "element " << i;
+	}
+}
+
+// Records what the instance tells it.
+class Follower : public Zeph::Instance::AttachedObject
+{
+public:
+	explicit Follower(int* aRenderCount) : myRenderCount(aRenderCount) {}
+	void UpdateTransform(const Matrix44<float>& anOrientation) override
+	{
+		myLast = anOrientation;
+		++myUpdates;
+	}
+	void Render() override { ++*myRenderCount; }
+
+	Matrix44<float> myLast;
+	int myUpdates = 0;
+	int* myRenderCount;
+};
+} // namespace
+
+TEST(InstanceTest, ScaleReplacesTheMatrixAndPositionRestoresTheTranslation)
+{
+	Zeph::ModelNode model;
+	Zeph::Instance instance(&model);
+	instance.SetPosition({4.0f, 5.0f, 6.0f});
+	instance.SetScale(2.0f, 2.0f, 2.0f);
+	// The translation is gone while the position member still holds it.
+	ExpectMatrix(instance.GetOrientation(), {2, 0, 0, 0, 0, 2, 0, 0, 0, 0, 2, 0, 0, 0, 0, 1});
+	EXPECT_FLOAT_EQ(instance.GetPosition().x, 4.0f);
+	EXPECT_FLOAT_EQ(instance.GetPosition().z, 6.0f);
+
+	instance.SetPosition({1.0f, 2.0f, 3.0f});
+	ExpectMatrix(instance.GetOrientation(), {2, 0, 0, 0, 0, 2, 0, 0, 0, 0, 2, 0, 1, 2, 3, 1});
+}
+
+TEST(InstanceTest, OrientationKeepsTheMatrixBeforeTheLastChange)
+{
+	Zeph::ModelNode model;
+	Zeph::Instance instance(&model);
+	Matrix44<float> first = Matrix44<float>::CreateRotateAroundY(0.5f);
+	first.SetPosition({1.0f, 2.0f, 3.0f});
+	Matrix44<float> second = Matrix44<float>::CreateRotateAroundX(0.25f);
+	second.SetPosition({-7.0f, 8.0f, 9.0f});
+
+	instance.SetOrientation(first);
+	instance.SetOrientation(second);
+	ExpectMatrix(instance.GetPreviousOrientation(), std::vector<float>(first.myMatrix, first.myMatrix + 16));
+	ExpectMatrix(instance.GetOrientation(), std::vector<float>(second.myMatrix, second.myMatrix + 16));
+	EXPECT_FLOAT_EQ(instance.GetPosition().x, -7.0f);
+	EXPECT_FLOAT_EQ(instance.GetPosition().y, 8.0f);
+	EXPECT_FLOAT_EQ(instance.GetPosition().z, 9.0f);
+}
+
+TEST(InstanceTest, AttachedObjectsFollowPositionAndOrientationButNotScale)
+{
+	Zeph::ModelNode model;
+	auto* instance = new Zeph::Instance(&model);
+	int renders = 0;
+	auto* follower = new Follower(&renders);
+	instance->AddAttachedObject(follower);
+
+	instance->SetPosition({1.0f, 2.0f, 3.0f});
+	EXPECT_EQ(follower->myUpdates, 1);
+	EXPECT_FLOAT_EQ(follower->myLast.GetPosition().y, 2.0f);
+
+	instance->SetScale(3.0f, 3.0f, 3.0f);
+	EXPECT_EQ(follower->myUpdates, 1) << "SetScale leaves the attached objects where they are";
+
+	const Matrix44<float> turned = Matrix44<float>::CreateRotateAroundZ(1.0f);
+	instance->SetOrientation(turned);
+	EXPECT_EQ(follower->myUpdates, 2);
+	EXPECT_FLOAT_EQ(follower->myLast.myMatrix[1], turned.myMatrix[1]);
+
+	// Rendering without an engine queues nothing but still renders the attachments.
+	instance->Render();
+	EXPECT_EQ(renders, 1);
+	delete instance; // deletes the follower (ASan reports a leak otherwise)
+}
+
+TEST(InstanceTest, RoomDataReachesTheRootAndTheFirstChildChainOnly)
+{
+	// root -> {a -> {a0, a1}, b}
+	auto* root = new Zeph::ModelNode();
+	auto* a = new Zeph::ModelNode();
+	auto* b = new Zeph::ModelNode();
+	auto* a0 = new Zeph::ModelNode();
+	auto* a1 = new Zeph::ModelNode();
+	a->AddChild(a0);
+	a->AddChild(a1);
+	root->AddChild(a);
+	root->AddChild(b);
+	Zeph::Instance instance(root);
+
+	Zeph::RoomData room;
+	room.myRoomIndex = 7;
+	room.myCenter = {1.0f, 2.0f, 3.0f};
+	instance.SetRoomData(room);
+
+	Zeph::Instance::Node* node = instance.GetRootNode();
+	ASSERT_EQ(node->GetChildren().Count(), 2);
+	Zeph::Instance::Node* nodeA = node->GetChildren()[0];
+	Zeph::Instance::Node* nodeB = node->GetChildren()[1];
+	ASSERT_EQ(nodeA->GetChildren().Count(), 2);
+	EXPECT_EQ(nodeA->GetModelNode(), a);
+	EXPECT_EQ(nodeA->GetChildren()[1]->GetModelNode(), a1);
+
+	EXPECT_EQ(node->GetRenderData().myRoomData.myRoomIndex, 7);
+	EXPECT_EQ(nodeA->GetRenderData().myRoomData.myRoomIndex, 7);
+	EXPECT_EQ(nodeA->GetChildren()[0]->GetRenderData().myRoomData.myRoomIndex, 7);
+	EXPECT_FLOAT_EQ(nodeA->GetChildren()[0]->GetRenderData().myRoomData.myCenter.z, 3.0f);
+	EXPECT_EQ(nodeA->GetChildren()[1]->GetRenderData().myRoomData.myRoomIndex, -1);
+	EXPECT_EQ(nodeB->GetRenderData().myRoomData.myRoomIndex, -1);
+	delete root;
+}
+
+TEST(RoomTest, BoundsAndDefaults)
+{
+	const Zeph::Room room({0.0f, 0.0f, 0.0f}, {2.0f, 4.0f, 6.0f});
+	EXPECT_FLOAT_EQ(room.GetCenterPosition().x, 1.0f);
+	EXPECT_FLOAT_EQ(room.GetCenterPosition().y, 2.0f);
+	EXPECT_FLOAT_EQ(room.GetCenterPosition().z, 3.0f);
+	EXPECT_FLOAT_EQ(room.myExtents.x, 1.0f);
+	EXPECT_FLOAT_EQ(room.myExtents.y, 2.0f);
+	EXPECT_FLOAT_EQ(room.myExtents.z, 3.0f);
+	EXPECT_FLOAT_EQ(room.GetMax().y, 4.0f);
+	EXPECT_EQ(room.GetID(), "NO_ID");
+	EXPECT_EQ(room.GetCubemapName(), "");
+	EXPECT_EQ(room.GetCubemapIndex(), -1);
+	EXPECT_EQ(room.GetDebugInstance(), nullptr);
+}
+
+TEST(RoomTest, SphereInsideIsStrictOnEveryAxis)
+{
+	const Zeph::Room room({0.0f, 0.0f, 0.0f}, {2.0f, 4.0f, 6.0f});
+	struct Case
+	{
+		Vector3<float> myCentre;
+		float myRadius;
+		bool myInside;
+	};
+	const Case cases[] = {
+	    {{3.0f, 2.0f, 3.0f}, 1.0f, false}, // touches the face x = 2
+	    {{3.0f, 2.0f, 3.0f}, 1.5f, true},   {{1.0f, 2.0f, 3.0f}, 0.1f, true},
+	    {{1.0f, -1.0f, 3.0f}, 1.0f, false}, // touches y = 0 from below
+	    {{1.0f, -1.0f, 3.0f}, 1.01f, true}, {{1.0f, 2.0f, 7.5f}, 1.4f, false},
+	    {{1.0f, 2.0f, 7.5f}, 1.6f, true},   {{-5.0f, 2.0f, 3.0f}, 1.0f, false},
+	};
+	for (const Case& test : cases)
+	{
+		EXPECT_EQ(room.SphereInside(Intersection::Sphere(test.myCentre, test.myRadius)), test.myInside)
+		    << "sphere at (" << test.myCentre.x << ", " << test.myCentre.y << ", " << test.myCentre.z
+		    << ") radius " << test.myRadius;
+	}
+}
+
+TEST(RoomTest, DebugModelNameWritesTheBoundsWithoutSeparators)
+{
+	struct Case
+	{
+		Vector3<float> myMin;
+		Vector3<float> myMax;
+		const char* myName;
+	};
+	const Case cases[] = {
+	    {{0.0f, 0.0f, 0.0f}, {2.0f, 4.0f, 6.0f}, "room000246"},
+	    {{0.5f, -1.0f, 0.25f}, {2.125f, 4.0f, 1e7f}, "room0.5-10.252.12541e+07"},
+	    {{-3.333333f, 0.1f, 100000.0f}, {1234567.0f, 2.0f, 3.0f}, "room-3.333330.11000001.23457e+0623"},
+	};
+	for (const Case& test : cases)
+	{
+		EXPECT_EQ(Zeph::Room::GetDebugModelName(test.myMin, test.myMax), test.myName);
+	}
+}

@@ -1,0 +1,156 @@
+// Model trees without a GPU: the vertex type table, flags and technique names
+// passed down a tree.
+#include <gtest/gtest.h>
+#include <string>
+
+#include "model/Model.h"
+#include "model/ModelNode.h"
+#include "model/VertexTypes.h"
+
+TEST(VertexTypesTest, ElementsStridesAndOffsets)
+{
+	struct Case
+	{
+		int myType;
+		const char* myElements; // semantic names joined by spaces
+		int myStride;
+	};
+	const Case cases[] = {
+	    {0, "POSITION TEXCOORD", 20},
+	    {1, "POSITION COLOR TEXCOORD", 36},
+	    {2, "POSITION NORMAL TEXCOORD", 32},
+	    {3, "POSITION NORMAL TEXCOORD TANGENT", 44},
+	    {4, "POSITION NORMAL TEXCOORD TANGENT BINORMAL", 56},
+	    {5, "POSITION WEIGHTS BONES NORMAL TEXCOORD TANGENT", 52},
+	    {6, "POSITION WEIGHTS BONES NORMAL TEXCOORD TANGENT BINORMAL", 64},
+	    {7, "POSITION WEIGHTS BONES NORMAL TEXCOORD", 40},
+	};
+	GrowingArray<Gpu::InputElement> layout(10, 10);
+	for (const Case& test : cases)
+	{
+		Zeph::BuildInputLayoutDesc(test.myType, layout);
+		std::string names;
+		uint32_t expectedOffset = 0;
+		for (int index = 0; index < layout.Count(); ++index)
+		{
+			names += (index > 0 ? " " : "") + layout[index].mySemanticName;
+			EXPECT_EQ(layout[index].myAlignedByteOffset, expectedOffset) << "type " << test.myType;
+			EXPECT_EQ(layout[index].mySemanticIndex, 0u);
+			EXPECT_EQ(layout[index].myInputSlot, 0u);
+			expectedOffset += static_cast<uint32_t>(
+			    Zeph::GetVertexTypeElements(test.myType)[static_cast<size_t>(index)].mySize);
+		}
+		EXPECT_EQ(names, test.myElements);
+		EXPECT_EQ(Zeph::GetVertexTypeStride(test.myType), test.myStride);
+		EXPECT_EQ(static_cast<int>(expectedOffset), test.myStride);
+	}
+	Zeph::BuildInputLayoutDesc(4, layout);
+	EXPECT_EQ(layout[0].myFormat, Dds::Format::R32G32B32_FLOAT);
+	Zeph::BuildInputLayoutDesc(6, layout);
+	EXPECT_EQ(layout[1].myFormat, Dds::Format::R8G8B8A8_UNORM);
+	EXPECT_EQ(layout[2].myFormat, Dds::Format::R8G8B8A8_UINT);
+	// Not a vertex type: an empty layout, not a read past the table.
+	Zeph::BuildInputLayoutDesc(8, layout);
+	EXPECT_EQ(layout.Count(), 0);
+	EXPECT_EQ(Zeph::GetVertexTypeStride(-1), 0);
+}
+
+namespace
+{
+// root (no model) -> {first (model with a child model) -> {grandchild (model)}, second (null object)}
+struct Tree
+{
+	Tree()
+	{
+		root = new Zeph::ModelNode();
+		auto* first = new Zeph::ModelNode();
+		auto* grandchild = new Zeph::ModelNode();
+		auto* second = new Zeph::ModelNode();
+		firstModel = new Zeph::Model();
+		childModel = new Zeph::Model();
+		firstModel->AddChildModel(childModel);
+		grandchildModel = new Zeph::Model();
+		nullModel = new Zeph::Model();
+		nullModel->SetIsNullObject(true);
+		first->SetModel(firstModel);
+		grandchild->SetModel(grandchildModel);
+		second->SetModel(nullModel);
+		first->AddChild(grandchild);
+		root->AddChild(first);
+		root->AddChild(second);
+	}
+	~Tree() { delete root; }
+	Tree(const Tree&) = delete;
+	Tree& operator=(const Tree&) = delete;
+
+	Zeph::ModelNode* root;
+	Zeph::Model* firstModel;
+	Zeph::Model* childModel;
+	Zeph::Model* grandchildModel;
+	Zeph::Model* nullModel;
+};
+} // namespace
+
+TEST(ModelNodeTest, ShadowCasterFlagReachesEveryNodesModel)
+{
+	Tree tree;
+	EXPECT_FALSE(tree.grandchildModel->GetIsShadowCasterFlag());
+	tree.root->SetIsShadowCasterFlag(true);
+	EXPECT_TRUE(tree.firstModel->GetIsShadowCasterFlag());
+	EXPECT_TRUE(tree.grandchildModel->GetIsShadowCasterFlag());
+	EXPECT_TRUE(tree.nullModel->GetIsShadowCasterFlag());
+	tree.root->GetChildren()[0]->SetIsShadowCasterFlag(false);
+	EXPECT_FALSE(tree.firstModel->GetIsShadowCasterFlag());
+	EXPECT_FALSE(tree.grandchildModel->GetIsShadowCasterFlag());
+	EXPECT_TRUE(tree.nullModel->GetIsShadowCasterFlag());
+}
+
+TEST(ModelNodeTest, TechniqueSelectionNamesTheGBufferAndShadowTechniques)
+{
+	struct Case
+	{
+		const char* myGiven;
+		const char* myGBuffer;
+		const char* myShadow;
+	};
+	// From a new model: G-buffer name empty, shadow name "RenderShadowBuffer".
+	const Case cases[] = {
+	    {"Render", "RenderGBuffer", "RenderShadowBuffer"},
+	    {"RenderBase", "", "RenderShadowBufferBase"},
+	    {"RenderAlphaTest", "", "RenderShadowBufferAlphaTest"},
+	    {"RenderFrontFace", "RenderGBufferFrontFace", "RenderShadowBufferFrontFace"},
+	    {"RenderWireFrame", "", "RenderShadowBuffer"},
+	};
+	for (const Case& test : cases)
+	{
+		Tree tree;
+		tree.root->SetTechniqueByName(test.myGiven);
+		for (const Zeph::Model* model : {tree.firstModel, tree.childModel, tree.grandchildModel})
+		{
+			EXPECT_EQ(model->GetTechniqueName(), test.myGiven);
+			EXPECT_EQ(model->GetGBufferTechniqueName(), test.myGBuffer) << test.myGiven;
+			EXPECT_EQ(model->GetShadowTechniqueName(), test.myShadow) << test.myGiven;
+		}
+		EXPECT_EQ(tree.nullModel->GetTechniqueName(), "Render") << "a null object keeps its technique";
+	}
+
+	// "Unchanged" keeps what an earlier selection set.
+	Tree tree;
+	tree.root->SetTechniqueByName("RenderFrontFace");
+	tree.root->SetTechniqueByName("RenderBase");
+	EXPECT_EQ(tree.firstModel->GetGBufferTechniqueName(), "RenderGBufferFrontFace");
+	EXPECT_EQ(tree.firstModel->GetShadowTechniqueName(), "RenderShadowBufferBase");
+}
+
+TEST(ModelTest, IdsCountUpAndNewModelsHaveTheDocumentedDefaults)
+{
+	Zeph::Model first;
+	Zeph::Model second;
+	EXPECT_EQ(second.GetModelID(), first.GetModelID() + 1);
+	EXPECT_FALSE(first.IsNullObject());
+	EXPECT_EQ(first.GetTechniqueName(), "Render");
+	EXPECT_EQ(first.GetShadowTechniqueName(), "RenderShadowBuffer");
+	EXPECT_EQ(first.GetGBufferTechniqueName(), "");
+	EXPECT_FALSE(first.GetIsShadowCasterFlag());
+	EXPECT_EQ(first.GetChildModels().GetCapacity(), 10);
+}

@@ -1,0 +1,291 @@
+// The renderer with a GPU (headless, 160 x 90): instances drawn through the
+// collector, room boxes and lines over the frame, read back from the back buffer.
+// Every frame is saved under /tmp/lumora-renderer-tests/ to be looked at.
+#include <cmath>
+#include <cstdint>
+#include <gtest/gtest.h>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "engine/Camera.h"
+#include "engine/CameraInstance.h"
+#include "engine/DebugLine.h"
+#include "engine/EngineFixture.h"
+#include "engine/Instance.h"
+#include "engine/Room.h"
+#include "model/ModelFactory.h"
+#include "platform/gpu/Readback.h"
+#include "renderer/Renderer.h"
+
+namespace
+{
+constexpr int ourWidth = 160;
+constexpr int ourHeight = 90;
+
+struct Pixel
+{
+	int myX;
+	int myY;
+};
+
+class RendererTest : public EngineTest
+{
+protected:
+	// The engine and a camera at (0, 0, 5) looking along +z, set on the collector.
+	bool Start()
+	{
+		if (!CreateEngine(ourWidth, ourHeight))
+		{
+			return false;
+		}
+		myLens = std::make_unique<Zeph::Camera>(static_cast<float>(ourWidth) / ourHeight);
+		myCamera = std::make_unique<Zeph::CameraInstance>(myLens.get());
+		Renderer().GetRTC().SetCamera(*myCamera);
+		return true;
+	}
+
+	static Zeph::Renderer& Renderer() { return Zeph::Engine::GetInstance()->GetRenderer(); }
+	static Zeph::ModelFactory& Factory() { return Zeph::Engine::GetInstance()->GetModelFactory(); }
+
+	// Renders the frame, reads the back buffer and saves it as aName.png.
+	void RenderAndRead(const std::string& aName)
+	{
+		Zeph::Engine* engine = Zeph::Engine::GetInstance();
+		engine->RenderScene();
+		myPixels.clear();
+		ASSERT_TRUE(Gpu::ReadRenderTarget(engine->GetContext(), *engine->GetBackBufferView(), myPixels));
+		ASSERT_EQ(myPixels.size(), static_cast<size_t>(ourWidth * ourHeight * 4));
+		// Saved opaque: the room box's colour has alpha 0, which a viewer would show as a hole.
+		std::vector<uint8_t> opaque = myPixels;
+		for (size_t alpha = 3; alpha < opaque.size(); alpha += 4)
+		{
+			opaque[alpha] = 255;
+		}
+		Gpu::SavePng("/tmp/lumora-renderer-tests/" + aName + ".png", ourWidth, ourHeight, opaque.data());
+	}
+
+	const uint8_t* At(int anX, int aY) const
+	{
+		return &myPixels[static_cast<size_t>((aY * ourWidth + anX) * 4)];
+	}
+	bool IsBlack(int anX, int aY) const
+	{
+		return At(anX, aY)[0] == 0 && At(anX, aY)[1] == 0 && At(anX, aY)[2] == 0;
+	}
+	// Any pixel within one of (x, y) with the channel at 255.
+	bool IsLitNear(Pixel aPixel, int aChannel) const
+	{
+		for (int y = aPixel.myY - 1; y <= aPixel.myY + 1; ++y)
+		{
+			for (int x = aPixel.myX - 1; x <= aPixel.myX + 1; ++x)
+			{
+				if (x >= 0 && y >= 0 && x < ourWidth && y < ourHeight && At(x, y)[aChannel] == 255)
+				{
+					return true;
+				}
+			}
+		}
+		return false;
+	}
+	bool IsClearNear(Pixel aPixel) const
+	{
+		for (int y = aPixel.myY - 1; y <= aPixel.myY + 1; ++y)
+		{
+			for (int x = aPixel.myX - 1; x <= aPixel.myX + 1; ++x)
+			{
+				if (!IsBlack(x, y))
+				{
+					return false;
+				}
+			}
+		}
+		return true;
+	}
+
+	// Where the camera puts a world point: clip = (p, 1) * View * Projection, then
+	// the viewport with row 0 at the top.
+	Pixel Project(const Vector3<float>& aPoint) const
+	{
+		Vector4<float> clip(aPoint);
+		clip = clip * (myCamera->GetView() * myCamera->GetProjection());
+		const float x = (clip.x / clip.w * 0.5f + 0.5f) * ourWidth;
+		const float y = (0.5f - clip.y / clip.w * 0.5f) * ourHeight;
+		return {static_cast<int>(std::floor(x)), static_cast<int>(std::floor(y))};
+	}
+
+	std::unique_ptr<Zeph::Camera> myLens;
+	std::unique_ptr<Zeph::CameraInstance> myCamera;
+	std::vector<uint8_t> myPixels;
+};
+
+// sRGB encoding of a linear value, as the back buffer stores it.
+int Encoded(float aLinear)
+{
+	const float encoded =
+	    aLinear <= 0.0031308f ? aLinear * 12.92f : 1.055f * std::pow(aLinear, 1.0f / 2.4f) - 0.055f;
+	return static_cast<int>(std::lround(encoded * 255.0f));
+}
+} // namespace
+
+TEST_F(RendererTest, InstanceOfABoxIsDrawnWhereTheCameraSeesIt)
+{
+	if (!Start())
+	{
+		return;
+	}
+	Zeph::ModelNode* box = Factory().CreateAABB("red box", {1.0f, 1.0f, 1.0f}, {0.5f, 0.0f, 0.0f, 1.0f},
+	                                            Gpu::PrimitiveTopology::TriangleList);
+	ASSERT_NE(box, nullptr) << TakeLog();
+	Zeph::Instance instance(box);
+	instance.SetPosition({0.0f, 0.0f, 10.0f});
+	instance.Render();
+	RenderAndRead("box");
+
+	const uint8_t* centre = At(ourWidth / 2, ourHeight / 2);
+	EXPECT_NEAR(centre[0], Encoded(0.5f), 1) << "the back buffer stores sRGB-encoded colour";
+	EXPECT_EQ(centre[1], 0);
+	EXPECT_EQ(centre[2], 0);
+	for (const Pixel corner :
+	     {Pixel{0, 0}, Pixel{ourWidth - 1, 0}, Pixel{0, ourHeight - 1}, Pixel{ourWidth - 1, ourHeight - 1}})
+	{
+		EXPECT_TRUE(IsBlack(corner.myX, corner.myY)) << corner.myX << ", " << corner.myY;
+	}
+	// The near face's silhouette: inside just within its corner, outside just beyond.
+	const Pixel topLeft = Project({-1.0f, 1.0f, 9.0f});
+	EXPECT_NEAR(At(topLeft.myX + 2, topLeft.myY + 2)[0], Encoded(0.5f), 1);
+	EXPECT_TRUE(IsBlack(topLeft.myX - 2, topLeft.myY - 2));
+
+	// The frame emptied the queues: the next one draws nothing.
+	RenderAndRead("box-next-frame");
+	EXPECT_TRUE(IsBlack(ourWidth / 2, ourHeight / 2));
+}
+
+TEST_F(RendererTest, SubmittingKeepsEachInstancesPreviousWorldMatrix)
+{
+	if (!Start())
+	{
+		return;
+	}
+	Zeph::ModelNode* box = Factory().CreateAABB("box", {1.0f, 1.0f, 1.0f}, {1.0f, 1.0f, 1.0f, 1.0f},
+	                                            Gpu::PrimitiveTopology::TriangleList);
+	ASSERT_NE(box, nullptr) << TakeLog();
+	Zeph::Instance first(box);
+	Zeph::Instance second(box);
+	first.SetPosition({1.0f, 0.0f, 10.0f});
+	second.SetPosition({-1.0f, 0.0f, 10.0f});
+	first.Render();
+	second.Render();
+	const Zeph::RenderBatchList& list =
+	    Renderer().GetRTC().GetBatches(Zeph::RenderTargetCollector::SHADOW_CASTING_LIST);
+	ASSERT_EQ(list.Count(), 1) << "one model, one batch";
+	ASSERT_EQ(list[0].GetCount(), 2);
+	EXPECT_FLOAT_EQ(list[0].GetPreviousWorld(0).GetPosition().x, 1.0f) << "a first frame has not moved";
+	RenderAndRead("two-boxes");
+
+	first.SetPosition({2.0f, 0.5f, 10.0f});
+	first.Render();
+	second.Render();
+	ASSERT_EQ(list.Count(), 1);
+	EXPECT_FLOAT_EQ(list[0].GetWorld(0).GetPosition().x, 2.0f);
+	EXPECT_FLOAT_EQ(list[0].GetPreviousWorld(0).GetPosition().x, 1.0f);
+	EXPECT_FLOAT_EQ(list[0].GetPreviousWorld(0).GetPosition().y, 0.0f);
+	EXPECT_FLOAT_EQ(list[0].GetWorld(1).GetPosition().x, -1.0f);
+	EXPECT_FLOAT_EQ(list[0].GetPreviousWorld(1).GetPosition().x, -1.0f);
+	RenderAndRead("two-boxes-moved");
+}
+
+TEST_F(RendererTest, RoomBoxIsDrawnAsLinesOverTheFrame)
+{
+	if (!Start())
+	{
+		return;
+	}
+	Zeph::Room room({-1.0f, -1.0f, 9.0f}, {1.0f, 1.0f, 11.0f});
+	room.InitDebugInstance();
+	ASSERT_NE(room.GetDebugInstance(), nullptr) << TakeLog();
+	room.Render();
+	EXPECT_EQ(Renderer().GetLateCount(), 1);
+	RenderAndRead("room");
+	EXPECT_EQ(Renderer().GetLateCount(), 0) << "the frame empties the late list";
+
+	// The box's 36 triangle indices read as a line list give 18 lines: eight of the
+	// twelve edges (the near and far faces' left and right edges and the four edges
+	// running from near to far) and one diagonal on every face. Probed: edge middles.
+	for (const Vector3<float>& edge : {Vector3<float>(-1.0f, 0.0f, 9.0f), Vector3<float>(1.0f, 0.0f, 9.0f),
+	                                   Vector3<float>(-1.0f, 0.0f, 11.0f), Vector3<float>(-1.0f, 1.0f, 10.0f),
+	                                   Vector3<float>(1.0f, -1.0f, 10.0f)})
+	{
+		const Pixel pixel = Project(edge);
+		EXPECT_TRUE(IsLitNear(pixel, 0)) << "edge at " << pixel.myX << ", " << pixel.myY;
+		EXPECT_EQ(At(pixel.myX, pixel.myY)[1], 0) << "red only";
+	}
+	// The faces are not filled: the near face probed off its diagonal (which runs
+	// from (-x, -y) to (+x, +y)), in its upper-left and lower-right quarters.
+	EXPECT_TRUE(IsClearNear(Project({-0.5f, 0.5f, 9.0f})));
+	EXPECT_TRUE(IsClearNear(Project({0.5f, -0.5f, 9.0f})));
+	EXPECT_TRUE(IsBlack(0, 0));
+
+	// The box is drawn at the room's centre: the same model moved by the instance.
+	const Matrix44<float>& orientation = room.GetDebugInstance()->GetOrientation();
+	EXPECT_FLOAT_EQ(orientation.GetPosition().z, 10.0f);
+	room.DestroyDebugInstance();
+	EXPECT_EQ(room.GetDebugInstance(), nullptr);
+}
+
+TEST_F(RendererTest, RoomsWithEqualBoundsShareTheirBoxModel)
+{
+	if (!Start())
+	{
+		return;
+	}
+	Zeph::Room first({0.0f, 0.0f, 0.0f}, {2.0f, 4.0f, 6.0f});
+	Zeph::Room same({0.0f, 0.0f, 0.0f}, {2.0f, 4.0f, 6.0f});
+	Zeph::Room other({0.0f, 0.0f, 0.0f}, {2.0f, 4.0f, 7.0f});
+	first.InitDebugInstance();
+	same.InitDebugInstance();
+	other.InitDebugInstance();
+	ASSERT_NE(first.GetDebugInstance(), nullptr) << TakeLog();
+	ASSERT_NE(same.GetDebugInstance(), nullptr);
+	ASSERT_NE(other.GetDebugInstance(), nullptr);
+	EXPECT_NE(first.GetDebugInstance(), same.GetDebugInstance());
+	EXPECT_EQ(first.GetDebugInstance()->GetModelNode(), same.GetDebugInstance()->GetModelNode());
+	EXPECT_NE(first.GetDebugInstance()->GetModelNode(), other.GetDebugInstance()->GetModelNode());
+	// Stored under the bounds' name: asking for that name gives the room's box.
+	EXPECT_EQ(Factory().CreateAABB("room000246", {5.0f, 5.0f, 5.0f}, {0.0f, 0.0f, 1.0f, 1.0f},
+	                               Gpu::PrimitiveTopology::TriangleList),
+	          first.GetDebugInstance()->GetModelNode());
+	EXPECT_EQ(Factory().CreateAABB("room000247", {5.0f, 5.0f, 5.0f}, {0.0f, 0.0f, 1.0f, 1.0f},
+	                               Gpu::PrimitiveTopology::TriangleList),
+	          other.GetDebugInstance()->GetModelNode());
+	EXPECT_EQ(Factory().GetCount(), 2u);
+}
+
+TEST_F(RendererTest, MovedDebugLineIsDrawnAtItsNewEnds)
+{
+	if (!Start())
+	{
+		return;
+	}
+	const Vector4<float> green(0.0f, 1.0f, 0.0f, 0.0f);
+	Zeph::DebugLine line;
+	ASSERT_TRUE(line.Init({{-1.0f, 0.5f, 10.0f}, green}, {{1.0f, 0.5f, 10.0f}, green})) << TakeLog();
+	line.Render();
+	RenderAndRead("line-before");
+	const Pixel oldMiddle = Project({0.0f, 0.5f, 10.0f});
+	ASSERT_TRUE(IsLitNear(oldMiddle, 1)) << "the line as made";
+
+	line.SetVertexPosition(0, {-1.0f, -0.5f, 10.0f});
+	line.SetVertexPosition(1, {1.0f, -0.8f, 10.0f});
+	line.Render();
+	RenderAndRead("line-after");
+	for (const float t : {0.1f, 0.3f, 0.5f, 0.7f, 0.9f})
+	{
+		const Vector3<float> onNew(-1.0f + 2.0f * t, -0.5f - 0.3f * t, 10.0f);
+		const Vector3<float> onOld(-1.0f + 2.0f * t, 0.5f, 10.0f);
+		EXPECT_TRUE(IsLitNear(Project(onNew), 1)) << "new line at t = " << t;
+		EXPECT_TRUE(IsClearNear(Project(onOld))) << "old line at t = " << t;
+	}
+	line.Destroy();
+	EXPECT_EQ(line.GetInstance(), nullptr);
+}
