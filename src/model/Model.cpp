@@ -86,6 +86,14 @@ void Model::SetIndexData(int aCount, int aFormat, const void* someData, int aSiz
 	}
 }
 
+void Model::SetNames(const std::string& aFirstName, const std::string& aTechniqueName,
+                     const std::string& aThirdName)
+{
+	myFirstName = aFirstName;
+	myTechniqueName = aTechniqueName;
+	myThirdName = aThirdName;
+}
+
 void Model::SetInputLayoutDesc(std::span<const Gpu::InputElement> someElements)
 {
 	myInputLayoutDesc.RemoveAll();

@@ -22,6 +22,7 @@
 #include <vector>
 
 #include "core/GrowingArray.h"
+#include "model/ModelAnimationData.h"
 #include "model/Surface.h"
 #include "platform/gpu/Buffer.h"
 #include "platform/gpu/InputLayout.h"
@@ -68,6 +69,8 @@ public:
 	void SetIsNullObject(bool aFlag) { myIsNullObject = aFlag; }
 	bool IsNullObject() const { return myIsNullObject; }
 	int GetModelID() const { return myModelID; }
+	// Model files store the id; a loaded model keeps the stored one.
+	void SetModelID(int anID) { myModelID = anID; }
 	void SetVertexType(int aType) { myVertexType = aType; }
 	int GetVertexType() const { return myVertexType; }
 
@@ -88,6 +91,12 @@ public:
 	void SetEffect(Effect* anEffect) { myEffect = anEffect; }
 	Effect* GetEffect() const { return myEffect; }
 	const std::string& GetTechniqueName() const { return myTechniqueName; }
+	// The three names model files store; SetNames sets the render technique name
+	// without looking it up (SetTechniqueByName does that).
+	void SetNames(const std::string& aFirstName, const std::string& aTechniqueName,
+	              const std::string& aThirdName);
+	const std::string& GetFirstName() const { return myFirstName; }
+	const std::string& GetThirdName() const { return myThirdName; }
 	const std::string& GetGBufferTechniqueName() const { return myGBufferTechniqueName; }
 	const std::string& GetShadowTechniqueName() const { return myShadowTechniqueName; }
 	Fx::Technique* GetRenderTechnique() const { return myRenderTechnique; }
@@ -99,6 +108,8 @@ public:
 	// Takes ownership.
 	void AddChildModel(Model* aModel) { myChildModels.Add(aModel); }
 	const GrowingArray<Model*>& GetChildModels() const { return myChildModels; }
+	ModelAnimationData& GetAnimationData() { return myAnimationData; }
+	const ModelAnimationData& GetAnimationData() const { return myAnimationData; }
 
 	// Binds the layout and the buffers for drawing this model's surfaces; false when
 	// the model has nothing to draw with.
@@ -122,6 +133,7 @@ private:
 	std::string myTechniqueName = "Render";
 	std::string myThirdName = "NULL";
 	GrowingArray<Surface> mySurfaces;
+	ModelAnimationData myAnimationData;
 	GrowingArray<Model*> myChildModels;
 
 	std::string myGBufferTechniqueName;

@@ -1,11 +1,15 @@
 #include "model/ModelFactory.h"
 
+#include <algorithm>
+#include <cmath>
 #include <cstdint>
+#include <cstring>
 
 #include "engine/Effect.h"
 #include "engine/EffectContainer.h"
 #include "engine/Engine.h"
 #include "engine/EngineReport.h"
+#include "model/ColladaMeshFactory.h"
 #include "model/Model.h"
 #include "model/ModelNode.h"
 #include "model/Surface.h"
@@ -14,6 +18,29 @@ namespace Zeph
 {
 namespace
 {
+constexpr const char* ourLoadFunction = "Zeph::ModelFactory::LoadModel";
+constexpr int ourInvalidFormatLine = 68;
+constexpr int ourLoadFailedLine = 77;
+constexpr int ourCreateAlFailedLine = 109;
+// The box a bounding sphere starts from, grown by each vertex.
+constexpr float ourBoundsStart = 2000000.0f;
+
+const Model* FirstModel(const ModelNode& aNode)
+{
+	if (aNode.GetModel() != nullptr)
+	{
+		return aNode.GetModel();
+	}
+	for (const ModelNode* child : aNode.GetChildren())
+	{
+		if (const Model* found = FirstModel(*child))
+		{
+			return found;
+		}
+	}
+	return nullptr;
+}
+
 constexpr const char* ourBoxEffectFile = "Data/Shaders/Misc/Vertex_PosCol.fx";
 
 struct BoxVertex
@@ -44,12 +71,107 @@ ModelNode* ModelFactory::GetModel(const std::string& aName)
 	return LoadModel(aName);
 }
 
+ModelNode* ModelFactory::CreateModelNodeAL(const std::string& aName)
+{
+	const auto found = myModels.find(aName);
+	if (found != myModels.end())
+	{
+		return found->second.get();
+	}
+	ModelNode* tree = ColladaMeshFactory::CreateModelNodeAL(aName);
+	if (tree == nullptr)
+	{
+		ReportCritical(ourCreateAlFailedLine, "Zeph::ModelFactory::CreateModelNodeAL",
+		               "Couldn't load Model: %s", aName.c_str());
+		return nullptr;
+	}
+	Store(aName, tree);
+	return tree;
+}
+
 ModelNode* ModelFactory::LoadModel(const std::string& aName)
 {
-	// The COLLADA (.dae) and binary (.al) importers are not part of the engine yet;
-	// until they are, every load fails the way a failed import does and stores nothing.
-	ReportCritical(__LINE__, "Zeph::ModelFactory::LoadModel", "Couldn't load Model: %s", aName.c_str());
-	return nullptr;
+	const size_t dot = aName.rfind('.');
+	const std::string extension = dot != std::string::npos ? aName.substr(dot) : std::string();
+	ModelNode* tree = nullptr;
+	if (extension == ".dae")
+	{
+		// The COLLADA importer is not part of the engine yet: until it is, a ".dae"
+		// file yields no tree and is reported as a failed import below. With it, the
+		// imported tree gets SetTechniqueByName("Render") here.
+	}
+	else if (extension == ".al")
+	{
+		tree = ColladaMeshFactory::CreateModelNodeAL(aName);
+	}
+	else
+	{
+		ReportCritical(ourInvalidFormatLine, ourLoadFunction, "Invalid model file format: %s", aName.c_str());
+	}
+	if (tree == nullptr)
+	{
+		ReportCritical(ourLoadFailedLine, ourLoadFunction, "Couldn't load Model: %s", aName.c_str());
+		return nullptr;
+	}
+	Store(aName, tree);
+	return tree;
+}
+
+void ModelFactory::Store(const std::string& aName, ModelNode* aTree)
+{
+	myModels[aName].reset(aTree);
+	myCullShapes[aName] = ComputeBoundingSphere(*aTree);
+}
+
+Intersection::Sphere ModelFactory::ComputeBoundingSphere(const ModelNode& aRoot)
+{
+	Vector3<float> minimum(ourBoundsStart, ourBoundsStart, ourBoundsStart);
+	Vector3<float> maximum(-ourBoundsStart, -ourBoundsStart, -ourBoundsStart);
+	// A tree without a model keeps the untouched box: a huge sphere, never culled.
+	if (const Model* model = FirstModel(aRoot))
+	{
+		int stride = 0;
+		if (model->GetVertexType() == 4)
+		{
+			stride = 56;
+		}
+		else if (model->GetVertexType() == 6)
+		{
+			stride = 64;
+		}
+		const std::span<const uint8_t> data = model->GetVertexData();
+		for (int vertex = 0; vertex < model->GetVertexCount(); ++vertex)
+		{
+			float position[3] = {0.0f, 0.0f, 0.0f};
+			const size_t offset = static_cast<size_t>(vertex) * static_cast<size_t>(stride);
+			if (stride > 0)
+			{
+				if (offset + sizeof(position) > data.size())
+				{
+					break; // a vertex count past the data: the rest is not there to read
+				}
+				std::memcpy(position, data.data() + offset, sizeof(position));
+			}
+			minimum.x = std::min(minimum.x, position[0]);
+			minimum.y = std::min(minimum.y, position[1]);
+			minimum.z = std::min(minimum.z, position[2]);
+			maximum.x = std::max(maximum.x, position[0]);
+			maximum.y = std::max(maximum.y, position[1]);
+			maximum.z = std::max(maximum.z, position[2]);
+		}
+	}
+	minimum.x = -minimum.x;
+	maximum.x = -maximum.x;
+	if (minimum.x > maximum.x)
+	{
+		std::swap(minimum.x, maximum.x);
+	}
+	const Vector3<float> centre((minimum.x + maximum.x) * 0.5f, (minimum.y + maximum.y) * 0.5f,
+	                            (minimum.z + maximum.z) * 0.5f);
+	const float dx = maximum.x - centre.x;
+	const float dy = maximum.y - centre.y;
+	const float dz = maximum.z - centre.z;
+	return Intersection::Sphere(centre, std::sqrt(dx * dx + dy * dy + dz * dz));
 }
 
 ModelNode* ModelFactory::CreateAABB(const std::string& aName, const Vector3<float>& aHalfSize,

@@ -32,6 +32,8 @@ public:
 
 	// The stored tree for the name, else the result of LoadModel.
 	ModelNode* GetModel(const std::string& aName);
+	// As GetModel, but a name not stored yet is always read as an ".al" file.
+	ModelNode* CreateModelNodeAL(const std::string& aName);
 	// A box of eight coloured corners at +-aHalfSize around the origin, drawn with
 	// Vertex_PosCol.fx in aTopology; stored under aName. A name already stored gives
 	// the stored node whatever the size and colour.
@@ -44,8 +46,17 @@ public:
 	void Clear();
 	size_t GetCount() const { return myModels.size(); }
 
+	// The bounding sphere of a tree: of the root's model, or of the first model found
+	// depth-first (a node's model before its children's). Positions are read for the
+	// lit and skinned vertex types (4 and 6) only; every other vertex counts as the
+	// origin. The box is mirrored in x as the importers mirror the tree.
+	static Intersection::Sphere ComputeBoundingSphere(const ModelNode& aRoot);
+
 private:
+	// Imports by extension (".dae", ".al") and stores the tree with its bounding
+	// sphere; null after a report.
 	ModelNode* LoadModel(const std::string& aName);
+	void Store(const std::string& aName, ModelNode* aTree);
 
 	std::map<std::string, std::unique_ptr<ModelNode>> myModels;
 	std::map<std::string, Intersection::Sphere> myCullShapes;

@@ -47,6 +47,15 @@ public:
 	int GetStartIndex() const { return myStartIndex; }
 	void SetPrimitiveTopology(Gpu::PrimitiveTopology aTopology) { myPrimitiveTopology = aTopology; }
 	Gpu::PrimitiveTopology GetPrimitiveTopology() const { return myPrimitiveTopology; }
+	// Two integers model files store with a surface: a reserved one and one the
+	// importer sets to 0. Kept for the animation layers and written back unchanged.
+	void SetReservedValues(int aReserved, int aSecond)
+	{
+		myReservedValue = aReserved;
+		mySecondReservedValue = aSecond;
+	}
+	int GetReservedValue() const { return myReservedValue; }
+	int GetSecondReservedValue() const { return mySecondReservedValue; }
 	void SetRenderCategory(RenderCategory aCategory) { myRenderCategory = aCategory; }
 	RenderCategory GetRenderCategory() const { return myRenderCategory; }
 
@@ -67,6 +76,8 @@ private:
 	Effect* myEffect = nullptr; // shared, owned by the EffectContainer
 	int myIndexCount = 0;
 	int myStartIndex = 0;
+	int myReservedValue = 0;
+	int mySecondReservedValue = 0;
 	Gpu::PrimitiveTopology myPrimitiveTopology = Gpu::PrimitiveTopology::TriangleList;
 	RenderCategory myRenderCategory = RENDER_CATEGORY_SHADOW_CASTING;
 	// The bindings, one entry per bound texture in each array.

@@ -1,7 +1,8 @@
 #pragma once
 // TransformationNode: the local transformation of one model node. The base holds a
-// fixed matrix; the importers derive the animated kinds (a hierarchy of child
-// transformations, a set of animation curves) and override the evaluation.
+// fixed matrix; the two animated kinds derive from it and override the evaluation:
+// TransformationNodeHierarchy (child transformations) and TransformationNodeCurves
+// (animation curves). The kind is stored in model files, so the enum takes any int.
 //
 //   Zeph::TransformationNode* node = new Zeph::TransformationNode();   // identity
 //   Matrix44<float> local = node->GetTransformationForTime(0.0);
@@ -11,7 +12,7 @@
 
 namespace Zeph
 {
-enum TransformationNodeType
+enum TransformationNodeType : int
 {
 	TransformationNode_Curves = 0,
 	TransformationNode_Hierarchy = 1,

@@ -1,0 +1,104 @@
+// Fuzz entry for the COLLADA reader: any bytes must load or fail with a message, never crash or
+// read out of range; what loads must triangulate, evaluate its transforms and reduce its skins
+// with every index inside its source.
+//
+// Run the real fuzzer (clang, libFuzzer and ASan):
+//   CC=clang CXX=clang++ cmake -S . -B build-fuzz -G Ninja -DLUMORA_FUZZ=ON -DLUMORA_BUILD_BENCH=OFF
+//   cmake --build build-fuzz --target collada_fuzz
+//   mkdir -p build-fuzz/collada-corpus && cp ../shared/testdata/collada/*.dae build-fuzz/collada-corpus/
+//   ./build-fuzz/tests/fuzz/collada_fuzz -max_total_time=300 build-fuzz/collada-corpus
+// Without clang, collada_tests drives this entry with a fixed set of mutations.
+
+#include <cstddef>
+#include <cstdint>
+#include <cstdlib>
+#include <string>
+
+#include "platform/collada/Document.h"
+
+namespace
+{
+void WalkNode(const Collada::Node& aNode, int aDepth)
+{
+	// The reader refuses instance cycles; a walk deeper than any document could nest means one slipped by.
+	if (aDepth > 10000)
+	{
+		std::abort();
+	}
+	volatile float sink = aNode.GetLocalMatrix().myMatrix[0];
+	(void)sink;
+	for (const Collada::Instance& instance : aNode.myInstances)
+	{
+		if (instance.myNode != nullptr)
+		{
+			WalkNode(*instance.myNode, aDepth + 1);
+		}
+	}
+	for (const auto& child : aNode.myChildren)
+	{
+		WalkNode(*child, aDepth + 1);
+	}
+}
+} // namespace
+
+extern "C" int LLVMFuzzerTestOneInput(const uint8_t* someData, size_t aSize)
+{
+	Collada::Document document;
+	std::string error;
+	if (!document.LoadFromMemory(someData, aSize, error))
+	{
+		if (error.empty() || !document.GetGeometries().empty() || document.GetVisualScene() != nullptr)
+		{
+			std::abort();
+		}
+		return 0;
+	}
+	for (const Collada::Geometry& geometry : document.GetGeometries())
+	{
+		Collada::Mesh mesh = geometry.myMesh;
+		const size_t triangles = mesh.GetTriangleCount();
+		mesh.Triangulate();
+		if (!mesh.IsTriangles() || mesh.GetTriangleCount() != triangles)
+		{
+			std::abort();
+		}
+		for (const Collada::PolygonSet& set : mesh.mySets)
+		{
+			for (const Collada::Input& input : set.myInputs)
+			{
+				const Collada::Source* source = mesh.FindSource(input.mySource);
+				if (source == nullptr || input.myIndices.size() != set.GetTriangleCount() * 3)
+				{
+					std::abort();
+				}
+				for (uint32_t index : input.myIndices)
+				{
+					if (source->Element(index) == nullptr && source->NameElement(index) == nullptr)
+					{
+						std::abort();
+					}
+				}
+			}
+		}
+	}
+	for (const Collada::Controller& controller : document.GetControllers())
+	{
+		Collada::Skin skin = controller.mySkin;
+		skin.ReduceInfluences(4, 0.0f);
+		for (const auto& influences : skin.myInfluences)
+		{
+			if (influences.size() > 4)
+			{
+				std::abort();
+			}
+		}
+	}
+	for (const auto& scene : document.GetVisualScenes())
+	{
+		for (const auto& node : scene->myNodes)
+		{
+			WalkNode(*node, 0);
+		}
+	}
+	return 0;
+}

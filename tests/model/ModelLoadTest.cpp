@@ -1,0 +1,326 @@
+// Loading models through the factory with a GPU: ".al" files written and read back
+// with their effects, textures and techniques, the load reports, the stored
+// bounding spheres, the lit effects' techniques and a lit quad on screen.
+#include <cmath>
+#include <filesystem>
+#include <gtest/gtest.h>
+
+#include "ModelTreeCheck.h"
+#include "engine/Effect.h"
+#include "engine/EffectContainer.h"
+#include "engine/EngineFixture.h"
+#include "engine/ShaderFiles.h"
+#include "engine/TextureContainer.h"
+#include "model/ColladaMeshFactory.h"
+#include "model/ModelFactory.h"
+#include "model/VertexTypes.h"
+#include "platform/dds/DdsFile.h"
+#include "platform/fx/Technique.h"
+#include "platform/gpu/Readback.h"
+
+namespace
+{
+class ModelLoadTest : public EngineTest
+{
+protected:
+	// A 4x4 texture of one RGBA8 colour.
+	std::string WriteTexture(const std::string& aName, const uint8_t aColor[4])
+	{
+		Dds::ImageInfo info;
+		info.myWidth = 4;
+		info.myHeight = 4;
+		info.myDepth = 1;
+		info.myArraySize = 1;
+		info.myMipLevels = 1;
+		info.myFormat = Dds::Format::R8G8B8A8_UNORM;
+		info.myResourceDimension = Dds::ResourceDimension::Texture2D;
+		Dds::Image image;
+		std::string error;
+		EXPECT_TRUE(image.Init(info, error)) << error;
+		uint8_t* bytes = image.Data(0, 0);
+		for (uint64_t at = 0; at + 3 < image.SubresourceSize(0); at += 4)
+		{
+			std::memcpy(bytes + at, aColor, 4);
+		}
+		const std::string path = myScratch.File(aName);
+		EXPECT_TRUE(Dds::SaveToFile(path, image, error)) << error;
+		return path;
+	}
+
+	// The lit effect on a model and its surfaces, as the importers set it.
+	static Zeph::Effect* SetLitEffect(Zeph::Model& aModel)
+	{
+		Zeph::Effect* effect = Zeph::Engine::GetInstance()->GetEffectContainer().GetEffect(
+		    Zeph::ShaderFiles[Zeph::EFFECT_LIT_MODEL]);
+		aModel.SetEffect(effect);
+		for (Zeph::Surface& surface : aModel.GetSurfaces())
+		{
+			surface.SetEffect(effect);
+		}
+		return effect;
+	}
+};
+
+uint8_t ToSrgbByte(float aLinear)
+{
+	const float encoded =
+	    aLinear <= 0.0031308f ? aLinear * 12.92f : 1.055f * std::pow(aLinear, 1.0f / 2.4f) - 0.055f;
+	return static_cast<uint8_t>(std::lround(encoded * 255.0f));
+}
+} // namespace
+
+TEST_F(ModelLoadTest, AnAlFileLoadsAsTheTreeThatWasSavedWithItsTexturesAndTechniques)
+{
+	if (!CreateEngine(64, 64))
+	{
+		return;
+	}
+	const uint8_t red[4] = {255, 0, 0, 255};
+	const uint8_t flat[4] = {128, 128, 255, 255};
+	const std::string albedo = WriteTexture("albedo.dds", red);
+	const std::string normal = WriteTexture("normal.dds", flat);
+	std::unique_ptr<Zeph::ModelNode> tree(ModelTreeCheck::MakeTree());
+	SetLitEffect(*tree->GetModel());
+	Zeph::Surface& first = tree->GetModel()->GetSurfaces()[0];
+	ASSERT_TRUE(first.SetTexture(albedo, "DiffuseTexture", true)) << TakeLog();
+	ASSERT_TRUE(first.SetTexture(normal, "NormalTexture", false)) << TakeLog();
+	Zeph::Model* leafModel = tree->GetChildren()[0]->GetChildren()[0]->GetModel();
+	SetLitEffect(*leafModel);
+	ASSERT_TRUE(leafModel->GetSurfaces()[1].SetTexture(albedo, "SubstanceTexture", true)) << TakeLog();
+
+	const std::string path = myScratch.File("models/tree.al");
+	ASSERT_TRUE(Zeph::ColladaMeshFactory::SaveModelNodeAL(*tree, path)) << TakeLog();
+	size_t files = 0;
+	for ([[maybe_unused]] const auto& entry :
+	     std::filesystem::directory_iterator(myScratch.Path() / "models"))
+	{
+		++files;
+	}
+	EXPECT_EQ(files, 1u) << "no temporary file is left beside the model file";
+
+	Zeph::ModelFactory& factory = Zeph::Engine::GetInstance()->GetModelFactory();
+	Zeph::ModelNode* loaded = factory.GetModel(path);
+	ASSERT_NE(loaded, nullptr) << TakeLog();
+	ModelTreeCheck::ExpectSameTree(*tree, *loaded);
+	EXPECT_EQ(factory.GetModel(path), loaded) << "the same path gives the same tree";
+	EXPECT_EQ(factory.GetCount(), 1u);
+	loaded->SetIsShadowCasterFlag(true);
+	EXPECT_TRUE(factory.GetModel(path)->GetModel()->GetIsShadowCasterFlag());
+
+	const Zeph::Model* model = loaded->GetModel();
+	ASSERT_NE(model->GetEffect(), nullptr);
+	EXPECT_EQ(model->GetEffect()->GetFileName(), Zeph::ShaderFiles[Zeph::EFFECT_LIT_MODEL]);
+	EXPECT_EQ(model->GetSurfaces()[1].GetEffect(), model->GetEffect());
+	ASSERT_NE(model->GetRenderTechnique(), nullptr);
+	EXPECT_EQ(model->GetRenderTechnique()->GetName(), "Render");
+	EXPECT_EQ(model->GetGBufferTechniqueName(), "RenderGBuffer");
+	ASSERT_NE(model->GetGBufferTechnique(), nullptr);
+	EXPECT_TRUE(model->GetGBufferTechnique()->IsValid());
+	ASSERT_NE(model->GetShadowTechnique(), nullptr);
+	EXPECT_EQ(model->GetShadowTechnique()->GetName(), "RenderShadowBuffer");
+	EXPECT_TRUE(model->GetShadowTechnique()->IsValid());
+	const Zeph::Model* nullChild =
+	    loaded->GetChildren()[0]->GetChildren()[0]->GetModel()->GetChildModels()[0];
+	EXPECT_EQ(nullChild->GetEffect(), nullptr) << "a null object gets no effect";
+
+	// The root model's quad: x from -0.5 to 0.5 (mirrored, the same), y too, z 0.5.
+	const Intersection::Sphere sphere = factory.GetCullShapeFromModel(path);
+	EXPECT_FLOAT_EQ(sphere.myPosition.x, 0.0f);
+	EXPECT_FLOAT_EQ(sphere.myPosition.z, 0.5f);
+	EXPECT_NEAR(sphere.myRadius, std::sqrt(0.5f), 1e-6f);
+}
+
+TEST_F(ModelLoadTest, ModelsThatCannotLoadAreReportedAndNotStored)
+{
+	if (!CreateEngine(64, 64))
+	{
+		return;
+	}
+	TestSupport::WriteWholeFile(myScratch.File("damaged.al"), std::string("\x02\x00\x00\x00\x07", 5));
+	struct Case
+	{
+		std::string myName;
+		std::string myFirstReport; // before "Couldn't load Model: "
+	};
+	// A log entry: its line, its function, then the message.
+	const auto entry = [](int aLine, const std::string& aFunction, const std::string& aMessage) {
+		return "\"Line:\"" + std::to_string(aLine) + "\n\"Function:\"\"" + aFunction + "\"\n\"" + aMessage;
+	};
+	const std::string load = "Zeph::ModelFactory::LoadModel";
+	const std::string read = "Zeph::ColladaMeshFactory::CreateModelNodeAL";
+	const std::string missing = myScratch.File("missing.al");
+	const Case cases[] = {
+	    {"data/models/crate", entry(68, load, "Invalid model file format: data/models/crate\n")},
+	    {"data/models/crate.obj", entry(68, load, "Invalid model file format: data/models/crate.obj\n")},
+	    {missing, entry(86, read, "Failed to open " + missing + ":\n")},
+	    {myScratch.File("damaged.al"), "Damaged model file " + myScratch.File("damaged.al") + ": "},
+	};
+	Zeph::ModelFactory& factory = Zeph::Engine::GetInstance()->GetModelFactory();
+	for (const Case& test : cases)
+	{
+		EXPECT_EQ(factory.GetModel(test.myName), nullptr) << test.myName;
+		const std::string log = TakeLog();
+		const size_t first = log.find(test.myFirstReport);
+		const size_t failed = log.find(entry(77, load, "Couldn't load Model: " + test.myName + "\n"));
+		EXPECT_NE(first, std::string::npos) << log;
+		EXPECT_NE(failed, std::string::npos) << log;
+		EXPECT_LT(first, failed) << log;
+	}
+	EXPECT_EQ(factory.CreateModelNodeAL(missing), nullptr);
+	const std::string log = TakeLog();
+	EXPECT_NE(log.find(entry(86, read, "Failed to open " + missing + ":\n")), std::string::npos) << log;
+	EXPECT_NE(
+	    log.find(entry(109, "Zeph::ModelFactory::CreateModelNodeAL", "Couldn't load Model: " + missing)),
+	    std::string::npos)
+	    << log;
+	EXPECT_EQ(factory.GetCount(), 0u);
+}
+
+TEST_F(ModelLoadTest, TheStoredSphereComesFromTheFirstModelMirroredInX)
+{
+	if (!CreateEngine(64, 64))
+	{
+		return;
+	}
+	// A root without a model over one child whose lit model has one vertex at (1, 2, 3).
+	Zeph::ModelNode root;
+	auto* child = new Zeph::ModelNode();
+	Zeph::Model* model = ModelTreeCheck::MakeQuadModel(1.0f, 3.0f);
+	float position[3] = {1.0f, 2.0f, 3.0f};
+	std::vector<uint8_t> vertex(model->GetVertexData().begin(), model->GetVertexData().begin() + 56);
+	std::memcpy(vertex.data(), position, sizeof(position));
+	const uint32_t indices[3] = {0, 0, 0};
+	model->SetVertexData(1, 56, vertex.data(), 56);
+	model->SetIndexData(3, Zeph::Model::ourIndexFormatR32, indices, sizeof(indices));
+	model->GetSurfaces().RemoveAll();
+	child->SetModel(model);
+	root.AddChild(child);
+	const std::string path = myScratch.File("point.al");
+	ASSERT_TRUE(Zeph::ColladaMeshFactory::SaveModelNodeAL(root, path)) << TakeLog();
+
+	Zeph::ModelFactory& factory = Zeph::Engine::GetInstance()->GetModelFactory();
+	ASSERT_NE(factory.CreateModelNodeAL(path), nullptr) << TakeLog();
+	const Intersection::Sphere sphere = factory.GetCullShapeFromModel(path);
+	EXPECT_FLOAT_EQ(sphere.myPosition.x, -1.0f);
+	EXPECT_FLOAT_EQ(sphere.myPosition.y, 2.0f);
+	EXPECT_FLOAT_EQ(sphere.myPosition.z, 3.0f);
+	EXPECT_FLOAT_EQ(sphere.myRadius, 0.0f);
+}
+
+TEST_F(ModelLoadTest, TheModelEffectsHaveEveryTechniqueAModelSelects)
+{
+	if (!CreateEngine(64, 64))
+	{
+		return;
+	}
+	const char* const litTechniques[] = {
+	    "Render",
+	    "RenderBase",
+	    "RenderAlphaTest",
+	    "RenderFrontFace",
+	    "RenderGBuffer",
+	    "RenderGBufferFrontFace",
+	    "RenderShadowBuffer",
+	    "RenderShadowBufferBase",
+	    "RenderShadowBufferAlphaTest",
+	    "RenderShadowBufferFrontFace",
+	};
+	Zeph::EffectContainer& effects = Zeph::Engine::GetInstance()->GetEffectContainer();
+	for (int row : {Zeph::EFFECT_LIT_MODEL, Zeph::EFFECT_SKINNED_MODEL})
+	{
+		Zeph::Effect* effect = effects.GetEffect(Zeph::ShaderFiles[static_cast<size_t>(row)]);
+		ASSERT_NE(effect, nullptr) << Zeph::ShaderFiles[static_cast<size_t>(row)] << "\n" << TakeLog();
+		for (const char* name : litTechniques)
+		{
+			Fx::Technique* technique = effect->GetEffect()->GetTechniqueByName(name);
+			ASSERT_NE(technique, nullptr) << name;
+			EXPECT_TRUE(technique->IsValid()) << Zeph::ShaderFiles[static_cast<size_t>(row)] << ": " << name;
+		}
+	}
+	// Every vertex type's layout feeds its effect's "Render" and shadow passes.
+	Gpu::Context& context = Zeph::Engine::GetInstance()->GetContext();
+	for (int type = 0; type < Zeph::VERTEX_TYPE_COUNT; ++type)
+	{
+		Zeph::Effect* effect = effects.GetEffect(Zeph::ShaderFiles[static_cast<size_t>(type)]);
+		ASSERT_NE(effect, nullptr) << TakeLog();
+		GrowingArray<Gpu::InputElement> layout(10, 10);
+		Zeph::BuildInputLayoutDesc(type, layout);
+		for (const char* name : {"Render", "RenderShadowBuffer"})
+		{
+			Fx::Technique* technique = effect->GetEffect()->GetTechniqueByName(name);
+			if (!technique->IsValid())
+			{
+				EXPECT_STREQ(name, "RenderShadowBuffer") << "type " << type << " has no Render";
+				continue;
+			}
+			Gpu::InputLayout inputLayout;
+			EXPECT_TRUE(inputLayout.Init(context,
+			                             std::span<const Gpu::InputElement>(layout.begin(), layout.end()),
+			                             technique->GetPassByIndex(0)->GetVertexInputs(), "test layout"))
+			    << "type " << type << ", " << name << "\n"
+			    << TakeLog();
+			inputLayout.Destroy();
+		}
+	}
+}
+
+TEST_F(ModelLoadTest, ALoadedLitModelDrawnWithRenderShowsItsAlbedoLit)
+{
+	const int size = 64;
+	if (!CreateEngine(size, size))
+	{
+		return;
+	}
+	const uint8_t albedo[4] = {200, 120, 40, 255};
+	const std::string texture = WriteTexture("albedo.dds", albedo);
+	Zeph::ModelNode source;
+	source.SetModel(ModelTreeCheck::MakeQuadModel(0.5f, 0.5f));
+	SetLitEffect(*source.GetModel());
+	for (Zeph::Surface& surface : source.GetModel()->GetSurfaces())
+	{
+		ASSERT_TRUE(surface.SetTexture(texture, "DiffuseTexture", false)) << TakeLog();
+	}
+	const std::string path = myScratch.File("quad.al");
+	ASSERT_TRUE(Zeph::ColladaMeshFactory::SaveModelNodeAL(source, path)) << TakeLog();
+	Zeph::Engine* engine = Zeph::Engine::GetInstance();
+	Zeph::ModelNode* tree = engine->GetModelFactory().GetModel(path);
+	ASSERT_NE(tree, nullptr) << TakeLog();
+	Zeph::Model* model = tree->GetModel();
+
+	const Matrix44<float> identity;
+	Zeph::Effect* effect = model->GetEffect();
+	effect->SetWorldMatrix(identity);
+	effect->SetViewMatrix(identity);
+	effect->SetProjectionMatrix(identity);
+	// The light travels into the screen and down; the quad faces the viewer (-z).
+	const Vector4<float> lightColor(1.0f, 0.5f, 1.0f, 1.0f);
+	effect->SetDirectionalLight({0.0f, -0.6f, 0.8f, 0.0f}, lightColor);
+	Gpu::Context& context = engine->GetContext();
+	context.ClearRenderTargetView(*engine->GetBackBufferView(), ourClearColor);
+	context.ClearDepthStencilView(*engine->GetDepthStencilView(), true, true, 1.0f, 0);
+	Gpu::RenderTargetView* const targets[] = {engine->GetBackBufferView()};
+	ASSERT_TRUE(context.SetRenderTargets(targets, engine->GetDepthStencilView()));
+	ASSERT_TRUE(model->SetupBuffers(context));
+	for (const Zeph::Surface& surface : model->GetSurfaces())
+	{
+		surface.ActivateTextures();
+		context.SetPrimitiveTopology(surface.GetPrimitiveTopology());
+		ASSERT_TRUE(model->GetRenderTechnique()->GetPassByIndex(0)->Apply(context));
+		ASSERT_TRUE(context.DrawIndexed(static_cast<uint32_t>(surface.GetIndexCount()),
+		                                static_cast<uint32_t>(surface.GetStartIndex()), 0));
+	}
+	std::vector<uint8_t> pixels;
+	ASSERT_TRUE(Gpu::ReadRenderTarget(context, *engine->GetBackBufferView(), pixels));
+	Gpu::SavePng("/tmp/al/lit_quad.png", size, size, pixels.data());
+
+	const float lambert = 0.8f;
+	const float lightRgb[3] = {lightColor.x, lightColor.y, lightColor.z};
+	const size_t centre = (static_cast<size_t>(size / 2) * size + size / 2) * 4;
+	const size_t corner = 0;
+	for (size_t channel = 0; channel < 3; ++channel)
+	{
+		const float lit = static_cast<float>(albedo[channel]) / 255.0f * lightRgb[channel] * lambert;
+		EXPECT_NEAR(pixels[centre + channel], ToSrgbByte(lit), 2) << "quad centre, channel " << channel;
+		EXPECT_NEAR(pixels[corner + channel], ToSrgbByte(ourClearColor[channel]), 1) << "outside the quad";
+	}
+}
