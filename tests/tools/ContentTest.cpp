@@ -1,0 +1,470 @@
+// The sample-content generator: two runs give the same bytes; every document is well formed, has
+// the sources of the lit vertex layout with consistent counts and proper tangent frames, and binds
+// textures that exist with full mip chains; normal maps lean away from rising height; and the
+// committed files under data/ are what the generator writes now.
+
+#include <gtest/gtest.h>
+#include <tinyxml.h>
+
+#include <algorithm>
+#include <cmath>
+#include <filesystem>
+#include <map>
+#include <set>
+#include <sstream>
+#include <string>
+#include <vector>
+
+#include "Generator.h"
+#include "platform/collada/Document.h"
+#include "platform/dds/DdsFile.h"
+#include "platform/dds/Format.h"
+#include "support/TestSupport.h"
+
+namespace
+{
+struct Vec
+{
+	double x, y, z;
+};
+
+Vec Read(const Collada::Source& aSource, uint32_t anIndex)
+{
+	const float* value = aSource.Element(anIndex);
+	return value ? Vec{value[0], value[1], value[2]} : Vec{0.0, 0.0, 0.0};
+}
+
+Vec Sub(const Vec& aLeft, const Vec& aRight)
+{
+	return {aLeft.x - aRight.x, aLeft.y - aRight.y, aLeft.z - aRight.z};
+}
+
+Vec Scale(const Vec& aVector, double aFactor)
+{
+	return {aVector.x * aFactor, aVector.y * aFactor, aVector.z * aFactor};
+}
+
+double Dot(const Vec& aLeft, const Vec& aRight)
+{
+	return aLeft.x * aRight.x + aLeft.y * aRight.y + aLeft.z * aRight.z;
+}
+
+Vec Cross(const Vec& aLeft, const Vec& aRight)
+{
+	return {aLeft.y * aRight.z - aLeft.z * aRight.y, aLeft.z * aRight.x - aLeft.x * aRight.z,
+	        aLeft.x * aRight.y - aLeft.y * aRight.x};
+}
+
+// Generates into a scratch directory once per test binary; the files are read many times.
+class GeneratedContent
+{
+public:
+	static const GeneratedContent& Get()
+	{
+		static const GeneratedContent ourContent;
+		return ourContent;
+	}
+
+	std::string Path(const std::string& aRelative) const { return myScratch.File(aRelative); }
+	const std::vector<std::string>& Files() const { return myFiles; }
+	const std::string& Error() const { return myError; }
+	std::vector<std::string> Documents() const
+	{
+		std::vector<std::string> documents;
+		std::copy_if(myFiles.begin(), myFiles.end(), std::back_inserter(documents),
+		             [](const std::string& aFile) { return aFile.ends_with(".dae"); });
+		return documents;
+	}
+
+private:
+	GeneratedContent()
+	{
+		if (!Content::Generate(myScratch.Path().string(), myFiles, myError) && myError.empty())
+		{
+			myError = "generation failed without a message";
+		}
+	}
+
+	TestSupport::ScratchDir myScratch;
+	std::vector<std::string> myFiles;
+	std::string myError;
+};
+
+// Counts the numbers of a whitespace-separated list.
+size_t CountTokens(const char* aText)
+{
+	std::istringstream stream(aText ? aText : "");
+	std::string token;
+	size_t count = 0;
+	while (stream >> token)
+	{
+		++count;
+	}
+	return count;
+}
+
+std::vector<long> ReadIntegers(const char* aText)
+{
+	std::istringstream stream(aText ? aText : "");
+	std::vector<long> values;
+	long value = 0;
+	while (stream >> value)
+	{
+		values.push_back(value);
+	}
+	return values;
+}
+
+// Checks the raw text of one document: every source's accessor covers its array exactly, and
+// every <p> index at an input's offset lies inside that input's source.
+void CheckRawDocument(const std::string& aPath, const std::string& aName)
+{
+	TiXmlDocument xml;
+	ASSERT_TRUE(xml.LoadFile(aPath.c_str())) << aName << ": " << xml.ErrorDesc();
+	const TiXmlElement* mesh = TiXmlHandle(xml.RootElement())
+	                               .FirstChild("library_geometries")
+	                               .FirstChild("geometry")
+	                               .FirstChild("mesh")
+	                               .ToElement();
+	ASSERT_NE(mesh, nullptr) << aName;
+	std::map<std::string, int> elementCounts; // "#id" -> accessor count
+	for (const TiXmlElement* source = mesh->FirstChildElement("source"); source;
+	     source = source->NextSiblingElement("source"))
+	{
+		const TiXmlElement* array = source->FirstChildElement("float_array");
+		const TiXmlElement* accessor = TiXmlHandle(const_cast<TiXmlElement*>(source))
+		                                   .FirstChild("technique_common")
+		                                   .FirstChild("accessor")
+		                                   .ToElement();
+		ASSERT_TRUE(array && accessor) << aName << ": " << source->Attribute("id");
+		int arrayCount = -1, count = -1, stride = -1;
+		array->QueryIntAttribute("count", &arrayCount);
+		accessor->QueryIntAttribute("count", &count);
+		accessor->QueryIntAttribute("stride", &stride);
+		EXPECT_EQ(size_t(arrayCount), CountTokens(array->GetText()))
+		    << aName << ": " << source->Attribute("id");
+		EXPECT_EQ(count * stride, arrayCount) << aName << ": " << source->Attribute("id");
+		elementCounts[std::string("#") + source->Attribute("id")] = count;
+	}
+	const TiXmlElement* vertices = mesh->FirstChildElement("vertices");
+	ASSERT_NE(vertices, nullptr) << aName;
+	const TiXmlElement* position = vertices->FirstChildElement("input");
+	ASSERT_TRUE(position && std::string(position->Attribute("semantic")) == "POSITION") << aName;
+	elementCounts[std::string("#") + vertices->Attribute("id")] =
+	    elementCounts[position->Attribute("source")];
+
+	for (const TiXmlElement* set = mesh->FirstChildElement(); set; set = set->NextSiblingElement())
+	{
+		const std::string kind = set->Value();
+		if (kind != "triangles" && kind != "polylist")
+		{
+			continue;
+		}
+		std::vector<std::pair<int, int>> inputs; // offset, element count of the source
+		int stride = 0;
+		for (const TiXmlElement* input = set->FirstChildElement("input"); input;
+		     input = input->NextSiblingElement("input"))
+		{
+			int offset = 0;
+			input->QueryIntAttribute("offset", &offset);
+			ASSERT_EQ(elementCounts.count(input->Attribute("source")), 1u)
+			    << aName << ": " << input->Attribute("source");
+			inputs.push_back({offset, elementCounts[input->Attribute("source")]});
+			stride = std::max(stride, offset + 1);
+		}
+		const std::vector<long> indices = ReadIntegers(set->FirstChildElement("p")->GetText());
+		int faces = 0;
+		set->QueryIntAttribute("count", &faces);
+		size_t corners = size_t(faces) * 3;
+		if (kind == "polylist")
+		{
+			const std::vector<long> counts = ReadIntegers(set->FirstChildElement("vcount")->GetText());
+			EXPECT_EQ(counts.size(), size_t(faces)) << aName;
+			corners = 0;
+			for (const long count : counts)
+			{
+				corners += size_t(count);
+			}
+		}
+		ASSERT_EQ(indices.size(), corners * stride) << aName << ": " << kind;
+		for (size_t at = 0; at < indices.size(); ++at)
+		{
+			for (const auto& [offset, count] : inputs)
+			{
+				if (int(at % stride) == offset)
+				{
+					ASSERT_TRUE(indices[at] >= 0 && indices[at] < count) << aName << ": index " << at;
+				}
+			}
+		}
+	}
+}
+
+// The texture file an image path of a document names, inside the generated directory.
+std::string GeneratedFileFor(const std::string& anImagePath)
+{
+	EXPECT_TRUE(anImagePath.starts_with("data/textures/")) << anImagePath;
+	return GeneratedContent::Get().Path(anImagePath.substr(std::string("data/").size()));
+}
+
+void CheckTexture(const std::string& anImagePath, bool anSrgbFlag)
+{
+	Dds::Image image;
+	std::string error;
+	ASSERT_TRUE(Dds::LoadFromFile(GeneratedFileFor(anImagePath), image, error)) << error;
+	const Dds::ImageInfo& info = image.Info();
+	uint32_t fullChain = 1;
+	while ((std::max(info.myWidth, info.myHeight) >> fullChain) > 0)
+	{
+		++fullChain;
+	}
+	EXPECT_EQ(info.myMipLevels, fullChain) << anImagePath;
+	EXPECT_GE(info.myWidth, 128u) << anImagePath;
+	EXPECT_EQ(Dds::IsSRGB(info.myFormat), anSrgbFlag) << anImagePath;
+	EXPECT_EQ(Dds::BlockBytes(info.myFormat), 4u) << anImagePath;
+}
+} // namespace
+
+TEST(ContentGeneratorTest, TwoRunsWriteTheSameBytes)
+{
+	const GeneratedContent& first = GeneratedContent::Get();
+	ASSERT_EQ(first.Error(), "");
+	TestSupport::ScratchDir second;
+	std::vector<std::string> files;
+	std::string error;
+	ASSERT_TRUE(Content::Generate(second.Path().string(), files, error)) << error;
+	ASSERT_EQ(files, first.Files());
+	EXPECT_FALSE(first.Documents().empty());
+	uint64_t bytes = 0;
+	for (const std::string& file : files)
+	{
+		const std::string written = TestSupport::ReadWholeFile(second.File(file));
+		EXPECT_FALSE(written.empty()) << file;
+		EXPECT_TRUE(written == TestSupport::ReadWholeFile(first.Path(file)))
+		    << file << " differs between runs";
+		bytes += written.size();
+	}
+	// The content is committed; it must stay small.
+	EXPECT_LT(bytes, 6u * 1024 * 1024);
+}
+
+TEST(ContentDocumentTest, EveryDocumentHasConsistentSourcesAndIndices)
+{
+	ASSERT_EQ(GeneratedContent::Get().Error(), "");
+	for (const std::string& document : GeneratedContent::Get().Documents())
+	{
+		CheckRawDocument(GeneratedContent::Get().Path(document), document);
+	}
+}
+
+TEST(ContentDocumentTest, EveryMeshHasTheLitLayoutWithOrthonormalRightHandedTangentFrames)
+{
+	ASSERT_EQ(GeneratedContent::Get().Error(), "");
+	bool quadsSeen = false;
+	bool twoMaterialsSeen = false;
+	for (const std::string& name : GeneratedContent::Get().Documents())
+	{
+		Collada::Document document;
+		std::string error;
+		ASSERT_TRUE(document.Load(GeneratedContent::Get().Path(name), error)) << error;
+		EXPECT_EQ(document.GetAsset().myUpAxis, "Y_UP") << name;
+		EXPECT_EQ(document.GetAsset().myUnitMeter, 1.0f) << name;
+		ASSERT_EQ(document.GetGeometries().size(), 1u) << name;
+		Collada::Mesh mesh = document.GetGeometries()[0].myMesh;
+		quadsSeen = quadsSeen || !mesh.IsTriangles();
+		std::set<std::string> symbols;
+		for (const Collada::PolygonSet& set : mesh.mySets)
+		{
+			symbols.insert(set.myMaterial);
+		}
+		twoMaterialsSeen = twoMaterialsSeen || symbols.size() >= 2;
+		mesh.Triangulate();
+		for (const Collada::PolygonSet& set : mesh.mySets)
+		{
+			// Exactly the inputs of POSITION, NORMAL, TEXCOORD, TANGENT, BINORMAL and nothing else.
+			std::multiset<Collada::Semantic> semantics;
+			for (const Collada::Input& input : set.myInputs)
+			{
+				semantics.insert(input.mySemantic);
+			}
+			EXPECT_EQ(semantics,
+			          (std::multiset<Collada::Semantic>{
+			              Collada::Semantic::Position, Collada::Semantic::Normal, Collada::Semantic::TexCoord,
+			              Collada::Semantic::TexTangent, Collada::Semantic::TexBinormal}))
+			    << name << ": " << set.myMaterial;
+			const Collada::Input* inputs[5] = {set.FindInput(Collada::Semantic::Position),
+			                                   set.FindInput(Collada::Semantic::Normal),
+			                                   set.FindInput(Collada::Semantic::TexCoord, 0),
+			                                   set.FindInput(Collada::Semantic::TexTangent, 0),
+			                                   set.FindInput(Collada::Semantic::TexBinormal, 0)};
+			if (std::find(std::begin(inputs), std::end(inputs), nullptr) != std::end(inputs))
+			{
+				ADD_FAILURE() << name << ": a set lacks an input of set 0";
+				continue;
+			}
+			const Collada::Source* sources[5] = {};
+			for (int at = 0; at < 5; ++at)
+			{
+				sources[at] = mesh.FindSource(inputs[at]->mySource);
+				ASSERT_NE(sources[at], nullptr) << name;
+			}
+			int failures = 0;
+			for (size_t corner = 0; corner + 2 < set.GetCornerCount() && failures < 5; corner += 3)
+			{
+				Vec position[3], normal[3], tangent[3], binormal[3];
+				double u[3], v[3];
+				for (int k = 0; k < 3; ++k)
+				{
+					position[k] = Read(*sources[0], inputs[0]->myIndices[corner + k]);
+					normal[k] = Read(*sources[1], inputs[1]->myIndices[corner + k]);
+					const float* uv = sources[2]->Element(inputs[2]->myIndices[corner + k]);
+					u[k] = uv[0];
+					v[k] = uv[1];
+					tangent[k] = Read(*sources[3], inputs[3]->myIndices[corner + k]);
+					binormal[k] = Read(*sources[4], inputs[4]->myIndices[corner + k]);
+					const Vec& n = normal[k];
+					const Vec& t = tangent[k];
+					const Vec& b = binormal[k];
+					const bool unit = std::abs(Dot(n, n) - 1.0) < 1e-3 && std::abs(Dot(t, t) - 1.0) < 1e-3 &&
+					                  std::abs(Dot(b, b) - 1.0) < 1e-3;
+					const bool orthogonal = std::abs(Dot(n, t)) < 1e-3 && std::abs(Dot(n, b)) < 1e-3 &&
+					                        std::abs(Dot(t, b)) < 1e-3;
+					const bool rightHanded = Dot(Cross(t, b), n) > 0.99;
+					if (!unit || !orthogonal || !rightHanded)
+					{
+						++failures;
+						ADD_FAILURE() << name << ": corner " << corner + k << " unit " << unit
+						              << " orthogonal " << orthogonal << " right-handed " << rightHanded;
+					}
+				}
+				// The face winds counter-clockwise around its normals, and the frame follows the
+				// texture: the tangent along +u and the binormal along +v over this triangle.
+				const Vec edge1 = Sub(position[1], position[0]);
+				const Vec edge2 = Sub(position[2], position[0]);
+				const Vec faceNormal = Cross(edge1, edge2);
+				const double du1 = u[1] - u[0], dv1 = v[1] - v[0], du2 = u[2] - u[0], dv2 = v[2] - v[0];
+				const double determinant = du1 * dv2 - du2 * dv1;
+				if (Dot(faceNormal, faceNormal) < 1e-12 || std::abs(determinant) < 1e-9)
+				{
+					continue;
+				}
+				const Vec alongU = Scale(Sub(Scale(edge1, dv2), Scale(edge2, dv1)), 1.0 / determinant);
+				const Vec alongV = Scale(Sub(Scale(edge2, du1), Scale(edge1, du2)), 1.0 / determinant);
+				for (int k = 0; k < 3; ++k)
+				{
+					if (Dot(faceNormal, normal[k]) <= 0.0 || Dot(alongU, tangent[k]) <= 0.0 ||
+					    Dot(alongV, binormal[k]) <= 0.0)
+					{
+						++failures;
+						ADD_FAILURE()
+						    << name << ": triangle at corner " << corner << " winds against its normal"
+						    << " or its frame against its texture coordinates";
+						break;
+					}
+				}
+			}
+		}
+	}
+	EXPECT_TRUE(quadsSeen) << "no document has a polylist of quads";
+	EXPECT_TRUE(twoMaterialsSeen) << "no document has two materials";
+}
+
+TEST(ContentDocumentTest, EveryMaterialBindsExistingTexturesWithFullMipChains)
+{
+	ASSERT_EQ(GeneratedContent::Get().Error(), "");
+	for (const std::string& name : GeneratedContent::Get().Documents())
+	{
+		Collada::Document document;
+		std::string error;
+		ASSERT_TRUE(document.Load(GeneratedContent::Get().Path(name), error)) << error;
+		ASSERT_NE(document.GetVisualScene(), nullptr) << name;
+		ASSERT_EQ(document.GetVisualScene()->myNodes.size(), 1u) << name;
+		const Collada::Node& node = *document.GetVisualScene()->myNodes[0];
+		ASSERT_EQ(node.myInstances.size(), 1u) << name;
+		const Collada::Geometry* geometry = document.FindGeometry(node.myInstances[0].myUrl);
+		ASSERT_NE(geometry, nullptr) << name;
+		for (const Collada::PolygonSet& set : geometry->myMesh.mySets)
+		{
+			const Collada::InstanceMaterial* binding = node.myInstances[0].FindMaterial(set.myMaterial);
+			ASSERT_NE(binding, nullptr) << name << ": " << set.myMaterial;
+			const Collada::Material* material = document.FindMaterial(binding->myTarget);
+			ASSERT_NE(material, nullptr) << name << ": " << binding->myTarget;
+			const Collada::Effect* effect = document.FindEffect(material->myEffect);
+			ASSERT_NE(effect, nullptr) << name << ": " << material->myEffect;
+			EXPECT_EQ(effect->myShading, Collada::Shading::Phong) << name;
+			// The channels the importer binds, each with the colour space it binds the texture in
+			// (sRGB for all but the normal map), which the file's format must declare.
+			const std::pair<const Collada::Channel*, bool> channels[] = {{&effect->myDiffuse, true},
+			                                                             {&effect->myBump, false},
+			                                                             {&effect->mySpecular, true},
+			                                                             {&effect->myAmbient, true}};
+			std::set<std::string> paths;
+			for (const auto& [channel, srgb] : channels)
+			{
+				ASSERT_TRUE(channel->myHasTextureFlag) << name << ": " << effect->myId;
+				const Collada::Image* image = document.FindImage(channel->myImage);
+				ASSERT_NE(image, nullptr) << name << ": " << channel->myImage;
+				paths.insert(image->myPath);
+				CheckTexture(image->myPath, srgb);
+			}
+			EXPECT_EQ(paths.size(), 4u) << name << ": the four channels share a texture";
+		}
+	}
+}
+
+TEST(ContentTextureTest, NormalMapsLeanAwayFromRisingHeight)
+{
+	ASSERT_EQ(GeneratedContent::Get().Error(), "");
+	int normalMaps = 0;
+	for (const std::string& file : GeneratedContent::Get().Files())
+	{
+		if (!file.ends_with("_normal.dds"))
+		{
+			continue;
+		}
+		++normalMaps;
+		Dds::Image image;
+		std::string error;
+		ASSERT_TRUE(Dds::LoadFromFile(GeneratedContent::Get().Path(file), image, error)) << error;
+		const uint32_t size = image.Info().myWidth;
+		const uint8_t* texels = image.Data(0, 0);
+		auto at = [&](uint32_t anX, uint32_t anY, int aChannel) {
+			return double(texels[(size_t(anY % size) * size + anX % size) * 4 + aChannel]);
+		};
+		// Alpha holds the height. Rising to the right must tilt x negative; rising down the image
+		// (v falls there) must tilt y positive.
+		double alongX = 0.0;
+		double alongRows = 0.0;
+		for (uint32_t y = 0; y < size; ++y)
+		{
+			for (uint32_t x = 0; x < size; ++x)
+			{
+				alongX += (at(x, y, 0) - 127.5) * (at(x + 1, y, 3) - at(x + size - 1, y, 3));
+				alongRows += (at(x, y, 1) - 127.5) * (at(x, y + 1, 3) - at(x, y + size - 1, 3));
+			}
+		}
+		EXPECT_LT(alongX, 0.0) << file;
+		EXPECT_GT(alongRows, 0.0) << file;
+	}
+	EXPECT_GT(normalMaps, 0);
+}
+
+TEST(ContentStalenessTest, CommittedDataMatchesTheGenerator)
+{
+	ASSERT_EQ(GeneratedContent::Get().Error(), "");
+	const char* const howTo =
+	    "regenerate with `lumora-content` from the repository root "
+	    "(build/tools/lumora-content/lumora-content writes data/models and data/textures)";
+	for (const std::string& file : GeneratedContent::Get().Files())
+	{
+		const std::string committed = "data/" + file;
+		if (!std::filesystem::exists(committed))
+		{
+			ADD_FAILURE() << committed << " is missing: " << howTo;
+			continue;
+		}
+		EXPECT_TRUE(TestSupport::ReadWholeFile(committed) ==
+		            TestSupport::ReadWholeFile(GeneratedContent::Get().Path(file)))
+		    << committed << " is stale: " << howTo;
+	}
+}

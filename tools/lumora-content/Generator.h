@@ -1,0 +1,20 @@
+#pragma once
+// Generator: writes the whole sample content, models and textures, under one output directory.
+//
+//   std::vector<std::string> written;
+//   std::string error;
+//   if (!Content::Generate("data", written, error)) { print(error); }
+//   // written: "models/arch.dae", ..., "textures/wood_roughness.dds", relative to the directory
+//
+// The output depends on nothing but this code: the same bytes on every run. Documents name their
+// textures by the engine path "data/textures/...", whatever the output directory, because the
+// engine opens them relative to its working directory.
+
+#include <string>
+#include <vector>
+
+namespace Content
+{
+bool Generate(const std::string& anOutDirectory, std::vector<std::string>& someWrittenOut,
+              std::string& anErrorOut);
+} // namespace Content
