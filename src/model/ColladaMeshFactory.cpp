@@ -11,9 +11,11 @@
 #include "engine/FI_File.h"
 #include "engine/ShaderFiles.h"
 #include "model/AlFile.h"
+#include "model/ColladaImport.h"
 #include "model/Model.h"
 #include "model/ModelNode.h"
 #include "model/Surface.h"
+#include "platform/collada/Document.h"
 #include "platform/paths/Paths.h"
 
 namespace Zeph
@@ -21,6 +23,7 @@ namespace Zeph
 namespace
 {
 constexpr const char* ourReadFunction = "Zeph::ColladaMeshFactory::CreateModelNodeAL";
+constexpr const char* ourImportFunction = "Zeph::ColladaMeshFactory::CreateModelNodeDAE";
 constexpr const char* ourWriteFunction = "Zeph::ColladaMeshFactory::SaveModelNodeAL";
 constexpr int ourOpenFailedLine = 86;
 
@@ -55,6 +58,23 @@ void SetNodeEffects(ModelNode& aNode, EffectContainer& anEffects)
 	}
 }
 
+// Each node's model with its child models: buffers and the technique pointers.
+bool InitNodeBuffers(ModelNode& aNode)
+{
+	if (aNode.GetModel() != nullptr && !aNode.GetModel()->Init())
+	{
+		return false;
+	}
+	for (ModelNode* child : aNode.GetChildren())
+	{
+		if (!InitNodeBuffers(*child))
+		{
+			return false;
+		}
+	}
+	return true;
+}
+
 // Each node's model with its child models: buffers, then the technique read from
 // the file, which technique selection passes down to the child models.
 bool InitNodeModels(ModelNode& aNode)
@@ -79,6 +99,44 @@ bool InitNodeModels(ModelNode& aNode)
 	return true;
 }
 } // namespace
+
+ModelNode* ColladaMeshFactory::CreateModelNodeDAE(const std::string& aFileName)
+{
+	std::unique_ptr<ModelNode> root;
+	std::vector<AlTextureBinding> bindings;
+	std::string error;
+	{
+		// The document is only needed while converting: it goes before the GPU work.
+		Collada::Document document;
+		if (document.Load(aFileName, error))
+		{
+			root = ColladaImport::Convert(document, bindings, error);
+		}
+	}
+	if (!root)
+	{
+		ReportDebug(__LINE__, ourImportFunction, "%s: %s", aFileName.c_str(), error.c_str());
+		return nullptr;
+	}
+	Engine* engine = Engine::GetInstance();
+	if (engine == nullptr)
+	{
+		ReportCritical(__LINE__, ourImportFunction, "No engine to load %s with", aFileName.c_str());
+		return nullptr;
+	}
+	SetNodeEffects(*root, engine->GetEffectContainer());
+	// A texture that is missing, or a variable the effect lacks, is reported and left unbound.
+	for (const AlTextureBinding& binding : bindings)
+	{
+		binding.myModel->GetSurfaces()[binding.mySurface].SetTexture(binding.myPath, binding.myVariableName,
+		                                                             binding.mySRGBFlag);
+	}
+	if (!InitNodeBuffers(*root))
+	{
+		return nullptr;
+	}
+	return root.release();
+}
 
 ModelNode* ColladaMeshFactory::CreateModelNodeAL(const std::string& aFileName)
 {

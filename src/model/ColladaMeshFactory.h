@@ -1,8 +1,8 @@
 #pragma once
-// ColladaMeshFactory: turns model files into model trees ready to draw. This part
-// reads and writes the engine's binary model files (".al"); the COLLADA import
-// joins it later.
+// ColladaMeshFactory: turns model files into model trees ready to draw: COLLADA
+// documents (".dae") and the engine's binary model files (".al"), which it also writes.
 //
+//   Zeph::ModelNode* scene = Zeph::ColladaMeshFactory::CreateModelNodeDAE("data/models/crate.dae");
 //   Zeph::ModelNode* tree = Zeph::ColladaMeshFactory::CreateModelNodeAL("data/models/crate.al");
 //   if (tree != nullptr) { ... the caller owns it ... }
 //   Zeph::ColladaMeshFactory::SaveModelNodeAL(*tree, "data/models/copy.al");
@@ -18,6 +18,12 @@ class ModelNode;
 class ColladaMeshFactory
 {
 public:
+	// The tree of a COLLADA document (see ColladaImport.h for what it holds), with
+	// effects, textures and buffers; null when the document does not load, a model's
+	// layout is none of the vertex types (the reason goes to the log as a debug
+	// message, the caller reports the failure) or a model's buffers cannot be made.
+	// The caller owns the tree and selects its technique.
+	static ModelNode* CreateModelNodeDAE(const std::string& aFileName);
 	// The tree of an ".al" file; null after a report when the file cannot be opened,
 	// is damaged, or a model's buffers cannot be made. The caller owns the tree.
 	static ModelNode* CreateModelNodeAL(const std::string& aFileName);

@@ -96,9 +96,11 @@ ModelNode* ModelFactory::LoadModel(const std::string& aName)
 	ModelNode* tree = nullptr;
 	if (extension == ".dae")
 	{
-		// The COLLADA importer is not part of the engine yet: until it is, a ".dae"
-		// file yields no tree and is reported as a failed import below. With it, the
-		// imported tree gets SetTechniqueByName("Render") here.
+		tree = ColladaMeshFactory::CreateModelNodeDAE(aName);
+		if (tree != nullptr)
+		{
+			tree->SetTechniqueByName("Render");
+		}
 	}
 	else if (extension == ".al")
 	{

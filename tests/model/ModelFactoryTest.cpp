@@ -110,9 +110,9 @@ TEST_F(ModelFactoryTest, UnknownNamesReportAndFallBack)
 	// A failed load stores nothing: the second request fails (and reports) again.
 	for (int attempt = 0; attempt < 2; ++attempt)
 	{
-		EXPECT_EQ(factory.GetModel("data/models/crate.dae"), nullptr);
+		EXPECT_EQ(factory.GetModel("data/models/missing.dae"), nullptr);
 		log = TakeLog();
-		EXPECT_NE(log.find("Couldn't load Model: data/models/crate.dae"), std::string::npos) << log;
+		EXPECT_NE(log.find("Couldn't load Model: data/models/missing.dae"), std::string::npos) << log;
 		EXPECT_NE(log.find("Zeph::ModelFactory::LoadModel"), std::string::npos) << log;
 	}
 	EXPECT_EQ(factory.GetCount(), 0u);

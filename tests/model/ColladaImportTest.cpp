@@ -1,0 +1,465 @@
+// Importing COLLADA documents through the model factory with a GPU: the exporters'
+// documents give the trees they declare or are rejected, and small hand-written
+// documents pin the vertex numbering, the winding, the texture coordinates, the
+// mirror at the root, the skin words, cameras, lights and material textures.
+#include <cmath>
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <gtest/gtest.h>
+#include <numbers>
+#include <vector>
+
+#include "engine/Camera.h"
+#include "engine/EngineFixture.h"
+#include "model/ColladaMeshFactory.h"
+#include "model/Model.h"
+#include "model/ModelFactory.h"
+#include "model/ModelLight.h"
+#include "model/ModelNode.h"
+#include "model/TransformationNode.h"
+#include "model/VertexTypes.h"
+#include "platform/dds/DdsFile.h"
+
+namespace
+{
+struct FoundModel
+{
+	std::string myNode;
+	const Zeph::Model* myModel;
+};
+
+struct TreeContents
+{
+	std::vector<FoundModel> myModels;
+	std::vector<const Zeph::ModelNode*> myCameras;
+	std::vector<const Zeph::ModelNode*> myLights;
+};
+
+void Collect(const Zeph::ModelNode& aNode, TreeContents& someContents)
+{
+	if (aNode.GetModel() != nullptr)
+	{
+		someContents.myModels.push_back({aNode.GetName(), aNode.GetModel()});
+	}
+	if (aNode.GetCamera() != nullptr)
+	{
+		someContents.myCameras.push_back(&aNode);
+	}
+	if (aNode.GetLight() != nullptr)
+	{
+		someContents.myLights.push_back(&aNode);
+	}
+	for (const Zeph::ModelNode* child : aNode.GetChildren())
+	{
+		Collect(*child, someContents);
+	}
+}
+
+std::vector<uint32_t> Indices(const Zeph::Model& aModel)
+{
+	std::vector<uint32_t> indices(aModel.GetIndexData().size() / 4);
+	std::memcpy(indices.data(), aModel.GetIndexData().data(), indices.size() * 4);
+	return indices;
+}
+
+template <typename T> T VertexValue(const Zeph::Model& aModel, int aVertex, int anOffset)
+{
+	T value{};
+	const size_t at = static_cast<size_t>(aVertex * aModel.GetVertexStride() + anOffset);
+	EXPECT_LE(at + sizeof(T), aModel.GetVertexData().size());
+	if (at + sizeof(T) <= aModel.GetVertexData().size())
+	{
+		std::memcpy(&value, aModel.GetVertexData().data() + at, sizeof(T));
+	}
+	return value;
+}
+
+class ColladaImportTest : public EngineTest
+{
+protected:
+	std::string WriteDocument(const std::string& aName, const std::string& aText)
+	{
+		const std::string path = myScratch.File(aName);
+		std::ofstream(path) << aText;
+		return path;
+	}
+
+	std::string WriteTexture(const std::string& aName)
+	{
+		Dds::ImageInfo info;
+		info.myWidth = 4;
+		info.myHeight = 4;
+		info.myDepth = 1;
+		info.myArraySize = 1;
+		info.myMipLevels = 1;
+		info.myFormat = Dds::Format::R8G8B8A8_UNORM;
+		info.myResourceDimension = Dds::ResourceDimension::Texture2D;
+		Dds::Image image;
+		std::string error;
+		EXPECT_TRUE(image.Init(info, error)) << error;
+		const std::string path = myScratch.File(aName);
+		EXPECT_TRUE(Dds::SaveToFile(path, image, error)) << error;
+		return path;
+	}
+};
+
+// A geometry "g" whose inputs are listed in aSetInputs (VERTEX at offset 0) and
+// whose sources are aSources; nodes and the rest go into the scene and libraries.
+std::string Document(const std::string& aSources, const std::string& aSets, const std::string& aLibraries,
+                     const std::string& aNodes)
+{
+	return R"(<COLLADA version="1.4.1"><library_geometries><geometry id="g"><mesh>)" + aSources +
+	       R"(<vertices id="v"><input semantic="POSITION" source="#p"/></vertices>)" + aSets +
+	       "</mesh></geometry></library_geometries>" + aLibraries +
+	       R"(<library_visual_scenes><visual_scene id="s">)" + aNodes +
+	       R"(</visual_scene></library_visual_scenes><scene><instance_visual_scene url="#s"/></scene></COLLADA>)";
+}
+
+std::string Source(const std::string& anId, int aStride, const std::string& someValues)
+{
+	int count = 0;
+	for (size_t at = 0; at < someValues.size();)
+	{
+		const size_t next = someValues.find_first_not_of(' ', at);
+		if (next == std::string::npos)
+		{
+			break;
+		}
+		++count;
+		at = someValues.find(' ', next);
+	}
+	return "<source id=\"" + anId + "\"><float_array id=\"" + anId + "a\" count=\"" + std::to_string(count) +
+	       "\">" + someValues + "</float_array><technique_common><accessor source=\"#" + anId +
+	       "a\" count=\"" + std::to_string(count / aStride) + "\" stride=\"" + std::to_string(aStride) +
+	       "\"/></technique_common></source>";
+}
+} // namespace
+
+TEST_F(ColladaImportTest, ExportersDocumentsImportAsDeclaredOrAreRejected)
+{
+	if (!CreateEngine(64, 64))
+	{
+		return;
+	}
+	struct ExpectedModel
+	{
+		const char* myNode;
+		int myVertexType;
+		int myVertexCount; // distinct corner keys
+		int myIndexCount;  // corners after triangulation
+		std::vector<int> mySurfaces;
+	};
+	struct ExpectedDocument
+	{
+		const char* myFile;
+		bool myRejectedFlag;
+		std::vector<ExpectedModel> myModels;
+		size_t myCameras;
+		size_t myLights;
+	};
+	const ExpectedDocument documents[] = {
+	    // One polylist of 400 quads and 40 cap triangles (760 triangles) on 382 positions;
+	    // seams and poles give 401 distinct position/normal/uv corners. Type 2.
+	    {"sphere.dae", false, {{"pSphere1", 2, 401, 2280, {2280}}}, 0, 0},
+	    // Three nodes with one triangle set each: cone 756 triangles, sphere 528, cube 12
+	    // (24 corners: 4 per face). All position, normal, uv: type 2.
+	    {"Cinema4D.dae",
+	     false,
+	     {{"Kegel", 2, 433, 2268, {2268}},
+	      {"Kugel", 2, 266, 1584, {1584}},
+	      {"W\xC3\xBCrfel", 2, 24, 36, {36}}},
+	     0,
+	     0},
+	    // A skinned cube (the controller under "Armature"; the bone is a joint, not a
+	    // node of the tree): 12 triangles, no corner shared; position, weights, bones,
+	    // normal, uv is type 7.
+	    {"box_nested_animation.dae", false, {{"Cube", 7, 36, 36, {36}}}, 0, 0},
+	    // Three camera nodes, no geometry.
+	    {"cameras.dae", false, {}, 3, 0},
+	    // Lamp and Area are point lights, Sun directional, Spot a spot (a point record);
+	    // Hemi is ambient and gives no record.
+	    {"lights.dae", false, {}, 0, 4},
+	    // Position only: no vertex type.
+	    {"ConcavePolygon.dae", true, {}, 0, 0},
+	    // Position and normal, no uv: no vertex type.
+	    {"cube_tristrips.dae", true, {}, 0, 0},
+	    // Position, normal, colour and uv: four elements, but row 3 wants a tangent.
+	    {"kwxport_test_vcolors.dae", true, {}, 0, 0},
+	    // Teapot01 and 02 have uvs, Teapot03 only position and normal: the document is rejected.
+	    {"teapots.DAE", true, {}, 0, 0},
+	};
+	Zeph::ModelFactory& factory = Zeph::Engine::GetInstance()->GetModelFactory();
+	for (const ExpectedDocument& expected : documents)
+	{
+		SCOPED_TRACE(expected.myFile);
+		std::string path = std::string("../shared/testdata/collada/") + expected.myFile;
+		if (path.ends_with(".DAE"))
+		{
+			// The factory goes by the lower-case extension.
+			const std::string copy = myScratch.File("teapots.dae");
+			std::filesystem::copy_file(path, copy);
+			path = copy;
+		}
+		const Zeph::ModelNode* tree = factory.GetModel(path);
+		const std::string log = TakeLog();
+		if (expected.myRejectedFlag)
+		{
+			EXPECT_EQ(tree, nullptr);
+			EXPECT_NE(log.find("Couldn't load Model: " + path), std::string::npos) << log;
+			EXPECT_NE(log.find("no vertex type has the layout"), std::string::npos) << log;
+			continue;
+		}
+		ASSERT_NE(tree, nullptr) << log;
+		EXPECT_EQ(log.find("CRITICAL"), std::string::npos) << log;
+		TreeContents contents;
+		Collect(*tree, contents);
+		EXPECT_EQ(contents.myCameras.size(), expected.myCameras);
+		EXPECT_EQ(contents.myLights.size(), expected.myLights);
+		ASSERT_EQ(contents.myModels.size(), expected.myModels.size());
+		for (size_t index = 0; index < expected.myModels.size(); ++index)
+		{
+			const ExpectedModel& model = expected.myModels[index];
+			const Zeph::Model& actual = *contents.myModels[index].myModel;
+			SCOPED_TRACE(model.myNode);
+			EXPECT_EQ(contents.myModels[index].myNode, model.myNode);
+			EXPECT_EQ(actual.GetVertexType(), model.myVertexType);
+			EXPECT_EQ(actual.GetVertexStride(), Zeph::GetVertexTypeStride(model.myVertexType));
+			EXPECT_EQ(actual.GetVertexCount(), model.myVertexCount);
+			EXPECT_EQ(actual.GetIndexCount(), model.myIndexCount);
+			ASSERT_EQ(actual.GetSurfaces().Count(), static_cast<int>(model.mySurfaces.size()));
+			for (int surface = 0; surface < actual.GetSurfaces().Count(); ++surface)
+			{
+				EXPECT_EQ(actual.GetSurfaces()[surface].GetIndexCount(), model.mySurfaces[surface]);
+			}
+			for (uint32_t index : Indices(actual))
+			{
+				ASSERT_LT(index, static_cast<uint32_t>(actual.GetVertexCount()));
+			}
+			EXPECT_NE(actual.GetRenderTechnique(), nullptr);
+			EXPECT_EQ(actual.GetTechniqueName(), "Render");
+		}
+	}
+}
+
+TEST_F(ColladaImportTest, CornersWindingUvsMirrorCameraLightAndTexturesOfALitQuad)
+{
+	if (!CreateEngine(64, 64))
+	{
+		return;
+	}
+	const std::string images[5] = {WriteTexture("reflective.dds"), WriteTexture("diffuse.dds"),
+	                               WriteTexture("bump.dds"), WriteTexture("specular.dds"),
+	                               WriteTexture("ambient.dds")};
+	std::string imageLibrary = "<library_images>";
+	const char* imageIds[5] = {"imgR", "imgD", "imgB", "imgS", "imgA"};
+	for (int index = 0; index < 5; ++index)
+	{
+		imageLibrary += std::string("<image id=\"") + imageIds[index] + "\"><init_from>file://" +
+		                images[index] + "</init_from></image>";
+	}
+	imageLibrary += "</library_images>";
+	const std::string libraries =
+	    imageLibrary + R"(<library_effects><effect id="fx"><profile_COMMON><technique sid="t"><phong>
+<ambient><texture texture="imgA" texcoord="uv"/></ambient>
+<diffuse><texture texture="imgD" texcoord="uv"/></diffuse>
+<specular><texture texture="imgS" texcoord="uv"/></specular>
+<reflective><texture texture="imgR" texcoord="uv"/></reflective>
+</phong><extra><technique profile="FCOLLADA"><bump><texture texture="imgB" texcoord="uv"/></bump></technique></extra>
+</technique></profile_COMMON></effect></library_effects>
+<library_materials><material id="mat"><instance_effect url="#fx"/></material></library_materials>
+<library_cameras><camera id="cam"><optics><technique_common><perspective><yfov>45</yfov>
+<aspect_ratio>1.5</aspect_ratio><znear>0.5</znear><zfar>200</zfar></perspective></technique_common></optics></camera></library_cameras>
+<library_lights><light id="sun"><technique_common><directional><color>0.5 0.25 1</color></directional></technique_common></light>
+<light id="lamp"><technique_common><point><color>1 1 1</color></point></technique_common></light></library_lights>)";
+	// Corners 0, 1, 2 of the first triangle are distinct; the second repeats one key
+	// three times. Position, normal, uv, texture tangent and binormal: type 4.
+	const std::string sources = Source("p", 3, "0 0 0 1 0 0 0 1 0 5 5 5") + Source("n", 3, "0 0 -1") +
+	                            Source("t", 2, "0.25 0.25 1 0 0 1") + Source("tt", 3, "1 0 0") +
+	                            Source("tb", 3, "0 1 0");
+	const std::string sets =
+	    R"(<triangles count="2" material="surface"><input semantic="VERTEX" source="#v" offset="0"/>
+<input semantic="NORMAL" source="#n" offset="1"/><input semantic="TEXCOORD" source="#t" offset="2"/>
+<input semantic="TEXTANGENT" source="#tt" offset="3"/><input semantic="TEXBINORMAL" source="#tb" offset="4"/>
+<p>0 0 0 0 0  1 0 1 0 0  2 0 2 0 0  3 0 1 0 0  3 0 1 0 0  3 0 1 0 0</p></triangles>)";
+	const std::string nodes = R"(<node id="quad" name="Quad"><translate>1 2 3</translate>
+<instance_geometry url="#g"><bind_material><technique_common><instance_material symbol="surface" target="#mat"/>
+</technique_common></bind_material></instance_geometry></node>
+<node id="c" name="Cam"><instance_camera url="#cam"/></node>
+<node id="l" name="Sun"><instance_light url="#sun"/></node>
+<node id="k" name="Lamp"><instance_light url="#lamp"/></node>)";
+	const std::string path = WriteDocument("quad.dae", Document(sources, sets, libraries, nodes));
+	const Zeph::ModelNode* tree = Zeph::Engine::GetInstance()->GetModelFactory().GetModel(path);
+	ASSERT_NE(tree, nullptr) << TakeLog();
+
+	// The root is the scene with the identity transform, mirrored in x.
+	const Matrix44<float> root = tree->GetTransformation()->GetTransformationForTime(0.0);
+	for (int i = 0; i < 16; ++i)
+	{
+		EXPECT_EQ(root.myMatrix[i], i == 0 ? -1.0f : (i % 5 == 0 ? 1.0f : 0.0f)) << "element " << i;
+	}
+	ASSERT_EQ(tree->GetChildren().Count(), 4);
+	const Zeph::ModelNode& quad = *tree->GetChildren()[0];
+	EXPECT_EQ(quad.GetName(), "Quad");
+	const Matrix44<float> local = quad.GetTransformation()->GetTransformationForTime(0.0);
+	EXPECT_EQ(local.myMatrix[12], 1.0f);
+	EXPECT_EQ(local.myMatrix[13], 2.0f);
+	EXPECT_EQ(local.myMatrix[14], 3.0f);
+
+	const Zeph::Model* model = quad.GetModel();
+	ASSERT_NE(model, nullptr);
+	EXPECT_EQ(model->GetVertexType(), 4);
+	EXPECT_EQ(model->GetVertexCount(), 4) << "the repeated key is one vertex";
+	EXPECT_EQ(Indices(*model), (std::vector<uint32_t>{2, 1, 0, 3, 3, 3}));
+	// Type 4: position 0, normal 12, uv 24, tangent 32, binormal 44.
+	EXPECT_EQ(VertexValue<float>(*model, 0, 24), 0.25f);
+	EXPECT_EQ(VertexValue<float>(*model, 0, 28), 0.75f);
+	EXPECT_EQ(VertexValue<float>(*model, 1, 0), 1.0f);
+	EXPECT_EQ(VertexValue<float>(*model, 1, 28), 1.0f);
+	EXPECT_EQ(VertexValue<float>(*model, 3, 0), 5.0f);
+	EXPECT_EQ(VertexValue<float>(*model, 2, 20), -1.0f);
+	EXPECT_EQ(VertexValue<float>(*model, 2, 32), 1.0f);
+	EXPECT_EQ(VertexValue<float>(*model, 2, 48), 1.0f);
+
+	ASSERT_EQ(model->GetSurfaces().Count(), 1);
+	const Zeph::Surface& surface = model->GetSurfaces()[0];
+	EXPECT_EQ(surface.GetIndexCount(), 6);
+	EXPECT_EQ(surface.GetStartIndex(), 0);
+	EXPECT_EQ(surface.GetPrimitiveTopology(), Gpu::PrimitiveTopology::TriangleList);
+	const char* variables[5] = {"SubstanceTexture", "DiffuseTexture", "NormalTexture", "RoughnessTexture",
+	                            "AOTexture"};
+	const bool srgb[5] = {true, true, false, true, true};
+	ASSERT_EQ(surface.GetTextureCount(), 5);
+	for (int index = 0; index < 5; ++index)
+	{
+		EXPECT_EQ(surface.GetTextureFileName(index), images[index]) << index;
+		EXPECT_EQ(surface.GetTextureVariableName(index), variables[index]) << index;
+		EXPECT_EQ(surface.GetTextureSRGBFlag(index), srgb[index]) << index;
+		EXPECT_NE(surface.GetTexture(index), nullptr) << index;
+	}
+
+	const Zeph::Camera* camera = tree->GetChildren()[1]->GetCamera();
+	ASSERT_NE(camera, nullptr);
+	EXPECT_FLOAT_EQ(camera->GetFov(), 45.0f * std::numbers::pi_v<float> / 180.0f);
+	EXPECT_FLOAT_EQ(camera->GetAspectRatio(), 1.5f);
+	EXPECT_FLOAT_EQ(camera->GetNearPlane(), 0.5f);
+	EXPECT_FLOAT_EQ(camera->GetFarPlane(), 200.0f);
+	const Zeph::ModelLight* sun = tree->GetChildren()[2]->GetLight();
+	ASSERT_NE(sun, nullptr);
+	EXPECT_EQ(sun->myKind, Zeph::ModelLight::DIRECTIONAL);
+	EXPECT_EQ(sun->myColor.x, 0.5f);
+	EXPECT_EQ(sun->myColor.y, 0.25f);
+	EXPECT_EQ(sun->myColor.z, 1.0f);
+	EXPECT_EQ(sun->myColor.w, 1.0f);
+	ASSERT_NE(tree->GetChildren()[3]->GetLight(), nullptr);
+	EXPECT_EQ(tree->GetChildren()[3]->GetLight()->myKind, Zeph::ModelLight::POINT);
+}
+
+TEST_F(ColladaImportTest, ASkinStoresWeightsAndBonesBytesPerInfluence)
+{
+	if (!CreateEngine(64, 64))
+	{
+		return;
+	}
+	std::string bind;
+	for (int joint = 0; joint < 4; ++joint)
+	{
+		bind += "1 0 0 0 0 1 0 0 0 0 1 0 0 0 0 1 ";
+	}
+	// Vertex 0 on joint 3 alone, vertex 1 on joint 1, vertex 2 half on joints 0 and 2
+	// (listed smaller weight first, to be sorted).
+	const std::string libraries =
+	    R"(<library_controllers><controller id="skin"><skin source="#g">
+<source id="j"><Name_array id="ja" count="4">J0 J1 J2 J3</Name_array><technique_common><accessor source="#ja" count="4" stride="1"/></technique_common></source>
+)" + Source("ib", 16, bind) +
+	    Source("w", 1, "1 0.25 0.75") +
+	    R"(<joints><input semantic="JOINT" source="#j"/><input semantic="INV_BIND_MATRIX" source="#ib"/></joints>
+<vertex_weights count="3"><input semantic="JOINT" source="#j" offset="0"/><input semantic="WEIGHT" source="#w" offset="1"/>
+<vcount>1 1 2</vcount><v>3 0 1 0 0 1 2 2</v></vertex_weights></skin></controller></library_controllers>)";
+	const std::string sources =
+	    Source("p", 3, "0 0 0 1 0 0 0 1 0") + Source("n", 3, "0 0 -1") + Source("t", 2, "0 0 1 0 0 1");
+	const std::string sets = R"(<triangles count="1"><input semantic="VERTEX" source="#v" offset="0"/>
+<input semantic="NORMAL" source="#n" offset="1"/><input semantic="TEXCOORD" source="#t" offset="2"/>
+<p>0 0 0 1 0 1 2 0 2</p></triangles>)";
+	const std::string nodes = R"(<node id="b" name="Body"><instance_controller url="#skin"/></node>)";
+	const std::string path = WriteDocument("skin.dae", Document(sources, sets, libraries, nodes));
+	const Zeph::ModelNode* tree = Zeph::Engine::GetInstance()->GetModelFactory().GetModel(path);
+	ASSERT_NE(tree, nullptr) << TakeLog();
+	ASSERT_EQ(tree->GetChildren().Count(), 1);
+	const Zeph::Model* model = tree->GetChildren()[0]->GetModel();
+	ASSERT_NE(model, nullptr);
+	EXPECT_EQ(model->GetVertexType(), 7);
+	ASSERT_EQ(model->GetVertexCount(), 3);
+	// Type 7: position 0, weights 12, bones 16, normal 20, uv 32.
+	struct Expected
+	{
+		uint8_t myWeights[4];
+		uint8_t myBones[4];
+	};
+	const Expected expected[3] = {
+	    {{255, 0, 0, 0}, {3, 0, 0, 0}},
+	    {{255, 0, 0, 0}, {1, 0, 0, 0}},
+	    {{191, 64, 0, 0}, {2, 0, 0, 0}},
+	};
+	for (int vertex = 0; vertex < 3; ++vertex)
+	{
+		const auto weights = VertexValue<std::array<uint8_t, 4>>(*model, vertex, 12);
+		const auto bones = VertexValue<std::array<uint8_t, 4>>(*model, vertex, 16);
+		for (int j = 0; j < 4; ++j)
+		{
+			EXPECT_EQ(weights[j], expected[vertex].myWeights[j]) << "vertex " << vertex << ", byte " << j;
+			EXPECT_EQ(bones[j], expected[vertex].myBones[j]) << "vertex " << vertex << ", byte " << j;
+		}
+	}
+	EXPECT_EQ(VertexValue<float>(*model, 0, 28), -1.0f);
+}
+
+// The project's own content: every model under data/models imports through the
+// factory as the lit vertex type, with its four material textures on every surface.
+TEST_F(ColladaImportTest, TheSampleModelsImportAsLitModelsWithTheirTextures)
+{
+	if (!CreateEngine(64, 64))
+	{
+		return;
+	}
+	std::vector<std::string> names;
+	for (const auto& entry : std::filesystem::directory_iterator("data/models"))
+	{
+		if (entry.path().extension() == ".dae")
+		{
+			names.push_back("data/models/" + entry.path().filename().string());
+		}
+	}
+	ASSERT_GE(names.size(), 9u);
+	Zeph::ModelFactory& factory = Zeph::Engine::GetInstance()->GetModelFactory();
+	for (const std::string& name : names)
+	{
+		SCOPED_TRACE(name);
+		Zeph::ModelNode* root = factory.GetModel(name);
+		ASSERT_NE(root, nullptr) << TakeLog();
+		int models = 0;
+		std::vector<const Zeph::ModelNode*> pending = {root};
+		while (!pending.empty())
+		{
+			const Zeph::ModelNode* node = pending.back();
+			pending.pop_back();
+			for (int child = 0; child < node->GetChildren().Count(); ++child)
+			{
+				pending.push_back(node->GetChildren()[child]);
+			}
+			const Zeph::Model* model = node->GetModel();
+			if (model == nullptr || model->IsNullObject())
+			{
+				continue;
+			}
+			++models;
+			EXPECT_EQ(model->GetVertexType(), 4);
+			ASSERT_GT(model->GetSurfaces().Count(), 0);
+			for (int surface = 0; surface < model->GetSurfaces().Count(); ++surface)
+			{
+				EXPECT_EQ(model->GetSurfaces()[surface].GetTextureCount(), 4);
+			}
+		}
+		EXPECT_GE(models, 1);
+	}
+}
