@@ -34,7 +34,7 @@ std::string GetBuildInfo()
 	info += "  engine    Engine (device, swap chain, back and depth buffers), texture, effect and font\n"
 	        "            containers, Instance, Room, Text, DebugLine, Debug log with fatal reports,\n"
 	        "            FI_File typed text/binary stream, Camera\n";
-	info += "  model     ModelNode, Model, Surface, VertexTypes, ModelFactory (generated boxes)\n";
+	info += "  model     ModelNode, Model, Surface, VertexTypes, ModelFactory, COLLADA and .al import\n";
 	info += "  renderer  Renderer with its collector (batches per model) and late list\n";
 	info += "  xml       XML cursor and XMLElement builder on TinyXML " +
 	        std::to_string(TIXML_MAJOR_VERSION) + "." + std::to_string(TIXML_MINOR_VERSION) + "." +
