@@ -5,6 +5,7 @@
 // report fails the test unless the test took it with TakeLog().
 
 #include <bitset>
+#include <cstring>
 #include <gtest/gtest.h>
 #include <string>
 #include <vector>
@@ -12,6 +13,7 @@
 #include "core/Matrix44.h"
 #include "engine/Debug.h"
 #include "engine/Engine.h"
+#include "platform/dds/DdsFile.h"
 #include "platform/gpu/Buffer.h"
 #include "platform/gpu/InputLayout.h"
 #include "support/GlSupport.h"
@@ -145,6 +147,26 @@ protected:
 		}
 		engine->Present();
 		return true;
+	}
+
+	// A 4x4 RGBA8 DDS texture of one colour (black when none is given) in the scratch
+	// directory; its path.
+	std::string WriteSolidTexture(const std::string& aName, const uint8_t* aColor = nullptr)
+	{
+		Dds::ImageInfo info;
+		info.myWidth = 4;
+		info.myHeight = 4;
+		info.myFormat = Dds::Format::R8G8B8A8_UNORM;
+		Dds::Image image;
+		std::string error;
+		EXPECT_TRUE(image.Init(info, error)) << error;
+		for (uint64_t at = 0; aColor != nullptr && at + 3 < image.SubresourceSize(0); at += 4)
+		{
+			std::memcpy(image.Data(0, 0) + at, aColor, 4);
+		}
+		const std::string path = myScratch.File(aName);
+		EXPECT_TRUE(Dds::SaveToFile(path, image, error)) << error;
+		return path;
 	}
 
 	TestSupport::ScratchDir myScratch;

@@ -84,24 +84,6 @@ protected:
 		std::ofstream(path) << aText;
 		return path;
 	}
-
-	std::string WriteTexture(const std::string& aName)
-	{
-		Dds::ImageInfo info;
-		info.myWidth = 4;
-		info.myHeight = 4;
-		info.myDepth = 1;
-		info.myArraySize = 1;
-		info.myMipLevels = 1;
-		info.myFormat = Dds::Format::R8G8B8A8_UNORM;
-		info.myResourceDimension = Dds::ResourceDimension::Texture2D;
-		Dds::Image image;
-		std::string error;
-		EXPECT_TRUE(image.Init(info, error)) << error;
-		const std::string path = myScratch.File(aName);
-		EXPECT_TRUE(Dds::SaveToFile(path, image, error)) << error;
-		return path;
-	}
 };
 
 // A geometry "g" whose inputs are listed in aSetInputs (VERTEX at offset 0) and
@@ -248,9 +230,9 @@ TEST_F(ColladaImportTest, CornersWindingUvsMirrorCameraLightAndTexturesOfALitQua
 	{
 		return;
 	}
-	const std::string images[5] = {WriteTexture("reflective.dds"), WriteTexture("diffuse.dds"),
-	                               WriteTexture("bump.dds"), WriteTexture("specular.dds"),
-	                               WriteTexture("ambient.dds")};
+	const std::string images[5] = {WriteSolidTexture("reflective.dds"), WriteSolidTexture("diffuse.dds"),
+	                               WriteSolidTexture("bump.dds"), WriteSolidTexture("specular.dds"),
+	                               WriteSolidTexture("ambient.dds")};
 	std::string imageLibrary = "<library_images>";
 	const char* imageIds[5] = {"imgR", "imgD", "imgB", "imgS", "imgA"};
 	for (int index = 0; index < 5; ++index)

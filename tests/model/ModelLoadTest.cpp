@@ -23,30 +23,6 @@ namespace
 class ModelLoadTest : public EngineTest
 {
 protected:
-	// A 4x4 texture of one RGBA8 colour.
-	std::string WriteTexture(const std::string& aName, const uint8_t aColor[4])
-	{
-		Dds::ImageInfo info;
-		info.myWidth = 4;
-		info.myHeight = 4;
-		info.myDepth = 1;
-		info.myArraySize = 1;
-		info.myMipLevels = 1;
-		info.myFormat = Dds::Format::R8G8B8A8_UNORM;
-		info.myResourceDimension = Dds::ResourceDimension::Texture2D;
-		Dds::Image image;
-		std::string error;
-		EXPECT_TRUE(image.Init(info, error)) << error;
-		uint8_t* bytes = image.Data(0, 0);
-		for (uint64_t at = 0; at + 3 < image.SubresourceSize(0); at += 4)
-		{
-			std::memcpy(bytes + at, aColor, 4);
-		}
-		const std::string path = myScratch.File(aName);
-		EXPECT_TRUE(Dds::SaveToFile(path, image, error)) << error;
-		return path;
-	}
-
 	// The lit effect on a model and its surfaces, as the importers set it.
 	static Zeph::Effect* SetLitEffect(Zeph::Model& aModel)
 	{
@@ -77,8 +53,8 @@ TEST_F(ModelLoadTest, AnAlFileLoadsAsTheTreeThatWasSavedWithItsTexturesAndTechni
 	}
 	const uint8_t red[4] = {255, 0, 0, 255};
 	const uint8_t flat[4] = {128, 128, 255, 255};
-	const std::string albedo = WriteTexture("albedo.dds", red);
-	const std::string normal = WriteTexture("normal.dds", flat);
+	const std::string albedo = WriteSolidTexture("albedo.dds", red);
+	const std::string normal = WriteSolidTexture("normal.dds", flat);
 	std::unique_ptr<Zeph::ModelNode> tree(ModelTreeCheck::MakeTree());
 	SetLitEffect(*tree->GetModel());
 	Zeph::Surface& first = tree->GetModel()->GetSurfaces()[0];
@@ -272,7 +248,7 @@ TEST_F(ModelLoadTest, ALoadedLitModelDrawnWithRenderShowsItsAlbedoLit)
 		return;
 	}
 	const uint8_t albedo[4] = {200, 120, 40, 255};
-	const std::string texture = WriteTexture("albedo.dds", albedo);
+	const std::string texture = WriteSolidTexture("albedo.dds", albedo);
 	Zeph::ModelNode source;
 	source.SetModel(ModelTreeCheck::MakeQuadModel(0.5f, 0.5f));
 	SetLitEffect(*source.GetModel());
