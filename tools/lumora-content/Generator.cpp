@@ -2,10 +2,14 @@
 
 #include <cstdio>
 #include <fstream>
+#include <utility>
 
 #include "ColladaWriter.h"
+#include "ColorGrading.h"
+#include "EnvironmentMaps.h"
 #include "Models.h"
 #include "TextureBaker.h"
+#include "VolumeModels.h"
 #include "platform/dds/DdsFile.h"
 #include "platform/paths/Paths.h"
 
@@ -48,7 +52,12 @@ bool Generate(const std::string& anOutDirectory, std::vector<std::string>& someW
 {
 	const std::string root =
 	    anOutDirectory.empty() || anOutDirectory.back() == '/' ? anOutDirectory : anOutDirectory + "/";
-	for (const ModelDescription& model : BuildModels())
+	std::vector<ModelDescription> models = BuildModels();
+	for (ModelDescription& volume : BuildVolumeModels())
+	{
+		models.push_back(std::move(volume));
+	}
+	for (const ModelDescription& model : models)
 	{
 		const std::string relative = "models/" + model.myName + ".dae";
 		if (!WriteTextFile(root + relative, WriteColladaDocument(model), anErrorOut))
@@ -57,21 +66,40 @@ bool Generate(const std::string& anOutDirectory, std::vector<std::string>& someW
 		}
 		someWrittenOut.push_back(relative);
 	}
+	// Builds one image with aBuild and saves it; errors name the file.
+	auto writeImage = [&](const std::string& aRelative, auto aBuild) {
+		Dds::Image image;
+		if (!aBuild(image) || !Dds::SaveToFile(root + aRelative, image, anErrorOut))
+		{
+			anErrorOut = aRelative + ": " + anErrorOut;
+			return false;
+		}
+		someWrittenOut.push_back(aRelative);
+		return true;
+	};
 	for (const MaterialKind material : ourMaterialKinds)
 	{
 		for (const MapKind map : {MapKind::Albedo, MapKind::Normal, MapKind::Roughness, MapKind::Occlusion})
 		{
-			const std::string relative = "textures/" + TextureFileName(material, map);
-			Dds::Image image;
-			if (!BakeMap(material, map, image, anErrorOut) ||
-			    !Dds::SaveToFile(root + relative, image, anErrorOut))
+			if (!writeImage("textures/" + TextureFileName(material, map),
+			                [&](Dds::Image& anImage) { return BakeMap(material, map, anImage, anErrorOut); }))
 			{
-				anErrorOut = relative + ": " + anErrorOut;
 				return false;
 			}
-			someWrittenOut.push_back(relative);
 		}
 	}
-	return true;
+	for (const GradingKind grading : {GradingKind::Neutral, GradingKind::Warm})
+	{
+		if (!writeImage(std::string("grading/") + GradingFileName(grading), [&](Dds::Image& anImage) {
+			    return BuildGradingLookup(grading, anImage, anErrorOut);
+		    }))
+		{
+			return false;
+		}
+	}
+	return writeImage("Cubemaps/cubemap.dds",
+	                  [&](Dds::Image& anImage) { return BuildFallbackCubemap(anImage, anErrorOut); }) &&
+	       writeImage("Cubemaps/normaltest.dds",
+	                  [&](Dds::Image& anImage) { return BuildNormalTestCubemap(anImage, anErrorOut); });
 }
 } // namespace Content

@@ -1,5 +1,7 @@
 #pragma once
-// Generator: writes the whole sample content, models and textures, under one output directory.
+// Generator: writes the whole sample content under one output directory: the sample models and
+// their textures, the light-volume and decal-box models, the colour-grading lookups and the
+// cube maps.
 //
 //   std::vector<std::string> written;
 //   std::string error;

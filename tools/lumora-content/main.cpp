@@ -1,11 +1,12 @@
-// lumora-content: writes the sample models and textures.
+// lumora-content: writes the sample content: models, textures, grading lookups and cube maps.
 //
 //   lumora-content [--out DIRECTORY]
 //
-// DIRECTORY defaults to "data": models go to DIRECTORY/models/*.dae, textures to
-// DIRECTORY/textures/*.dds. The output is the same bytes on every run, so the files under data/
-// are committed and a test regenerates them to check that they are current. Run it from the
-// repository root. The exit status is 1 on any error.
+// DIRECTORY defaults to "data": models (the light and decal volumes among them) go to
+// DIRECTORY/models/*.dae, textures to DIRECTORY/textures/*.dds, the colour-grading lookups to
+// DIRECTORY/grading/*.dds and the cube maps to DIRECTORY/Cubemaps/*.dds. The output is the same bytes on
+// every run, so the files under data/ are committed and a test regenerates them to check that they are
+// current. Run it from the repository root. The exit status is 1 on any error.
 
 #include <cstdio>
 #include <cstring>
