@@ -14,6 +14,7 @@ vertex VS_Model
 	out vec3 vNormal;
 	out vec3 vTangent;
 	out vec3 vBinormal;
+	out vec3 vWorldPosition;
 	out float vViewDepth;
 
 	void main()
@@ -25,6 +26,7 @@ vertex VS_Model
 		vNormal = rotation * NORMAL;
 		vTangent = rotation * TANGENT;
 		vBinormal = rotation * BINORMAL;
+		vWorldPosition = world.xyz;
 		vViewDepth = view.z;
 		gl_Position = Projection * view;
 	}

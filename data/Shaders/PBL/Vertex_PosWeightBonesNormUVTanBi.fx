@@ -28,17 +28,20 @@ vertex VS_Model
 	out vec3 vNormal;
 	out vec3 vTangent;
 	out vec3 vBinormal;
+	out vec3 vWorldPosition;
 	out float vViewDepth;
 
 	void main()
 	{
 		mat4 skin = World * SkinMatrix(WEIGHTS, BONES);
-		vec4 view = View * (skin * vec4(POSITION, 1.0));
+		vec4 world = skin * vec4(POSITION, 1.0);
+		vec4 view = View * world;
 		mat3 rotation = mat3(skin);
 		vTexCoord = TEXCOORD;
 		vNormal = rotation * NORMAL;
 		vTangent = rotation * TANGENT;
 		vBinormal = rotation * BINORMAL;
+		vWorldPosition = world.xyz;
 		vViewDepth = view.z;
 		gl_Position = Projection * view;
 	}
