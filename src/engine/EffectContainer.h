@@ -28,6 +28,24 @@ public:
 	Effect* GetEffect(const std::string& aFileName);
 	void Clear();
 
+	// Calls aFunction(Effect&) for every effect loaded so far (the renderer publishes
+	// the camera and the room environment to all of them).
+	template <typename Function> void ForEachEffect(Function&& aFunction)
+	{
+		for (auto& entry : myEffects)
+		{
+			aFunction(*entry.second);
+		}
+		if (mySpriteEffect)
+		{
+			aFunction(*mySpriteEffect);
+		}
+		if (myLineEffect)
+		{
+			aFunction(*myLineEffect);
+		}
+	}
+
 	size_t GetCount() const { return myEffects.size(); }
 	bool HasSpriteEffect() const { return mySpriteEffectCreatedFlag; }
 

@@ -7,6 +7,7 @@
 #include "engine/EngineReport.h"
 #include "model/ModelFactory.h"
 #include "platform/gpu/Multisample.h"
+#include "renderer/CubemapContainer.h"
 #include "renderer/Renderer.h"
 
 namespace Zeph
@@ -42,6 +43,7 @@ void Engine::ShutDown()
 	// The containers release GPU objects: the context must be current here.
 	ourInstance->myDevice.MakeCurrent();
 	ourInstance->myRenderer->Destroy();
+	ourInstance->myCubemapContainer->Destroy();
 	ourInstance->myFontContainer.Clear();
 	ourInstance->myEffectContainer.Clear();
 	ourInstance->myTextureContainer.Clear();
@@ -57,6 +59,7 @@ bool Engine::Init(Gpu::WindowHandle aWindowHandle, int aWidth, int aHeight)
 	// The parts exist from the start, so ShutDown finds them after a failed start-up too.
 	myModelFactory = std::make_unique<ModelFactory>();
 	myRenderer = std::make_unique<Renderer>();
+	myCubemapContainer = std::make_unique<CubemapContainer>();
 	myUseMultisampling = false;
 	myDriverType = DriverType::HARDWARE;
 	mySetupInfo = SetupInfo();

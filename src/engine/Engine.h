@@ -28,6 +28,7 @@
 
 namespace Zeph
 {
+class CubemapContainer;
 class ModelFactory;
 class Renderer;
 
@@ -47,6 +48,7 @@ public:
 	EffectContainer& GetEffectContainer() { return myEffectContainer; }
 	FontContainer& GetFontContainer() { return myFontContainer; }
 	ModelFactory& GetModelFactory() { return *myModelFactory; }
+	CubemapContainer& GetCubemapContainer() { return *myCubemapContainer; }
 	Renderer& GetRenderer() { return *myRenderer; }
 	SetupInfo& GetSetupInfo() { return mySetupInfo; }
 	const SetupInfo& GetSetupInfo() const { return mySetupInfo; }
@@ -111,6 +113,7 @@ private:
 	TextureContainer myDdsTextureContainer{{".dds", ".DDS"}};
 	std::unique_ptr<ModelFactory> myModelFactory;
 	std::unique_ptr<Renderer> myRenderer;
+	std::unique_ptr<CubemapContainer> myCubemapContainer;
 	SetupInfo mySetupInfo;
 	unsigned int myRefreshRateNumerator = 60;
 	unsigned int myRefreshRateDenominator = 1;
