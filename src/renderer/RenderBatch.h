@@ -2,6 +2,7 @@
 // RenderBatch: every instance of one model surface queued in a frame, so that the
 // model's buffers and effect are set up once and its instances drawn one after
 // another, each with its world matrix, last frame's world matrix and its room.
+// Skinned surfaces are batched the same way (SkinnedRenderBatch) in lists of their own.
 // RenderBatchList: the batches of one list of the collector; it keeps its batches
 // (and their storage) when it is emptied for the next frame.
 //
@@ -46,6 +47,9 @@ private:
 	GrowingArray<Matrix44<float>> myPreviousWorlds;
 	GrowingArray<RoomData> myRoomData;
 };
+
+// Skinned surfaces (surfaces of models with bones) batch the same way.
+using SkinnedRenderBatch = RenderBatch;
 
 class RenderBatchList
 {

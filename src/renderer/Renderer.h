@@ -1,67 +1,221 @@
 #pragma once
-// Renderer: draws one frame of what was queued: the collector's batches into the
-// target with the depth buffer, then the late list (room boxes, gizmos, texts) over
-// the finished image. Every queue is emptied by the frame.
+// Renderer: the deferred frame. Everything a frame shows is queued first in the
+// RenderTargetCollector (instances by model surface, point and spot lights, decals)
+// and in the late list (overlays); Render then runs the frame and empties every queue:
+//
+//   shadow map -> G-buffer -> decals -> outline mask -> shadow resolve -> point and
+//   spot light volumes -> SSAO -> ambient (SH volume + reflections) -> light meshes ->
+//   forward -> post chain (SSAO apply, tone map, bloom, tone map, grade, outline) ->
+//   auxiliary effects -> late items -> debug tiles -> present
 //
 //   Zeph::Renderer& renderer = engine->GetRenderer();
 //   renderer.GetRTC().SetCamera(camera);
 //   instance->Render();                          // into the collector
-//   renderer.RenderLateInstance(gizmo);          // over everything
-//   renderer.Render(backBufferView, depthView);  // what Engine::RenderScene does
+//   renderer.GetRTC().AddPointLight(light);
+//   renderer.RenderLateInstance(gizmo);          // over the finished image
+//   engine->RenderScene();                       // Render(back buffer, depth) + present
 //
-// This is the forward core that the deferred frame grows from: batches are drawn
-// with their model's render technique, World/View/Projection from the instance and
-// the collector's camera. Owned by the Engine; Init runs once the device exists.
+// Owned by the Engine; Init runs once the device exists and before the first frame.
+#include <memory>
+#include <string>
+#include <vector>
+
 #include "core/GrowingArray.h"
-#include "platform/gpu/RenderState.h"
+#include "platform/gpu/StateCache.h"
+#include "renderer/DecalMeshRenderTargetHelper.h"
+#include "renderer/DeferredRenderTargetHelper.h"
 #include "renderer/LateRenderItem.h"
+#include "renderer/LightMeshRenderTargetHelper.h"
+#include "renderer/MaterialDefaults.h"
+#include "renderer/OutlineRenderTargetHelper.h"
 #include "renderer/RenderTargetCollector.h"
+#include "renderer/ShadowRenderTargetHelper.h"
+#include "renderer/StandardRenderTargetHelper.h"
+#include "renderer/post/BloomManager.h"
+#include "renderer/post/ColorGradingManager.h"
+#include "renderer/post/ComputeHelper.h"
+#include "renderer/post/FXAAManager.h"
+#include "renderer/post/FullScreenHelper.h"
+#include "renderer/post/HDR_Manager.h"
+#include "renderer/post/MotionBlurManager.h"
+#include "renderer/post/OutlineManager.h"
+#include "renderer/post/SSAOManager.h"
+
+namespace Fx
+{
+class Variable;
+}
 
 namespace Gpu
 {
-class Context;
 class DepthStencilView;
 class RenderTargetView;
+class ShaderResourceView;
+class Texture;
+class TimestampQueries;
 } // namespace Gpu
 
 namespace Zeph
 {
+class CameraInstance;
 class Instance;
+class ProbeHelper;
 class Text;
+class Texture;
 
 class Renderer
 {
 public:
+	// Shadow-map size in texels per quality level 0..3 (level 0 renders no shadows).
+	static constexpr int ourShadowMapSizes[4] = {8, 1024, 2048, 4096};
+
 	Renderer();
-	~Renderer() = default;
+	~Renderer();
 	Renderer(const Renderer&) = delete;
 	Renderer& operator=(const Renderer&) = delete;
 
 	bool Init(int aWidth, int aHeight);
-	// Forgets the queued frame; the engine calls it first at shutdown.
+	// Releases every target and forgets the queued frame; the engine calls it first at shutdown.
 	void Destroy();
 
-	// Clears aTarget (opaque black) and aDepth (1.0), draws the batches, then the late
-	// items without a depth buffer, and empties the collector and the late list.
-	void Render(Gpu::RenderTargetView* aTarget, Gpu::DepthStencilView* aDepth);
+	void Render(Gpu::RenderTargetView* aBackBuffer, Gpu::DepthStencilView* aDepth);
 
 	RenderTargetCollector& GetRTC() { return myCollector; }
 	void RenderLateInstance(Instance* anInstance);
 	void RenderLateText(Text* aText);
 	int GetLateCount() const { return myLateItems.Count(); }
+	int GetLateCapacity() const { return myLateItems.GetCapacity(); }
+
+	// Adds aDelta to the accumulated time and writes the total to "Time" (the model
+	// effect) and "ElapsedTime" (the full-screen effect).
+	void SetElapsedTime(float aDelta);
+	float GetElapsedTime() const { return myElapsedTime; }
+	// "FarPlane" and the far-frustum corners on the full-screen effect.
+	void UpdateScreenCamera(const CameraInstance& aCamera);
+	LightMeshRenderTargetHelper& GetLightMeshRenderer() { return myLightMeshHelper; }
+
+	// Grades the frame through another 3D lookup file; false (reported) when it cannot
+	// be loaded, and the frame then keeps no grade until a lookup loads.
+	bool SetColorGrading(const std::string& aLookupFile);
+
+	void SetSSAOVariables(float aScale, float aSampleRadius, float aBias, float anIntensity);
+	void SetHDRandBloomVariables(float anAutoExposure, float aLumMin, float aLumMax, float aBloomThreshold,
+	                             float aBloomFactor, float anEmissiveMultiplier);
+
+	// The irradiance volume: update false creates the seven 3D textures from the
+	// blocks, true overwrites them; both bind them to the full-screen effect.
+	bool UploadSHToGPU(bool anUpdateFlag, const std::vector<uint32_t>* someBlocks, int anX, int aY, int aZ);
+	// "WorldMin" and "WorldSize" of the volume on the full-screen effect.
+	void SetVolumeBounds(const Vector3<float>& aWorldMin, const Vector3<float>& aWorldSize);
+
+	bool SetupShadowDepthBuffer();
+	bool SetupSpecialDepthBuffer();
+
+	// Debug tiles: registered names ("motion-blur", "linear-depth", "ssao",
+	// "deferred-albedo", "deferred-normal", "shadow-map"); shown ones are drawn down the
+	// left of the screen at the end of the frame.
+	void ShowDebugTexture(const std::string& aName);
+	void HideDebugTexture(const std::string& aName);
+	int GetShownDebugTextureCount() const { return static_cast<int>(myShownDebugTextures.size()); }
+
+	int GetShadowQuality() const { return myShadowQuality; }
+	int GetShadowMapSize() const { return myShadowMapSize; }
 	int GetWidth() const { return myWidth; }
 	int GetHeight() const { return myHeight; }
+	int GetBakingProgress() const { return myBakingProgress; }
+	bool IsSHLoaded() const { return mySHLoadedFlag; }
+	ProbeHelper* GetProbeHelper() const { return myProbeHelper.get(); }
+	FullScreenHelper& GetFullScreenHelper() { return myFullScreenHelper; }
+	DeferredRenderTargetHelper& GetGBuffer() { return myDeferredHelper; }
+	ShadowRenderTargetHelper& GetShadowHelper() { return myShadowHelper; }
+	HDR_Manager& GetHDRManager() { return myHDRManager; }
+	SSAOManager& GetSSAOManager() { return mySSAOManager; }
+	OutlineManager& GetOutlineManager() { return myOutlineManager; }
+	const MaterialDefaults& GetMaterialDefaults() const { return myMaterialDefaults; }
+	Gpu::DepthStencilView* GetCurrentDepth() const { return myCurrentDepth; }
+	// The last frame's lit image (lights, ambient and forward pass, occlusion applied)
+	// before tone mapping: the HDR target the post chain started from.
+	Texture* GetLitImage() const { return myLitImage; }
+	// Times of the last frame's passes, when pass timing is on (benchmarks).
+	void SetPassTimingFlag(bool aFlag) { myPassTimingFlag = aFlag; }
+	struct PassTime
+	{
+		std::string myName;
+		double myMilliseconds;
+	};
+	const std::vector<PassTime>& GetPassTimes() const { return myPassTimes; }
 
 private:
-	// Draws the batches of the drawn lists with the collector's camera.
-	void DrawBatches(Gpu::Context& aContext);
-	void DrawBatch(Gpu::Context& aContext, const RenderBatch& aBatch);
-	void RenderLateItems(Gpu::Context& aContext, Gpu::RenderTargetView* aTarget);
+	struct DebugTexture
+	{
+		std::string myName;
+		Texture* myTexture = nullptr;
+		Gpu::ShaderResourceView* myView = nullptr;
+		const char* myTechnique = "Render";
+	};
 
+	Texture* GetCurrentHDR() const { return myPingPong[myPingPongIndex]; }
+	Texture* GetOtherHDR() const { return myPingPong[myPingPongIndex ^ 1]; }
+	void RenderShadowMap();
+	void ClearFrameTargets();
+	// The two light passes and the ambient pass over aGBuffer into the current output.
+	void RenderLights(DeferredRenderTargetHelper& aGBuffer);
+	void RenderAmbient(DeferredRenderTargetHelper& aGBuffer, int aWidth, int aHeight);
+	void RenderPostChain();
+	void RenderLateItems();
+	void RenderDebugTextures();
+	void RegisterDebugTextures();
+	void LoadSettings();
+	void BeginPass(const char* aName);
+	void EndPasses();
+
+	int myShadowQuality = 3;
+	int myShadowMapSize = 4096;
 	int myWidth = 0;
 	int myHeight = 0;
-	Gpu::Viewport myViewport;
+	int myBakingProgress = 0;
+	bool mySHLoadedFlag = false;
+	std::unique_ptr<ProbeHelper> myProbeHelper;
+	std::unique_ptr<Texture> myHDRTargets[2];
+	std::unique_ptr<Texture> myToneMappedTarget;
+	Texture* myPingPong[2] = {};
+	int myPingPongIndex = 0;
+	Texture* myLitImage = nullptr;
+	Gpu::RenderTargetView* myCurrentOutput = nullptr;
+	Gpu::DepthStencilView* myCurrentDepth = nullptr;
+	Gpu::RenderTargetView* myBackBuffer = nullptr;
+	Fx::Variable* myTimeVariable = nullptr;
+	ComputeHelper myComputeHelper;
+	FullScreenHelper myFullScreenHelper;
+	BloomManager myBloomManager;
+	HDR_Manager myHDRManager;
+	MotionBlurManager myMotionBlurManager;
+	SSAOManager mySSAOManager;
+	ColorGradingManager myColorGradingManager;
+	OutlineManager myOutlineManager;
+	FXAAManager myFXAAManager;
+	ShadowRenderTargetHelper myShadowHelper;
+	StandardRenderTargetHelper myStandardHelper;
+	DeferredRenderTargetHelper myDeferredHelper;
+	LightMeshRenderTargetHelper myLightMeshHelper;
+	DecalMeshRenderTargetHelper myDecalHelper;
+	OutlineRenderTargetHelper myOutlineHelper;
+	MaterialDefaults myMaterialDefaults;
 	RenderTargetCollector myCollector;
 	GrowingArray<LateRenderItem> myLateItems;
+	Gpu::Viewport myScreenViewport;
+	Gpu::Viewport myShadowViewport;
+	std::unique_ptr<Gpu::Texture> myShadowDepthTexture;
+	Gpu::DepthStencilView* myShadowDepthView = nullptr;
+	Gpu::ShaderResourceView* myShadowDepthShaderView = nullptr;
+	std::unique_ptr<Gpu::Texture> mySpecialDepthTexture;
+	Gpu::DepthStencilView* mySpecialDepthView = nullptr;
+	Gpu::ShaderResourceView* mySpecialDepthShaderView = nullptr;
+	float myElapsedTime = 0.0f;
+	std::vector<DebugTexture> myDebugTextures;
+	std::vector<DebugTexture> myShownDebugTextures;
+	bool myPassTimingFlag = false;
+	std::vector<PassTime> myPassTimes;
+	std::unique_ptr<Gpu::TimestampQueries> myTimestamps;
 };
 } // namespace Zeph

@@ -1,11 +1,15 @@
 // The collector without a GPU: batching per model surface, the lists of each
-// render category, storage kept over Reset, the camera block.
+// render category and of skinned surfaces, light and decal lists, the pass runners,
+// storage kept over Reset, the camera block.
 #include <gtest/gtest.h>
+#include <string>
 
 #include "engine/Camera.h"
 #include "engine/CameraInstance.h"
 #include "model/Model.h"
+#include "model/VertexTypes.h"
 #include "renderer/RenderTargetCollector.h"
+#include "renderer/RenderTargetHelper.h"
 
 namespace
 {
@@ -62,31 +66,118 @@ TEST(RenderTargetCollectorTest, InstancesOfOneModelShareABatch)
 	EXPECT_EQ(batches[1].GetCount(), 1);
 }
 
-TEST(RenderTargetCollectorTest, CategoriesPickTheLists)
+TEST(RenderTargetCollectorTest, CategoriesAndSkinningPickTheLists)
 {
+	// Counts per list: shadow casting, its skinned list, unshadowed, its skinned list,
+	// forward, outline, outline skinned.
 	struct Case
 	{
 		Zeph::RenderCategory myCategory;
-		int myCounts[Collector::BATCH_LIST_COUNT]; // shadow casting, unshadowed, forward, outline
+		bool mySkinnedFlag;
+		int myCounts[Collector::BATCH_LIST_COUNT];
 	};
 	const Case cases[] = {
-	    {Zeph::RENDER_CATEGORY_SHADOW_CASTING, {1, 0, 0, 0}},
-	    {Zeph::RENDER_CATEGORY_UNSHADOWED, {0, 1, 0, 0}},
-	    {Zeph::RENDER_CATEGORY_FORWARD, {0, 0, 1, 0}},
-	    {Zeph::RENDER_CATEGORY_SHADOW_CASTING_OUTLINE, {1, 0, 0, 1}},
+	    {Zeph::RENDER_CATEGORY_SHADOW_CASTING, false, {1, 0, 0, 0, 0, 0, 0}},
+	    {Zeph::RENDER_CATEGORY_UNSHADOWED, false, {0, 0, 1, 0, 0, 0, 0}},
+	    {Zeph::RENDER_CATEGORY_FORWARD, false, {0, 0, 0, 0, 1, 0, 0}},
+	    {Zeph::RENDER_CATEGORY_SHADOW_CASTING_OUTLINE, false, {1, 0, 0, 0, 0, 1, 0}},
+	    {Zeph::RENDER_CATEGORY_SHADOW_CASTING, true, {0, 1, 0, 0, 0, 0, 0}},
+	    {Zeph::RENDER_CATEGORY_UNSHADOWED, true, {0, 0, 0, 1, 0, 0, 0}},
+	    // The forward pass has no skinned list: the surface is not queued at all.
+	    {Zeph::RENDER_CATEGORY_FORWARD, true, {0, 0, 0, 0, 0, 0, 0}},
+	    {Zeph::RENDER_CATEGORY_SHADOW_CASTING_OUTLINE, true, {0, 1, 0, 0, 0, 0, 1}},
 	};
-	OneSurfaceModel model;
 	for (const Case& test : cases)
 	{
+		OneSurfaceModel model;
+		model.myModel.SetVertexType(test.mySkinnedFlag ? Zeph::VERTEX_TYPE_POS_WEIGHT_BONES_NORM_UV_TAN_BI
+		                                               : Zeph::VERTEX_TYPE_POS_NORM_UV_TAN_BI);
 		Collector collector;
 		collector.AddInstance(test.myCategory, model.myModel, model.GetSurface(), At(0), At(0), InRoom(-1));
 		for (int list = 0; list < Collector::BATCH_LIST_COUNT; ++list)
 		{
 			EXPECT_EQ(collector.GetBatches(static_cast<Collector::BatchListType>(list)).Count(),
 			          test.myCounts[list])
-			    << "category " << test.myCategory << ", list " << list;
+			    << "category " << test.myCategory << (test.mySkinnedFlag ? " skinned" : " static") << ", list "
+			    << list;
 		}
 	}
+}
+
+TEST(RenderTargetCollectorTest, LightAndDecalListsGrowByTheirStepsAndResetKeepsStorage)
+{
+	Collector collector;
+	EXPECT_EQ(collector.GetPointLights().GetCapacity(), 100);
+	EXPECT_EQ(collector.GetSpotLights().GetCapacity(), 100);
+	EXPECT_EQ(collector.GetDecals().GetCapacity(), 1000);
+	for (int light = 0; light < 101; ++light)
+	{
+		Zeph::PointLightData point;
+		point.myFalloff = static_cast<float>(light);
+		collector.AddPointLight(point);
+	}
+	EXPECT_EQ(collector.GetPointLights().GetCapacity(), 200) << "the 101st light grows the list by 100";
+	EXPECT_FLOAT_EQ(collector.GetPointLights()[100].myFalloff, 100.0f);
+	for (int decal = 0; decal < 1001; ++decal)
+	{
+		Zeph::DecalData record;
+		record.myTypeId = "type" + std::to_string(decal);
+		collector.AddDecal(record);
+	}
+	EXPECT_EQ(collector.GetDecals().GetCapacity(), 2000);
+	EXPECT_EQ(collector.GetDecals()[1000].myTypeId, "type1000") << "a decal's name is copied with it";
+
+	struct Effect : Zeph::AuxiliaryEffect
+	{
+		void Render() override {}
+	} effect;
+	collector.AddAuxiliary(&effect);
+	collector.SetAuxiliaryEntry({&effect, nullptr});
+	collector.Reset();
+	EXPECT_EQ(collector.GetPointLights().Count(), 0);
+	EXPECT_EQ(collector.GetDecals().Count(), 0);
+	EXPECT_EQ(collector.GetAuxiliaryList().Count(), 0);
+	EXPECT_TRUE(collector.GetAuxiliaryEntry().IsEmpty());
+	EXPECT_EQ(collector.GetPointLights().GetCapacity(), 200) << "Reset keeps the storage";
+}
+
+TEST(RenderTargetCollectorTest, RunnersCallBeginEveryBatchThenEnd)
+{
+	// Records the calls a runner makes.
+	struct Recorder : Zeph::RenderTargetHelper
+	{
+		void Begin(Zeph::RenderTargetCollector&) override { myCalls += "B"; }
+		void End(Zeph::RenderTargetCollector&) override { myCalls += "E"; }
+		void RenderAuxiliaryEntry(Zeph::RenderTargetCollector&) override { myCalls += "A"; }
+		void Render(const Zeph::RenderBatch& aBatch) override { myCalls += "s" + std::to_string(aBatch.GetCount()); }
+		void RenderSkinned(const Zeph::SkinnedRenderBatch& aBatch) override
+		{
+			myCalls += "k" + std::to_string(aBatch.GetCount());
+		}
+		std::string myCalls;
+	};
+	OneSurfaceModel still;
+	OneSurfaceModel skinned;
+	skinned.myModel.SetVertexType(Zeph::VERTEX_TYPE_POS_WEIGHT_BONES_NORM_UV_TAN_BI);
+	Collector collector;
+	collector.AddInstance(Zeph::RENDER_CATEGORY_SHADOW_CASTING, still.myModel, still.GetSurface(), At(0), At(0),
+	                      InRoom(-1));
+	collector.AddInstance(Zeph::RENDER_CATEGORY_SHADOW_CASTING, still.myModel, still.GetSurface(), At(1), At(1),
+	                      InRoom(-1));
+	collector.AddInstance(Zeph::RENDER_CATEGORY_UNSHADOWED, skinned.myModel, skinned.GetSurface(), At(0), At(0),
+	                      InRoom(-1));
+	collector.AddInstance(Zeph::RENDER_CATEGORY_UNSHADOWED, still.myModel, still.GetSurface(), At(0), At(0),
+	                      InRoom(-1));
+
+	Recorder shadow;
+	collector.RenderShadowCastingStatic(shadow);
+	EXPECT_EQ(shadow.myCalls, "ABs2E") << "the shadow-casting runner calls the auxiliary-entry hook first";
+	Recorder unshadowed;
+	collector.RenderUnshadowed(unshadowed);
+	EXPECT_EQ(unshadowed.myCalls, "Bs1k1E") << "static batches, then skinned ones";
+	Recorder forward;
+	collector.RenderForward(forward);
+	EXPECT_EQ(forward.myCalls, "BE") << "an empty list still begins and ends its pass";
 }
 
 TEST(RenderTargetCollectorTest, ResetEmptiesTheListsAndKeepsTheirStorage)

@@ -1,0 +1,26 @@
+#pragma once
+// LightMeshRenderTargetHelper: a debug view of the queued lights: when its render
+// flag is set, Begin draws every point and spot light's volume as a wireframe mesh
+// in the light's colour ("RenderMesh" of the light effects) into the bound target.
+#include "renderer/RenderTargetHelper.h"
+
+namespace Zeph
+{
+class DeferredRenderTargetHelper;
+
+class LightMeshRenderTargetHelper : public RenderTargetHelper
+{
+public:
+	void Init(DeferredRenderTargetHelper* aGBuffer) { myGBuffer = aGBuffer; }
+	void SetRenderFlag(bool aFlag) { myRenderFlag = aFlag; }
+	bool GetRenderFlag() const { return myRenderFlag; }
+
+	void Begin(RenderTargetCollector& aCollector) override;
+	void Render(const RenderBatch& aBatch) override { (void)aBatch; }
+	void RenderSkinned(const SkinnedRenderBatch& aBatch) override { (void)aBatch; }
+
+private:
+	DeferredRenderTargetHelper* myGBuffer = nullptr;
+	bool myRenderFlag = false;
+};
+} // namespace Zeph

@@ -1,0 +1,175 @@
+// The deferred frame on a headless engine: lights measured on the lit image (the
+// light's contribution is the difference from the same frame without it), the shadow
+// quality rule, the empty frame, and the settings files and setters.
+#include <algorithm>
+#include <gtest/gtest.h>
+#include <string>
+#include <vector>
+
+#include "FrameFixture.h"
+#include "platform/fx/Variable.h"
+#include "xml/XML.h"
+
+using namespace FrameTesting;
+
+TEST_F(FrameTest, PointLightReachesItsFalloffAndNoFurther)
+{
+	if (!Start())
+	{
+		return;
+	}
+	Place("data/models/room_small.dae", {0.0f, 0.0f, 0.0f});
+	Look({0.0f, 2.9f, 0.0f}, {0.0f, 0.0f, 0.0f}, {0.0f, 0.0f, 1.0f});
+	Render("point-light-off");
+	const std::vector<float> unlit = myLit;
+
+	Zeph::PointLightData light;
+	light.myPosition = Vector3<float>(0.0f, 0.5f, 0.0f);
+	light.myFalloff = 1.0f;
+	light.myColor = Vector4<float>(5.0f, 5.0f, 5.0f, 1.0f);
+	myPointLights.push_back(light);
+	Render("point-light-on");
+
+	// Floor points at horizontal distance r from the light's foot: distance to the
+	// light sqrt(r^2 + 0.25), so 0.748 is 0.9 x falloff and 1.09 is 1.2 x falloff.
+	const auto added = [&](float aRadius, float anAngle) {
+		const Pixel pixel = Project({aRadius * std::cos(anAngle), 0.0f, aRadius * std::sin(anAngle)});
+		return Luminance(myLit, pixel) - Luminance(unlit, pixel);
+	};
+	// Directions toward the picture's sides (it is wider than high).
+	for (float angle : {0.0f, 0.35f, 2.8f, 3.3f})
+	{
+		const float under = added(0.0f, angle);
+		const float atNineTenths = added(0.748f, angle);
+		EXPECT_GT(under, 0.02f) << "under the light";
+		EXPECT_GT(under, atNineTenths) << "angle " << angle;
+		EXPECT_GT(atNineTenths, 0.0f) << "angle " << angle;
+		EXPECT_NEAR(added(1.2f, angle), 0.0f, 1e-3f) << "beyond 1.2 x falloff, angle " << angle;
+		EXPECT_NEAR(added(1.8f, angle), 0.0f, 1e-3f) << "far beyond, angle " << angle;
+	}
+}
+
+TEST_F(FrameTest, SpotLightLightsInsideItsOuterConeOnly)
+{
+	if (!Start())
+	{
+		return;
+	}
+	Place("data/models/room_small.dae", {0.0f, 0.0f, 0.0f});
+	Look({0.0f, 2.9f, 0.0f}, {0.0f, 0.0f, 0.0f}, {0.0f, 0.0f, 1.0f});
+	Render("spot-light-off");
+	const std::vector<float> unlit = myLit;
+	// From 2.5 above the floor, outer cosine 0.8: the cone meets the floor at radius
+	// 2.5 x tan(acos 0.8) = 1.875; inner cosine 0.95: full strength within 0.82.
+	mySpotLights.push_back(SpotDown({0.0f, 2.5f, 0.0f}, 4.0f, 0.95f, 0.8f));
+	Render("spot-light-on");
+	const auto added = [&](float aRadius, float anAngle) {
+		const Pixel pixel = Project({aRadius * std::cos(anAngle), 0.0f, aRadius * std::sin(anAngle)});
+		return Luminance(myLit, pixel) - Luminance(unlit, pixel);
+	};
+	for (float angle : {0.0f, 0.3f, 2.9f, 3.4f})
+	{
+		EXPECT_GT(added(0.3f, angle), 0.02f) << "inside the inner cone, angle " << angle;
+		EXPECT_GT(added(0.3f, angle), added(1.5f, angle)) << "the cone fades toward its edge";
+		EXPECT_NEAR(added(1.95f, angle), 0.0f, 1e-3f) << "outside the outer cone, angle " << angle;
+	}
+}
+
+TEST_F(FrameTest, ShadowQualityPicksTheMapSizeAndRepairsTheSetting)
+{
+	if (!Start())
+	{
+		return;
+	}
+	struct Case
+	{
+		int mySetting;
+		int myQuality;
+		int mySize;
+	};
+	const Case cases[] = {{0, 0, 8}, {1, 1, 1024}, {2, 2, 2048}, {7, 3, 4096}, {-1, 3, 4096}};
+	Zeph::Engine* engine = Zeph::Engine::GetInstance();
+	for (const Case& test : cases)
+	{
+		engine->GetSetupInfo().myShadowQuality = test.mySetting;
+		ASSERT_TRUE(Renderer().Init(ourWidth, ourHeight));
+		EXPECT_EQ(Renderer().GetShadowQuality(), test.myQuality) << "setting " << test.mySetting;
+		EXPECT_EQ(Renderer().GetShadowMapSize(), test.mySize) << "setting " << test.mySetting;
+		EXPECT_EQ(engine->GetSetupInfo().myShadowQuality, test.myQuality) << "the setting is rewritten";
+	}
+}
+
+TEST_F(FrameTest, EveryPassRunsWithNothingQueuedAndLevelZeroDrawsNoShadowMap)
+{
+	if (!Start(0))
+	{
+		return;
+	}
+	Renderer().SetPassTimingFlag(true);
+	Render("empty");
+	std::vector<std::string> names;
+	for (const Zeph::Renderer::PassTime& pass : Renderer().GetPassTimes())
+	{
+		names.push_back(pass.myName);
+	}
+	for (const char* expected : {"G-buffer", "decals", "lights", "SSAO", "ambient", "forward", "tone map", "bloom",
+	                             "grading", "outline", "late"})
+	{
+		EXPECT_NE(std::find(names.begin(), names.end(), expected), names.end()) << expected;
+	}
+	EXPECT_EQ(std::find(names.begin(), names.end(), "shadow map"), names.end()) << "quality 0 renders no shadow map";
+	EXPECT_EQ(std::find(names.begin(), names.end(), "shadow resolve"), names.end());
+	// An empty lit image is black.
+	for (float value : myLit)
+	{
+		ASSERT_NEAR(value, 0.0f, 1e-6f);
+	}
+
+	ASSERT_TRUE(Zeph::Engine::GetInstance()->GetSetupInfo().myShadowQuality == 0);
+	Zeph::Engine::GetInstance()->GetSetupInfo().myShadowQuality = 1;
+	ASSERT_TRUE(Renderer().Init(ourWidth, ourHeight));
+	Renderer().SetPassTimingFlag(true);
+	Render("empty-with-shadows");
+	names.clear();
+	for (const Zeph::Renderer::PassTime& pass : Renderer().GetPassTimes())
+	{
+		names.push_back(pass.myName);
+	}
+	EXPECT_NE(std::find(names.begin(), names.end(), "shadow map"), names.end());
+}
+
+TEST_F(FrameTest, SettingsFilesAndSettersReachTheirVariablesInOrder)
+{
+	if (!Start())
+	{
+		return;
+	}
+	Zeph::Effect* effect = Renderer().GetFullScreenHelper().GetEffect();
+	ASSERT_NE(effect, nullptr);
+	const auto value = [effect](const char* aName) {
+		return effect->GetEffect()->GetVariableByName(aName)->GetFloats()[0];
+	};
+	// What Init read from the two files.
+	XML ssao("data/Shaders/SSAO.xml");
+	ASSERT_TRUE(ssao.GoToElement("ssao", "", ""));
+	EXPECT_FLOAT_EQ(value("SSAO_sample_rad"), ssao.GetAttribute<float>("sample-rad"));
+	EXPECT_FLOAT_EQ(value("SSAO_Intensity"), ssao.GetAttribute<float>("intensity"));
+	XML hdr("data/Shaders/HDRBloom.xml");
+	ASSERT_TRUE(hdr.GoToElement("hdr-bloom", "", ""));
+	EXPECT_FLOAT_EQ(value("lumMax"), hdr.GetAttribute<float>("lum-max"));
+	EXPECT_FLOAT_EQ(value("EmissiveMultiplier"), hdr.GetAttribute<float>("emissive-mult"));
+
+	Renderer().SetSSAOVariables(1.0f, 2.0f, 3.0f, 4.0f);
+	const char* ssaoNames[] = {"SSAO_scale", "SSAO_sample_rad", "SSAO_bias", "SSAO_Intensity"};
+	for (int index = 0; index < 4; ++index)
+	{
+		EXPECT_FLOAT_EQ(value(ssaoNames[index]), static_cast<float>(index + 1)) << ssaoNames[index];
+	}
+	Renderer().SetHDRandBloomVariables(1.0f, 2.0f, 3.0f, 4.0f, 5.0f, 6.0f);
+	const char* hdrNames[] = {"AutoExposureAdjustment", "lumMin", "lumMax", "BloomThreshold", "BloomFactor",
+	                          "EmissiveMultiplier"};
+	for (int index = 0; index < 6; ++index)
+	{
+		EXPECT_FLOAT_EQ(value(hdrNames[index]), static_cast<float>(index + 1)) << hdrNames[index];
+	}
+}
