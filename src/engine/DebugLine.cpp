@@ -10,6 +10,7 @@
 #include "engine/Instance.h"
 #include "model/Model.h"
 #include "model/ModelNode.h"
+#include "renderer/Renderer.h"
 
 namespace Zeph
 {
@@ -103,9 +104,11 @@ void DebugLine::SetVertexPosition(int anIndex, const Vector3<float>& aPosition)
 
 void DebugLine::Render()
 {
-	if (myInstance != nullptr)
+	// Lines are overlays (path edges): drawn after the frame's post-processing.
+	Engine* engine = Engine::GetInstance();
+	if (myInstance != nullptr && engine != nullptr)
 	{
-		myInstance->Render();
+		engine->GetRenderer().RenderLateInstance(myInstance);
 	}
 }
 } // namespace Zeph

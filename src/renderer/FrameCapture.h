@@ -16,6 +16,8 @@
 // moment wants a few frames (20 leave about 1 % of the start exposure's influence).
 #include <cstdint>
 #include <functional>
+
+#include "core/Vector3.h"
 #include <string>
 #include <vector>
 
@@ -33,5 +35,8 @@ bool RenderAndRead(const std::function<void()>& aQueue, int aFrameCount, std::ve
                    int& aWidthOut, int& aHeightOut);
 // The same into a PNG (written to a temporary and renamed), opaque.
 bool RenderToPng(const std::function<void()>& aQueue, int aFrameCount, const std::string& aPath);
+// Stands in for a baked volume: a 2 x 2 x 2 irradiance volume over the given box in
+// which every direction receives irradiance / pi = aLevel (grey, clamped to 0..1).
+bool UploadUniformAmbient(float aLevel, const Vector3<float>& aWorldMin, const Vector3<float>& aWorldSize);
 } // namespace FrameCapture
 } // namespace Zeph

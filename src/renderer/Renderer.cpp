@@ -46,9 +46,9 @@ Fx::Variable* FullScreenVariable(FullScreenHelper& aHelper, const char* aName)
 
 // A depth buffer of the frame: R24G8_TYPELESS with a D24S8 depth view and an R24X8
 // shader view; each step's failure is reported at its own line.
-bool CreateDepthBuffer(int aWidth, int aHeight, const char* aFunction, const char* aText, const int (&someLines)[3],
-                       std::unique_ptr<Gpu::Texture>& aTextureOut, Gpu::DepthStencilView*& aDepthOut,
-                       Gpu::ShaderResourceView*& aShaderOut)
+bool CreateDepthBuffer(int aWidth, int aHeight, const char* aFunction, const char* aText,
+                       const int (&someLines)[3], std::unique_ptr<Gpu::Texture>& aTextureOut,
+                       Gpu::DepthStencilView*& aDepthOut, Gpu::ShaderResourceView*& aShaderOut)
 {
 	Gpu::TextureDesc desc;
 	desc.myWidth = aWidth;
@@ -120,8 +120,8 @@ bool Renderer::Init(int aWidth, int aHeight)
 	myPingPong[0] = myHDRTargets[0].get();
 	myPingPong[1] = myHDRTargets[1].get();
 	myPingPongIndex = 0;
-	PostProcessManager* const stages[] = {&myBloomManager,     &myHDRManager,          &myMotionBlurManager,
-	                                      &mySSAOManager,      &myColorGradingManager, &myOutlineManager,
+	PostProcessManager* const stages[] = {&myBloomManager, &myHDRManager,          &myMotionBlurManager,
+	                                      &mySSAOManager,  &myColorGradingManager, &myOutlineManager,
 	                                      &myFXAAManager};
 	for (PostProcessManager* stage : stages)
 	{
@@ -199,28 +199,31 @@ void Renderer::Destroy()
 bool Renderer::SetupShadowDepthBuffer()
 {
 	return CreateDepthBuffer(myShadowMapSize, myShadowMapSize, "Zeph::Renderer::SetupShadowDepthBuffer",
-	                         "Failed at shadow depth", {464, 483, 501}, myShadowDepthTexture, myShadowDepthView,
-	                         myShadowDepthShaderView);
+	                         "Failed at shadow depth", {464, 483, 501}, myShadowDepthTexture,
+	                         myShadowDepthView, myShadowDepthShaderView);
 }
 
 bool Renderer::SetupSpecialDepthBuffer()
 {
 	return CreateDepthBuffer(myWidth, myHeight, "Zeph::Renderer::SetupSpecialDepthBuffer",
-	                         "Failed at special depth", {533, 552, 570}, mySpecialDepthTexture, mySpecialDepthView,
-	                         mySpecialDepthShaderView);
+	                         "Failed at special depth", {533, 552, 570}, mySpecialDepthTexture,
+	                         mySpecialDepthView, mySpecialDepthShaderView);
 }
 
 void Renderer::RegisterDebugTextures()
 {
 	myDebugTextures.clear();
 	myDebugTextures.push_back({"motion-blur", myMotionBlurManager.GetBuffer(), nullptr, "Render"});
-	myDebugTextures.push_back(
-	    {"linear-depth", myDeferredHelper.GetTarget(DeferredRenderTargetHelper::LINEAR_DEPTH), nullptr, "RenderDepth"});
+	myDebugTextures.push_back({"linear-depth",
+	                           myDeferredHelper.GetTarget(DeferredRenderTargetHelper::LINEAR_DEPTH), nullptr,
+	                           "RenderDepth"});
 	myDebugTextures.push_back({"ssao", mySSAOManager.GetOcclusionBuffer(), nullptr, "RenderRToWhite"});
-	myDebugTextures.push_back(
-	    {"deferred-albedo", myDeferredHelper.GetTarget(DeferredRenderTargetHelper::ALBEDO), nullptr, "Render"});
-	myDebugTextures.push_back(
-	    {"deferred-normal", myDeferredHelper.GetTarget(DeferredRenderTargetHelper::NORMAL), nullptr, "Render"});
+	myDebugTextures.push_back({"deferred-albedo",
+	                           myDeferredHelper.GetTarget(DeferredRenderTargetHelper::ALBEDO), nullptr,
+	                           "Render"});
+	myDebugTextures.push_back({"deferred-normal",
+	                           myDeferredHelper.GetTarget(DeferredRenderTargetHelper::NORMAL), nullptr,
+	                           "Render"});
 	myDebugTextures.push_back({"shadow-map", nullptr, myShadowDepthShaderView, "RenderRToWhite"});
 }
 
@@ -292,12 +295,13 @@ void Renderer::SetSSAOVariables(float aScale, float aSampleRadius, float aBias, 
 	}
 }
 
-void Renderer::SetHDRandBloomVariables(float anAutoExposure, float aLumMin, float aLumMax, float aBloomThreshold,
-                                       float aBloomFactor, float anEmissiveMultiplier)
+void Renderer::SetHDRandBloomVariables(float anAutoExposure, float aLumMin, float aLumMax,
+                                       float aBloomThreshold, float aBloomFactor, float anEmissiveMultiplier)
 {
 	const char* const names[] = {"AutoExposureAdjustment", "lumMin",      "lumMax",
 	                             "BloomThreshold",         "BloomFactor", "EmissiveMultiplier"};
-	const float values[] = {anAutoExposure, aLumMin, aLumMax, aBloomThreshold, aBloomFactor, anEmissiveMultiplier};
+	const float values[] = {anAutoExposure,  aLumMin,      aLumMax,
+	                        aBloomThreshold, aBloomFactor, anEmissiveMultiplier};
 	for (int index = 0; index < 6; ++index)
 	{
 		if (Fx::Variable* variable = FullScreenVariable(myFullScreenHelper, names[index]))
@@ -344,7 +348,8 @@ void Renderer::UpdateScreenCamera(const CameraInstance& aCamera)
 	}
 }
 
-bool Renderer::UploadSHToGPU(bool anUpdateFlag, const std::vector<uint32_t>* someBlocks, int anX, int aY, int aZ)
+bool Renderer::UploadSHToGPU(bool anUpdateFlag, const std::vector<uint32_t>* someBlocks, int anX, int aY,
+                             int aZ)
 {
 	if (!myProbeHelper)
 	{
@@ -481,7 +486,8 @@ void Renderer::RenderLights(DeferredRenderTargetHelper& aGBuffer)
 		{
 			for (const auto& input : inputs)
 			{
-				effect->SetShaderResource(input.myName, aGBuffer.GetTarget(input.mySlot)->GetShaderResourceView());
+				effect->SetShaderResource(input.myName,
+				                          aGBuffer.GetTarget(input.mySlot)->GetShaderResourceView());
 			}
 		}
 	}
@@ -510,8 +516,8 @@ void Renderer::RenderAmbient(DeferredRenderTargetHelper& aGBuffer, int aWidth, i
 		effect->SetShaderResource(input.myName, aGBuffer.GetTarget(input.mySlot)->GetShaderResourceView());
 	}
 	Texture* depth = aGBuffer.GetTarget(DeferredRenderTargetHelper::LINEAR_DEPTH);
-	myFullScreenHelper.Process("RenderAmbient", depth->GetShaderResourceView(), aWidth, aHeight, myCurrentOutput,
-	                           MakeViewport(aWidth, aHeight));
+	myFullScreenHelper.Process("RenderAmbient", depth->GetShaderResourceView(), aWidth, aHeight,
+	                           myCurrentOutput, MakeViewport(aWidth, aHeight));
 	for (const auto& input : inputs)
 	{
 		effect->SetShaderResource(input.myName, nullptr);
@@ -595,7 +601,8 @@ void Renderer::RenderDebugTextures()
 void Renderer::Render(Gpu::RenderTargetView* aBackBuffer, Gpu::DepthStencilView* aDepth)
 {
 	Engine* engine = Engine::GetInstance();
-	if (engine == nullptr || aBackBuffer == nullptr || !myHDRTargets[0] || myFullScreenHelper.GetEffect() == nullptr)
+	if (engine == nullptr || aBackBuffer == nullptr || !myHDRTargets[0] ||
+	    myFullScreenHelper.GetEffect() == nullptr)
 	{
 		myCollector.Reset();
 		myLateItems.RemoveAll();
@@ -635,8 +642,10 @@ void Renderer::Render(Gpu::RenderTargetView* aBackBuffer, Gpu::DepthStencilView*
 	if (myShadowQuality != 0)
 	{
 		BeginPass("shadow resolve");
-		myShadowHelper.Resolve(myFullScreenHelper, myShadowDepthShaderView,
-		                       myDeferredHelper.GetTarget(DeferredRenderTargetHelper::LINEAR_DEPTH)->GetShaderResourceView());
+		myShadowHelper.Resolve(
+		    myFullScreenHelper, myShadowDepthShaderView,
+		    myDeferredHelper.GetTarget(DeferredRenderTargetHelper::LINEAR_DEPTH)->GetShaderResourceView(),
+		    myDeferredHelper.GetTarget(DeferredRenderTargetHelper::NORMAL)->GetShaderResourceView());
 		context.SetViewport(myScreenViewport);
 	}
 	BeginPass("lights");
@@ -663,6 +672,11 @@ void Renderer::Render(Gpu::RenderTargetView* aBackBuffer, Gpu::DepthStencilView*
 	context.SetViewport(myScreenViewport);
 	Gpu::RenderTargetView* const backBuffer[] = {myBackBuffer};
 	context.SetRenderTargets(backBuffer, nullptr);
+	// Effects that leave a state group unnamed keep the current one: the late items
+	// start from the defaults, not from whatever the last post stage blended with.
+	context.SetBlendState(Gpu::BlendState());
+	context.SetDepthStencilState(Gpu::DepthStencilState());
+	context.SetRasterizerState(Gpu::RasterizerState());
 	if (myCollector.GetAuxiliaryList().Count() > 0)
 	{
 		myStandardHelper.RenderAuxiliaryList(myCollector);

@@ -11,8 +11,8 @@
 #include "engine/Texture.h"
 #include "model/Model.h"
 #include "platform/fx/Variable.h"
-#include "renderer/RenderTargetCollector.h"
 #include "platform/gpu/StateCache.h"
+#include "renderer/RenderTargetCollector.h"
 #include "renderer/post/FullScreenHelper.h"
 
 namespace Zeph
@@ -62,7 +62,8 @@ bool ShadowRenderTargetHelper::Init(int aShadowMapSize, int aWidth, int aHeight)
 	{
 		Effect* effect = engine->GetEffectContainer().GetEffect(ShaderFiles[ourShadowEffects[index]]);
 		Fx::Effect* fx = effect != nullptr ? effect->GetEffect() : nullptr;
-		myViewProjectionVariables[index] = fx != nullptr ? fx->GetVariableByName("ShadowCasterViewProj") : nullptr;
+		myViewProjectionVariables[index] =
+		    fx != nullptr ? fx->GetVariableByName("ShadowCasterViewProj") : nullptr;
 		myLightRadiusVariables[index] = fx != nullptr ? fx->GetVariableByName("LightRadiusUV") : nullptr;
 		myBiasVariables[index] = fx != nullptr ? fx->GetVariableByName("ShadowBias") : nullptr;
 	}
@@ -81,13 +82,14 @@ void ShadowRenderTargetHelper::Destroy()
 }
 
 Matrix44<float> ShadowRenderTargetHelper::FitCaster(const Vector3<float>& aDirection,
-                                                    const Matrix44<float>& aCameraWorld, float aNear, float aFar)
+                                                    const Matrix44<float>& aCameraWorld, float aNear,
+                                                    float aFar)
 {
 	Vector3<float> direction = aDirection;
 	direction.Normalize();
 	// Looking straight up or down, the world's up is parallel to the view: use +Z as up.
-	const Vector3<float> up = std::abs(direction.y) > 0.999f ? Vector3<float>(0.0f, 0.0f, 1.0f)
-	                                                         : Vector3<float>(0.0f, 1.0f, 0.0f);
+	const Vector3<float> up =
+	    std::abs(direction.y) > 0.999f ? Vector3<float>(0.0f, 0.0f, 1.0f) : Vector3<float>(0.0f, 1.0f, 0.0f);
 	const Matrix44<float> casterView = CreateLookToLH(Vector3<float>(0.0f, 0.0f, 0.0f), direction, up);
 	const Matrix44<float> toCaster = aCameraWorld * casterView;
 	Vector3<float> minimum(2000000.0f, 2000000.0f, 2000000.0f);
@@ -151,7 +153,8 @@ void ShadowRenderTargetHelper::RenderSkinned(const SkinnedRenderBatch& aBatch)
 
 void ShadowRenderTargetHelper::Resolve(FullScreenHelper& aFullScreenHelper,
                                        Gpu::ShaderResourceView* aShadowDepth,
-                                       Gpu::ShaderResourceView* aLinearDepth)
+                                       Gpu::ShaderResourceView* aLinearDepth,
+                                       Gpu::ShaderResourceView* aNormals)
 {
 	Effect* effect = aFullScreenHelper.GetEffect();
 	if (effect == nullptr || !myTarget || myTarget->GetRenderTargetView() == nullptr)
@@ -159,6 +162,8 @@ void ShadowRenderTargetHelper::Resolve(FullScreenHelper& aFullScreenHelper,
 		return;
 	}
 	effect->SetShaderResource("ShadowDepthTexture", aShadowDepth);
+	effect->SetShaderResource("ShadowBlockerTexture", aShadowDepth);
+	effect->SetShaderResource("NormalTexture", aNormals);
 	effect->SetShaderResource("LinearDepthTexture", aLinearDepth);
 	// The linear depth is the source: the target must not be read while it is written.
 	const int width = static_cast<int>(myTarget->GetImageInfo().myWidth);
@@ -169,7 +174,9 @@ void ShadowRenderTargetHelper::Resolve(FullScreenHelper& aFullScreenHelper,
 	aFullScreenHelper.Process("RenderShadowMap", aLinearDepth, width, height, myTarget->GetRenderTargetView(),
 	                          viewport);
 	effect->SetShaderResource("ShadowDepthTexture", nullptr);
-	Engine::GetInstance()->GetEffectContainer().ForEachEffect(
-	    [this](Effect& anEffect) { anEffect.SetShaderResource("ShadowMap", myTarget->GetShaderResourceView()); });
+	effect->SetShaderResource("ShadowBlockerTexture", nullptr);
+	Engine::GetInstance()->GetEffectContainer().ForEachEffect([this](Effect& anEffect) {
+		anEffect.SetShaderResource("ShadowMap", myTarget->GetShaderResourceView());
+	});
 }
 } // namespace Zeph

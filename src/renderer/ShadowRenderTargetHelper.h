@@ -53,10 +53,11 @@ public:
 	void Render(const RenderBatch& aBatch) override;
 	void RenderSkinned(const SkinnedRenderBatch& aBatch) override;
 
-	// Resolves the shadow map against the G-buffer's linear depth with
-	// "RenderShadowMap" into the target and publishes it as "ShadowMap".
+	// Resolves the shadow map against the G-buffer's linear depth (and its normals,
+	// which offset each receiver off its surface) with "RenderShadowMap" into the
+	// target and publishes it as "ShadowMap".
 	void Resolve(FullScreenHelper& aFullScreenHelper, Gpu::ShaderResourceView* aShadowDepth,
-	             Gpu::ShaderResourceView* aLinearDepth);
+	             Gpu::ShaderResourceView* aLinearDepth, Gpu::ShaderResourceView* aNormals);
 
 	// The caster fit on its own (for tests): view along aDirection, orthographic
 	// bounds of the viewer's box transformed by aCameraWorld.

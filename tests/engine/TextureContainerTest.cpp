@@ -53,11 +53,13 @@ TEST_F(EngineTest, TheSameNameGivesTheSameTextureAndAMissingFileIsTriedAgain)
 		return;
 	}
 	Zeph::TextureContainer& container = Zeph::Engine::GetInstance()->GetTextureContainer();
+	// Whatever the engine loaded for itself at start-up is not counted.
+	const size_t baseline = container.GetCount();
 	const std::string path = myScratch.File("textures/albedo.dds");
 	std::filesystem::create_directories(myScratch.Path() / "textures");
 
 	EXPECT_EQ(container.GetTexture(path, false), nullptr) << "not written yet";
-	EXPECT_EQ(container.GetCount(), 0u);
+	EXPECT_EQ(container.GetCount(), baseline);
 	EXPECT_EQ(TakeLog().find("CRITICAL ERROR"), std::string::npos)
 	    << "a missing texture is the caller's to report";
 
@@ -72,7 +74,7 @@ TEST_F(EngineTest, TheSameNameGivesTheSameTextureAndAMissingFileIsTriedAgain)
 	EXPECT_EQ(container.GetTexture(path, true), texture) << "the second request does not touch the file";
 	EXPECT_EQ(texture->GetShaderResourceView()->GetFormat(), Dds::Format::R8G8B8A8_UNORM)
 	    << "the sRGB flag of a later request changes nothing";
-	EXPECT_EQ(container.GetCount(), 1u);
+	EXPECT_EQ(container.GetCount(), baseline + 1u);
 
 	WriteDds(path, Dds::Format::R8G8B8A8_UNORM, 8, 1, 1, 0);
 	container.Clear();

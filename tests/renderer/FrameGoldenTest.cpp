@@ -31,7 +31,8 @@ protected:
 		return true;
 	}
 
-	static Zeph::PointLightData Point(const Vector3<float>& aPosition, float aFalloff, const Vector4<float>& aColor)
+	static Zeph::PointLightData Point(const Vector3<float>& aPosition, float aFalloff,
+	                                  const Vector4<float>& aColor)
 	{
 		Zeph::PointLightData light;
 		light.myPosition = aPosition;
@@ -43,21 +44,8 @@ protected:
 	// A uniform irradiance volume over the room: every probe gives E / pi = aLevel.
 	static void UploadUniformAmbient(float aLevel)
 	{
-		const auto pack = [](float aX, float aY, float aZ, float aW) {
-			const auto byte = [](float aValue) {
-				return static_cast<uint32_t>((std::clamp(aValue, -1.0f, 1.0f) + 1.0f) * 0.5f * 255.0f);
-			};
-			return byte(aX) | byte(aY) << 8 | byte(aZ) << 16 | byte(aW) << 24;
-		};
-		std::vector<uint32_t> blocks[7];
-		for (int block = 0; block < 7; ++block)
-		{
-			// cAr, cAg, cAb carry the constant in w; every other coefficient is 0.
-			blocks[block].assign(8, block < 3 ? pack(0.0f, 0.0f, 0.0f, aLevel) : pack(0.0f, 0.0f, 0.0f, 0.0f));
-		}
-		Zeph::Renderer& renderer = Zeph::Engine::GetInstance()->GetRenderer();
-		ASSERT_TRUE(renderer.UploadSHToGPU(false, blocks, 2, 2, 2));
-		renderer.SetVolumeBounds({-2.0f, 0.0f, -2.0f}, {4.0f, 3.0f, 4.0f});
+		ASSERT_TRUE(
+		    Zeph::FrameCapture::UploadUniformAmbient(aLevel, {-2.0f, 0.0f, -2.0f}, {4.0f, 3.0f, 4.0f}));
 	}
 };
 } // namespace
@@ -92,16 +80,24 @@ TEST_F(FrameGoldenTest, DecalOnAWall)
 	}
 	Zeph::TextureContainer& textures = Zeph::Engine::GetInstance()->GetTextureContainer();
 	Zeph::DecalData decal;
-	decal.myPosition = Vector3<float>(-0.3f, 1.4f, 2.0f);
-	decal.myNorm = Vector3<float>(0.0f, 0.0f, -1.0f);
-	decal.mySize = 1.0f;
+	// A marble plate on the brick wall at the left of the picture (x = -2, facing +X).
+	decal.myPosition = Vector3<float>(-2.0f, 1.3f, -0.2f);
+	decal.myNorm = Vector3<float>(1.0f, 0.0f, 0.0f);
+	decal.mySize = 0.9f;
 	decal.myDepth = 0.3f;
-	decal.myTexture = textures.GetTexture("data/textures/metal_albedo.dds", true);
-	decal.myNormalTexture = textures.GetTexture("data/textures/metal_normal.dds", false);
+	decal.myTexture = textures.GetTexture("data/textures/marble_albedo.dds", true);
+	decal.myNormalTexture = textures.GetTexture("data/textures/marble_normal.dds", false);
 	ASSERT_NE(decal.myTexture, nullptr);
+	myPointLights.push_back(Point({-0.8f, 1.6f, -0.2f}, 3.0f, {4.0f, 4.0f, 4.0f, 1.0f}));
+	Render("golden-decal-off", ourSettleFrames);
+	const std::vector<float> without = myLit;
 	myDecals.push_back(decal);
-	myPointLights.push_back(Point({-0.2f, 1.5f, 1.0f}, 2.5f, {5.0f, 5.0f, 5.0f, 1.0f}));
 	Render("golden-decal", ourSettleFrames);
+	const Pixel centre = Project(decal.myPosition);
+	const Pixel outside = Project({-2.0f, 0.5f, 0.8f});
+	// The white plate brightens the red wall where it lies and nowhere else.
+	EXPECT_GT(Luminance(myLit, centre), 2.0f * Luminance(without, centre));
+	EXPECT_NEAR(Luminance(myLit, outside), Luminance(without, outside), 1e-3f);
 	ExpectGolden("frame-decal");
 }
 
@@ -113,9 +109,16 @@ TEST_F(FrameGoldenTest, PillarShadowsTheAmbientLight)
 	}
 	Place("data/models/pillar.dae", {0.4f, 0.0f, 0.2f});
 	UploadUniformAmbient(0.6f);
-	// The caster comes down steeply from behind the viewer's right.
-	Renderer().GetShadowHelper().SetCasterDirection({-0.45f, -1.0f, 0.35f});
+	// The caster's light travels down and to the viewer's right, so the pillar's shadow
+	// crosses the floor at the right of its base. A floor point the pillar hides at
+	// 0.8 units of height is compared with the same point lit from the other side.
+	const Pixel shaded = Project({0.4f + 0.45f * 0.8f, 0.0f, 0.2f + 0.3f * 0.8f});
+	Renderer().GetShadowHelper().SetCasterDirection({-0.45f, -1.0f, -0.3f});
+	Render("golden-pillar-shadow-away", ourSettleFrames);
+	const float unshaded = Luminance(myLit, shaded);
+	Renderer().GetShadowHelper().SetCasterDirection({0.45f, -1.0f, 0.3f});
 	Render("golden-pillar-shadow", ourSettleFrames);
+	EXPECT_LT(Luminance(myLit, shaded), 0.6f * unshaded);
 	ExpectGolden("frame-pillar-shadow");
 }
 
@@ -145,12 +148,32 @@ TEST_F(FrameGoldenTest, LateGizmoIsDrawnOverTheScene)
 	Zeph::ModelNode* box = Zeph::Engine::GetInstance()->GetModelFactory().CreateAABB(
 	    "gizmo", {0.15f, 0.15f, 0.15f}, {1.0f, 0.0f, 0.0f, 1.0f}, Gpu::PrimitiveTopology::TriangleList);
 	ASSERT_NE(box, nullptr);
-	myInstances.push_back(std::make_unique<Zeph::Instance>(box));
-	Zeph::Instance* gizmo = myInstances.back().get();
-	myInstances.pop_back();
+	auto gizmo = std::make_unique<Zeph::Instance>(box);
 	gizmo->SetPosition({-0.9f, 0.4f, 1.2f});
-	myLateInstances.push_back(gizmo);
+	myLateInstances.push_back(gizmo.get());
 	Render("golden-late-gizmo", ourSettleFrames);
 	ExpectGolden("frame-late-gizmo");
-	delete gizmo;
+}
+
+TEST_F(FrameGoldenTest, SampleModelsShowTheirTexturesAndMaterials)
+{
+	if (!Start())
+	{
+		return;
+	}
+	// Concrete tiles, a wooden crate, a marble pillar and the two-material knot (metal
+	// and marble), under a warm and a cool light and a dim ambient.
+	Place("data/models/floor_tile_concrete.dae", {-1.0f, 0.0f, -1.0f});
+	Place("data/models/floor_tile_concrete.dae", {1.0f, 0.0f, -1.0f});
+	Place("data/models/floor_tile_concrete.dae", {-1.0f, 0.0f, 1.0f});
+	Place("data/models/floor_tile_concrete.dae", {1.0f, 0.0f, 1.0f});
+	Place("data/models/crate.dae", {-1.0f, 0.0f, -0.4f});
+	Place("data/models/pillar.dae", {1.1f, 0.0f, 0.9f});
+	Place("data/models/sculpture_knot.dae", {0.2f, 0.0f, 0.4f});
+	ASSERT_TRUE(Zeph::FrameCapture::UploadUniformAmbient(0.15f, {-2.0f, 0.0f, -2.0f}, {4.0f, 3.0f, 4.0f}));
+	myPointLights.push_back(Point({1.2f, 2.0f, -1.2f}, 4.0f, {6.0f, 5.0f, 3.6f, 1.0f}));
+	myPointLights.push_back(Point({-1.4f, 1.6f, 1.4f}, 3.5f, {1.6f, 2.4f, 4.0f, 1.0f}));
+	Look({3.2f, 2.6f, -3.6f}, {0.0f, 0.6f, 0.2f});
+	Render("golden-sample-models", ourSettleFrames);
+	ExpectGolden("frame-sample-models");
 }

@@ -12,10 +12,16 @@ const vec2 ourShadowDisc[16] = vec2[](
     vec2(-0.24188840, 0.99706507), vec2(-0.81409955, 0.91437590), vec2(0.19984126, 0.78641367),
     vec2(0.14383161, -0.14100790));
 
-// Sun visibility of a world position: 1 lit, 0 shadowed, 1 outside the caster's box.
-float SunVisibility(vec3 aWorldPosition, vec2 aPixel)
+// Sun visibility of a world position on a surface with the given world normal: 1 lit,
+// 0 shadowed, 1 outside the caster's box. The receiver is moved off its surface by
+// two shadow texels along the normal, so that a surface does not shadow itself where
+// it meets the light at a grazing angle.
+float SunVisibility(vec3 aWorldPosition, vec3 aWorldNormal, vec2 aPixel)
 {
-	vec4 clip = ShadowCasterViewProj * vec4(aWorldPosition, 1.0);
+	vec2 mapSize = vec2(max(textureSize(ShadowBlockerTexture, 0), ivec2(1)));
+	float texelWorld = 2.0 / max(abs(ShadowCasterViewProj[0][0]) * mapSize.x, ourEpsilon);
+	vec3 receiver = aWorldPosition + aWorldNormal * (2.0 * texelWorld);
+	vec4 clip = ShadowCasterViewProj * vec4(receiver, 1.0);
 	if (abs(clip.w) < ourEpsilon)
 	{
 		return 1.0;
@@ -28,8 +34,31 @@ float SunVisibility(vec3 aWorldPosition, vec2 aPixel)
 	// Clip y up is texture row 0 (upper-left origin).
 	vec2 uv = vec2(ndc.x * 0.5 + 0.5, 0.5 - ndc.y * 0.5);
 	float reference = ndc.z - ShadowBias;
-	float radius = max(LightRadiusUV.x, 0.0);
+	float lightRadius = max(LightRadiusUV.x, 0.0);
 	mat2 rotation = Rotation(PixelNoise(aPixel) * 6.28318531);
+	vec2 texel = 1.0 / mapSize;
+
+	// Contact-hardening filter: the penumbra widens with the distance (in the caster's
+	// normalised depth) between the receiver and the average blocker found nearby, as
+	// under a light LightRadiusUV wide; it is at least one texel and at most the light.
+	float searchRadius = max(lightRadius * 0.1, texel.x);
+	float blockerSum = 0.0;
+	float blockerCount = 0.0;
+	for (int tap = 0; tap < ourShadowTapCount; ++tap)
+	{
+		float depth = texture(ShadowBlockerTexture, uv + rotation * ourShadowDisc[tap] * searchRadius).r;
+		if (depth < reference)
+		{
+			blockerSum += depth;
+			blockerCount += 1.0;
+		}
+	}
+	if (blockerCount == 0.0)
+	{
+		return 1.0;
+	}
+	float blocker = blockerSum / blockerCount;
+	float radius = clamp((reference - blocker) * lightRadius, texel.x, lightRadius);
 	float lit = 0.0;
 	for (int tap = 0; tap < ourShadowTapCount; ++tap)
 	{
@@ -54,7 +83,9 @@ fragment PS_ShadowMap
 			return;
 		}
 		vec3 world = (invView * vec4(vFrustumRay * depth, 1.0)).xyz;
-		oColor = vec4(SunVisibility(world, gl_FragCoord.xy));
+		vec3 viewNormal = DecodeNormal(texture(NormalTexture, vTexCoord));
+		vec3 worldNormal = SafeNormalize(mat3(invView) * viewNormal, vec3(0.0, 1.0, 0.0));
+		oColor = vec4(SunVisibility(world, worldNormal, gl_FragCoord.xy));
 	}
 }
 

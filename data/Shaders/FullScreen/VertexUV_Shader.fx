@@ -54,6 +54,8 @@ uniform mat4 ShadowCasterViewProj;
 uniform vec4 LightRadiusUV;
 uniform float ShadowBias;
 uniform sampler2DShadow ShadowDepthTexture;
+// The same depth map read as depths, for the blocker search.
+uniform sampler2D ShadowBlockerTexture;
 
 // Ambient occlusion.
 uniform vec4 Randvectors[16];
@@ -244,6 +246,14 @@ sampler ShadowDepthTexture
 {
 	Filter = COMPARISON_MIN_MAG_MIP_LINEAR;
 	ComparisonFunc = LessEqual;
+	AddressU = Border;
+	AddressV = Border;
+	BorderColor = float4(1.0, 1.0, 1.0, 1.0);
+}
+
+sampler ShadowBlockerTexture
+{
+	Filter = MIN_MAG_MIP_POINT;
 	AddressU = Border;
 	AddressV = Border;
 	BorderColor = float4(1.0, 1.0, 1.0, 1.0);

@@ -38,6 +38,15 @@ sampler DecalNormalTexture
 	AddressV = Clamp;
 }
 
+vec2 FiniteGradient(vec2 aGradient)
+{
+	if (any(isnan(aGradient)) || any(isinf(aGradient)))
+	{
+		return vec2(0.0);
+	}
+	return clamp(aGradient, vec2(-1.0), vec2(1.0));
+}
+
 vertex VS_Box
 {
 	in vec3 POSITION;
@@ -60,13 +69,21 @@ fragment PS_Decal
 		ivec2 size = max(textureSize(DepthTexture, 0), ivec2(1));
 		ivec2 texel = clamp(ivec2(gl_FragCoord.xy), ivec2(0), size - 1);
 		float depth = texelFetch(DepthTexture, texel, 0).r;
+		vec3 viewPosition = ViewPositionFromDepth(gl_FragCoord.xy / vec2(size), depth, Projection, FarPlane);
+		vec4 world = InvView * vec4(viewPosition, 1.0);
+		vec3 local = (InvWorld * world).xyz;
+		// The projected coordinate and its gradients are made before any pixel is
+		// discarded (gradients are undefined after) and kept finite and bounded: across a
+		// depth edge or a degenerate box the coordinate jumps or overflows, and unbounded
+		// coordinates stall anisotropic filtering.
+		vec2 uv = vec2(local.x + 0.5, 0.5 - local.y);
+		uv = any(isnan(uv)) || any(isinf(uv)) ? vec2(0.0) : clamp(uv, vec2(-4.0), vec2(4.0));
+		vec2 uvDx = FiniteGradient(dFdx(uv));
+		vec2 uvDy = FiniteGradient(dFdy(uv));
 		if (depth < 0.0)
 		{
 			discard;
 		}
-		vec3 viewPosition = ViewPositionFromDepth(gl_FragCoord.xy / vec2(size), depth, Projection, FarPlane);
-		vec4 world = InvView * vec4(viewPosition, 1.0);
-		vec3 local = (InvWorld * world).xyz;
 		if (any(greaterThan(abs(local), vec3(0.5))))
 		{
 			discard;
@@ -83,8 +100,7 @@ fragment PS_Decal
 			discard;
 		}
 
-		vec2 uv = vec2(local.x + 0.5, 0.5 - local.y);
-		vec4 color = texture(DecalTexture, uv);
+		vec4 color = textureGrad(DecalTexture, uv, uvDx, uvDy);
 		float alpha = clamp(color.a * facing, 0.0, 1.0);
 
 		// The decal's tangent frame: its box's right axis, the axis the normal map's green
@@ -92,7 +108,7 @@ fragment PS_Decal
 		vec3 right = SafeNormalize(vec3(World[0].xyz), vec3(1.0, 0.0, 0.0));
 		right = SafeNormalize(right - decalNormal * dot(right, decalNormal), vec3(1.0, 0.0, 0.0));
 		vec3 up = cross(decalNormal, right);
-		vec3 tangentNormal = texture(DecalNormalTexture, uv).xyz * 2.0 - 1.0;
+		vec3 tangentNormal = textureGrad(DecalNormalTexture, uv, uvDx, uvDy).xyz * 2.0 - 1.0;
 		vec3 worldNormal = SafeNormalize(mat3(right, up, decalNormal) * tangentNormal, decalNormal);
 		vec3 viewNormal = SafeNormalize(mat3(View) * worldNormal, vec3(0.0, 0.0, -1.0));
 
