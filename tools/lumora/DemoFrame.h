@@ -1,9 +1,8 @@
 #pragma once
-// A frame rendered through the engine headless: the sample models (floor tiles, a
-// crate, a pillar, an arch, the knot sculpture, a room shell) imported from data/,
-// placed as instances, lit by one directional light and drawn by the renderer, with
-// the camera's info line on top. It shows that import, textures, effects, the camera
-// and the frame work together on this machine, until the editor draws levels.
+// A frame rendered through the engine headless: the demo scene (DemoScene.h) drawn
+// by the deferred renderer after 20 frames of eye adaptation. It shows that import,
+// textures, effects, lights, decals, the camera and the frame work together on this
+// machine, until the editor draws levels.
 
 #include <string>
 
