@@ -1,0 +1,258 @@
+// The path graph's visuals in a headless frame (160 x 90): red marker boxes at the nodes
+// and a green line between them, drawn over the finished image and read back from the
+// back buffer. Frames are saved under /tmp/lumora-ai-tests/ to be looked at.
+#include <cmath>
+#include <cstdint>
+#include <gtest/gtest.h>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "ai/NGEdge.h"
+#include "ai/NGNode.h"
+#include "engine/Camera.h"
+#include "engine/CameraInstance.h"
+#include "engine/DebugLine.h"
+#include "engine/EngineFixture.h"
+#include "engine/Instance.h"
+#include "platform/gpu/Readback.h"
+#include "renderer/FrameCapture.h"
+#include "renderer/Renderer.h"
+
+namespace
+{
+constexpr int ourWidth = 160;
+constexpr int ourHeight = 90;
+constexpr int ourRed = 0;
+constexpr int ourGreen = 1;
+
+struct Pixel
+{
+	int myX;
+	int myY;
+};
+
+class NodeGraphRenderTest : public EngineTest
+{
+protected:
+	// The engine and a camera at (0, 0, 5) looking along +z.
+	bool Start()
+	{
+		if (!CreateEngine(ourWidth, ourHeight))
+		{
+			return false;
+		}
+		myLens = std::make_unique<Zeph::Camera>(static_cast<float>(ourWidth) / ourHeight);
+		myCamera = std::make_unique<Zeph::CameraInstance>(myLens.get());
+		Zeph::FrameCapture::SetCamera(*myCamera);
+		return true;
+	}
+
+	// One frame with the graph queued as the editor queues it, read back and saved.
+	void Draw(const std::string& aName)
+	{
+		int lateCount = 0;
+		const auto queue = [&] {
+			for (AI::NGNode& node : myNodes)
+			{
+				node.Render();
+			}
+			myEdge.Render();
+			lateCount = Zeph::Engine::GetInstance()->GetRenderer().GetLateCount();
+		};
+		int width = 0;
+		int height = 0;
+		myPixels.clear();
+		ASSERT_TRUE(Zeph::FrameCapture::RenderAndRead(queue, 1, myPixels, width, height));
+		ASSERT_EQ(width, ourWidth);
+		ASSERT_EQ(height, ourHeight);
+		EXPECT_EQ(lateCount, 3) << "two boxes and a line on the late list";
+		std::vector<uint8_t> opaque = myPixels;
+		for (size_t alpha = 3; alpha < opaque.size(); alpha += 4)
+		{
+			opaque[alpha] = 255;
+		}
+		Gpu::SavePng("/tmp/lumora-ai-tests/" + aName + ".png", ourWidth, ourHeight, opaque.data());
+	}
+
+	const uint8_t* At(int anX, int aY) const
+	{
+		return &myPixels[static_cast<size_t>((aY * ourWidth + anX) * 4)];
+	}
+	// A pixel within one of (x, y) that is pure full red or pure full green.
+	bool IsNear(Pixel aPixel, int aChannel) const
+	{
+		for (int y = aPixel.myY - 1; y <= aPixel.myY + 1; ++y)
+		{
+			for (int x = aPixel.myX - 1; x <= aPixel.myX + 1; ++x)
+			{
+				if (x < 0 || y < 0 || x >= ourWidth || y >= ourHeight)
+				{
+					continue;
+				}
+				const uint8_t* pixel = At(x, y);
+				if (pixel[aChannel] == 255 && pixel[1 - aChannel] == 0 && pixel[2] == 0)
+				{
+					return true;
+				}
+			}
+		}
+		return false;
+	}
+	bool IsBlackAround(Pixel aPixel) const
+	{
+		for (int y = aPixel.myY - 1; y <= aPixel.myY + 1; ++y)
+		{
+			for (int x = aPixel.myX - 1; x <= aPixel.myX + 1; ++x)
+			{
+				const uint8_t* pixel = At(x, y);
+				if (pixel[0] != 0 || pixel[1] != 0 || pixel[2] != 0)
+				{
+					return false;
+				}
+			}
+		}
+		return true;
+	}
+
+	// clip = (p, 1) * View * Projection, then the viewport with row 0 at the top.
+	Pixel Project(const Vector3<float>& aPoint) const
+	{
+		Vector4<float> clip(aPoint);
+		clip = clip * (myCamera->GetView() * myCamera->GetProjection());
+		const float x = (clip.x / clip.w * 0.5f + 0.5f) * ourWidth;
+		const float y = (0.5f - clip.y / clip.w * 0.5f) * ourHeight;
+		return {static_cast<int>(std::floor(x)), static_cast<int>(std::floor(y))};
+	}
+
+	// The graph a - b with both visuals, made as the editor makes them.
+	void BuildGraph(const Vector3<float>& aFirst, const Vector3<float>& aSecond)
+	{
+		for (int at = 0; at < 2; ++at)
+		{
+			myNodes[at].InitDebugInstance();
+			myNodes[at].SetID(at + 1);
+		}
+		myNodes[0].SetPosition(aFirst);
+		myNodes[1].SetPosition(aSecond);
+		myEdge.InitDebugLine();
+		myEdge.Connect(&myNodes[0], &myNodes[1]);
+		myNodes[0].AddEdge(&myEdge);
+		myNodes[1].AddEdge(&myEdge);
+	}
+
+	void TearDown() override
+	{
+		for (AI::NGNode& node : myNodes)
+		{
+			node.DestroyDebugInstance();
+		}
+		myEdge.DestroyDebugLine();
+		EngineTest::TearDown();
+	}
+
+	std::unique_ptr<Zeph::Camera> myLens;
+	std::unique_ptr<Zeph::CameraInstance> myCamera;
+	std::vector<uint8_t> myPixels;
+	AI::NGNode myNodes[2];
+	AI::NGEdge myEdge;
+};
+
+// A point on the segment from aFrom to aTo.
+Vector3<float> Along(const Vector3<float>& aFrom, const Vector3<float>& aTo, float aT)
+{
+	return aFrom + (aTo - aFrom) * aT;
+}
+} // namespace
+
+TEST_F(NodeGraphRenderTest, BoxesAtTheNodesAndALineBetweenThem)
+{
+	if (!Start())
+	{
+		return;
+	}
+	const Vector3<float> a(-1.5f, -0.5f, 10.0f);
+	const Vector3<float> b(1.5f, 0.5f, 10.0f);
+	BuildGraph(a, b);
+	ASSERT_NE(myNodes[0].GetDebugInstance(), nullptr) << TakeLog();
+	ASSERT_NE(myEdge.GetDebugLine(), nullptr) << TakeLog();
+	EXPECT_EQ(myNodes[0].GetDebugInstance()->GetModelNode(), myNodes[1].GetDebugInstance()->GetModelNode())
+	    << "every marker shares one box model";
+	Draw("graph");
+
+	// Each box covers +-0.25 around its node: probed off the line (above and below the
+	// centre), and clear just beyond its top face.
+	for (const Vector3<float>& node : {a, b})
+	{
+		for (const float dy : {0.15f, -0.15f})
+		{
+			const Pixel inside = Project(node + Vector3<float>(0.0f, dy, 0.0f));
+			EXPECT_TRUE(IsNear(inside, ourRed)) << "box at " << inside.myX << ", " << inside.myY;
+		}
+		const Pixel above = Project(node + Vector3<float>(0.0f, 0.45f, 0.0f));
+		EXPECT_TRUE(IsBlackAround(above)) << "above the box at " << above.myX << ", " << above.myY;
+	}
+	// The line between the boxes.
+	for (const float t : {0.2f, 0.35f, 0.5f, 0.65f, 0.8f})
+	{
+		const Pixel onLine = Project(Along(a, b, t));
+		EXPECT_TRUE(IsNear(onLine, ourGreen)) << "line at t = " << t;
+	}
+	EXPECT_TRUE(IsBlackAround(Project({0.0f, 1.0f, 10.0f}))) << "nothing off the graph";
+	EXPECT_TRUE(IsBlackAround(Project({0.0f, -1.0f, 10.0f}))) << "nothing off the graph";
+}
+
+TEST_F(NodeGraphRenderTest, MovingANodeMovesItsBoxTheLineAndTheDistance)
+{
+	if (!Start())
+	{
+		return;
+	}
+	const Vector3<float> a(-1.5f, 0.5f, 10.0f);
+	const Vector3<float> b(1.5f, 0.5f, 10.0f);
+	BuildGraph(a, b);
+	ASSERT_FLOAT_EQ(myEdge.GetDistance(), 3.0f);
+	Draw("graph-before-move");
+	ASSERT_TRUE(IsNear(Project(Along(a, b, 0.5f)), ourGreen)) << "the line as connected";
+
+	const Vector3<float> moved(1.5f, -1.0f, 8.0f);
+	myNodes[1].SetPosition(moved);
+	Draw("graph-after-move");
+	EXPECT_FLOAT_EQ(myEdge.GetDistance(), (moved - a).Length()) << "drawing brings the distance up to date";
+	EXPECT_TRUE(IsNear(Project(moved + Vector3<float>(0.0f, 0.15f, 0.0f)), ourRed)) << "the box moved";
+	EXPECT_TRUE(IsBlackAround(Project(b))) << "the box left its old place";
+	for (const float t : {0.3f, 0.5f, 0.7f})
+	{
+		EXPECT_TRUE(IsNear(Project(Along(a, moved, t)), ourGreen)) << "new line at t = " << t;
+		EXPECT_TRUE(IsBlackAround(Project(Along(a, b, t)))) << "old line at t = " << t;
+	}
+}
+
+TEST_F(NodeGraphRenderTest, MakingVisualsAgainReplacesThem)
+{
+	if (!Start())
+	{
+		return;
+	}
+	// The replaced box and line are deleted (the sanitizer build reports a leak otherwise).
+	AI::NGNode node;
+	node.InitDebugInstance();
+	node.InitDebugInstance();
+	ASSERT_NE(node.GetDebugInstance(), nullptr) << TakeLog();
+	AI::NGEdge edge;
+	edge.InitDebugLine();
+	edge.InitDebugLine();
+	ASSERT_NE(edge.GetDebugLine(), nullptr) << TakeLog();
+	const Zeph::DebugLine::Vertex& end = edge.GetDebugLine()->GetVertex(1);
+	EXPECT_EQ(end.myColor.y, 1.0f);
+	EXPECT_EQ(end.myColor.x, 0.0f);
+
+	// A copy refers to the same visuals; the element that made them releases them once.
+	const AI::NGNode copy = node;
+	EXPECT_EQ(copy.GetDebugInstance(), node.GetDebugInstance());
+	node.DestroyDebugInstance();
+	EXPECT_EQ(node.GetDebugInstance(), nullptr);
+	edge.DestroyDebugLine();
+	EXPECT_EQ(edge.GetDebugLine(), nullptr);
+	edge.DestroyDebugLine();
+}

@@ -1,0 +1,295 @@
+// The path graph without a GPU: edge slots, distances, the queries over the graph and
+// the reports they write to the log.
+#include <bitset>
+#include <cmath>
+#include <gtest/gtest.h>
+#include <string>
+
+#include "ai/NGEdge.h"
+#include "ai/NGNode.h"
+#include "ai/StaticArray.h"
+#include "core/GrowingArray.h"
+#include "engine/Debug.h"
+#include "support/TestSupport.h"
+
+namespace
+{
+// A log that ends nothing, so that reports can be read back.
+class NodeGraphTest : public testing::Test
+{
+protected:
+	void SetUp() override
+	{
+		myLogPath = myScratch.File("DebugLogger.txt");
+		ASSERT_TRUE(Debug::Create(myLogPath, std::bitset<4>(0)));
+	}
+	void TearDown() override { Debug::Destroy(); }
+
+	// The log written since the last call.
+	std::string TakeLog()
+	{
+		const std::string all = TestSupport::ReadWholeFile(myLogPath);
+		const std::string rest = all.size() > myLogTaken ? all.substr(myLogTaken) : std::string();
+		myLogTaken = all.size();
+		return rest;
+	}
+
+	// The entry as the log writes a critical report.
+	static std::string Critical(int aLine, const std::string& aFunction, const std::string& aMessage)
+	{
+		return "\"Error Type:\"\"CRITICAL ERROR\"\n\"Line:\"" + std::to_string(aLine) + "\n\"Function:\"\"" +
+		       aFunction + "\"\n\"" + aMessage + "\n\"\n";
+	}
+
+	TestSupport::ScratchDir myScratch;
+	std::string myLogPath;
+	size_t myLogTaken = 0;
+};
+
+AI::NGNode MakeNode(int anID, const Vector3<float>& aPosition)
+{
+	AI::NGNode node;
+	node.SetID(anID);
+	node.SetPosition(aPosition);
+	return node;
+}
+} // namespace
+
+TEST_F(NodeGraphTest, NewNodesAndEdgesAreEmpty)
+{
+	const AI::NGNode node;
+	EXPECT_EQ(node.GetID(), 0);
+	EXPECT_EQ(node.GetPosition().x, 0.0f);
+	EXPECT_EQ(node.GetPosition().y, 0.0f);
+	EXPECT_EQ(node.GetPosition().z, 0.0f);
+	EXPECT_EQ(node.GetEdgeSlots()[0], nullptr);
+	EXPECT_EQ(node.GetEdgeSlots()[1], nullptr);
+	EXPECT_EQ(node.GetDebugInstance(), nullptr);
+
+	const AI::NGEdge edge;
+	EXPECT_EQ(edge.GetDistance(), 0.0f);
+	EXPECT_EQ(edge.GetConnections()[0], nullptr);
+	EXPECT_EQ(edge.GetConnections()[1], nullptr);
+	EXPECT_EQ(edge.GetFirstConnectionID(), 0);
+	EXPECT_EQ(edge.GetSecondConnectionID(), 0);
+	EXPECT_EQ(edge.GetDebugLine(), nullptr);
+}
+
+TEST_F(NodeGraphTest, ConnectStoresBothNodesAndTheirDistance)
+{
+	struct Case
+	{
+		Vector3<float> myFirst;
+		Vector3<float> mySecond;
+		float myDistance;
+	};
+	const Case cases[] = {
+	    {{0.0f, 0.0f, 0.0f}, {3.0f, 4.0f, 0.0f}, 5.0f},
+	    {{1.0f, 1.0f, 1.0f}, {2.0f, 3.0f, 3.0f}, 3.0f},
+	    {{-1.0f, -1.0f, -1.0f}, {1.0f, 1.0f, 1.0f}, std::sqrt(12.0f)},
+	    {{0.0f, 0.0f, -6.0f}, {0.0f, 0.0f, 2.0f}, 8.0f},
+	    {{2.0f, 2.0f, 2.0f}, {2.0f, 2.0f, 2.0f}, 0.0f},
+	};
+	for (const Case& test : cases)
+	{
+		AI::NGNode first = MakeNode(11, test.myFirst);
+		AI::NGNode second = MakeNode(12, test.mySecond);
+		AI::NGEdge edge;
+		edge.SetDistance(99.0f);
+		edge.Connect(&first, &second);
+		EXPECT_FLOAT_EQ(edge.GetDistance(), test.myDistance) << "to " << test.mySecond.x;
+		EXPECT_EQ(edge.GetFirstConnectionID(), 11);
+		EXPECT_EQ(edge.GetSecondConnectionID(), 12);
+		EXPECT_EQ(first.GetEdgeSlots()[0], nullptr) << "Connect leaves registering to the caller";
+	}
+	EXPECT_EQ(TakeLog(), "");
+}
+
+TEST_F(NodeGraphTest, RenderingAnEdgeMakesItsDistanceFollowTheNodes)
+{
+	AI::NGNode first = MakeNode(1, {0.0f, 0.0f, 0.0f});
+	AI::NGNode second = MakeNode(2, {3.0f, 4.0f, 0.0f});
+	AI::NGEdge edge;
+	edge.Connect(&first, &second);
+	ASSERT_FLOAT_EQ(edge.GetDistance(), 5.0f);
+	second.SetPosition({0.0f, 0.0f, 2.0f});
+	EXPECT_FLOAT_EQ(edge.GetDistance(), 5.0f) << "moving a node alone changes nothing";
+	edge.Render(); // no engine and no line: only the distance
+	EXPECT_FLOAT_EQ(edge.GetDistance(), 2.0f);
+}
+
+TEST_F(NodeGraphTest, ANodeHoldsTwoEdgesAndRefusesAThird)
+{
+	AI::NGEdge edges[3];
+	AI::NGNode node;
+	node.AddEdge(&edges[0]);
+	node.AddEdge(&edges[1]);
+	EXPECT_EQ(TakeLog(), "");
+	node.AddEdge(&edges[2]);
+	EXPECT_NE(
+	    TakeLog().find(Critical(34, "AI::NGNode::AddEdge", "Tried to connect more than 2 edges to node")),
+	    std::string::npos);
+	EXPECT_EQ(node.GetEdgeSlots()[0], &edges[0]);
+	EXPECT_EQ(node.GetEdgeSlots()[1], &edges[1]);
+
+	// Removing the first leaves the second where it was; the next edge takes the free slot.
+	node.RemoveEdge(&edges[0]);
+	EXPECT_EQ(node.GetEdgeSlots()[0], nullptr);
+	EXPECT_EQ(node.GetEdgeSlots()[1], &edges[1]);
+	node.AddEdge(&edges[2]);
+	EXPECT_EQ(node.GetEdgeSlots()[0], &edges[2]);
+	EXPECT_EQ(node.GetEdgeSlots()[1], &edges[1]);
+	node.RemoveEdge(&edges[1]);
+	EXPECT_EQ(node.GetEdgeSlots()[0], &edges[2]);
+	EXPECT_EQ(node.GetEdgeSlots()[1], nullptr);
+	EXPECT_EQ(TakeLog(), "");
+
+	// An edge the node does not hold: reported, and both slots stay.
+	node.RemoveEdge(&edges[0]);
+	EXPECT_NE(TakeLog().find(
+	              Critical(51, "AI::NGNode::RemoveEdge", "Tried to remove an unconnected edge from node")),
+	          std::string::npos);
+	EXPECT_EQ(node.GetEdgeSlots()[0], &edges[2]);
+	EXPECT_EQ(node.GetEdgeSlots()[1], nullptr);
+}
+
+TEST_F(NodeGraphTest, AThirdEdgeEndsTheProcessWhenCriticalReportsAreFatal)
+{
+	Debug::Destroy();
+	const std::string fatalLog = myScratch.File("fatal.txt");
+	ASSERT_TRUE(Debug::Create(fatalLog, std::bitset<4>(12)));
+	AI::NGEdge edges[3];
+	AI::NGNode node;
+	node.AddEdge(&edges[0]);
+	node.AddEdge(&edges[1]);
+	EXPECT_DEATH(node.AddEdge(&edges[2]), "");
+	EXPECT_NE(TestSupport::ReadWholeFile(fatalLog).find(
+	              Critical(34, "AI::NGNode::AddEdge", "Tried to connect more than 2 edges to node")),
+	          std::string::npos);
+}
+
+TEST_F(NodeGraphTest, QueriesWalkAChain)
+{
+	// a - b - c, built as the editor builds chains.
+	AI::NGNode nodes[3] = {MakeNode(1, {0.0f, 0.0f, 0.0f}), MakeNode(2, {1.0f, 0.0f, 0.0f}),
+	                       MakeNode(3, {1.0f, 2.0f, 0.0f})};
+	AI::NGEdge edges[2];
+	for (int at = 0; at < 2; ++at)
+	{
+		edges[at].Connect(&nodes[at], &nodes[at + 1]);
+		nodes[at].AddEdge(&edges[at]);
+		nodes[at + 1].AddEdge(&edges[at]);
+	}
+	EXPECT_EQ(edges[0].GetOtherNode(&nodes[0]), &nodes[1]);
+	EXPECT_EQ(edges[0].GetOtherNode(&nodes[1]), &nodes[0]);
+	EXPECT_TRUE(edges[1].IsConnecting(&nodes[1], &nodes[2]));
+	EXPECT_TRUE(edges[1].IsConnecting(&nodes[2], &nodes[1]));
+	EXPECT_FALSE(edges[1].IsConnecting(&nodes[0], &nodes[1]));
+	EXPECT_FALSE(edges[1].IsConnecting(&nodes[1], &nodes[1]));
+	EXPECT_EQ(nodes[1].FindConnectingEdge(&nodes[0]), &edges[0]);
+	EXPECT_EQ(nodes[1].FindConnectingEdge(&nodes[2]), &edges[1]);
+	EXPECT_EQ(nodes[2].FindConnectingEdge(&nodes[1]), &edges[1]);
+
+	GrowingArray<AI::NGNode*> neighbours(4, 4);
+	nodes[1].GetNeighbours(neighbours);
+	ASSERT_EQ(neighbours.Count(), 2);
+	EXPECT_EQ(neighbours[0], &nodes[0]);
+	EXPECT_EQ(neighbours[1], &nodes[2]);
+	neighbours.RemoveAll();
+	nodes[2].GetNeighbours(neighbours);
+	ASSERT_EQ(neighbours.Count(), 1);
+	EXPECT_EQ(neighbours[0], &nodes[1]);
+	// After its first edge is removed the middle node still has the second neighbour.
+	nodes[1].RemoveEdge(&edges[0]);
+	neighbours.RemoveAll();
+	nodes[1].GetNeighbours(neighbours);
+	ASSERT_EQ(neighbours.Count(), 1);
+	EXPECT_EQ(neighbours[0], &nodes[2]);
+	EXPECT_EQ(TakeLog(), "");
+
+	// Unconnected pairs: reported; the answer falls back to the first end and first slot.
+	EXPECT_EQ(edges[0].GetOtherNode(&nodes[2]), &nodes[0]);
+	EXPECT_NE(TakeLog().find(Critical(50, "AI::NGEdge::GetOtherNode",
+	                                  "Tried to get other node whilst not connected to edge")),
+	          std::string::npos);
+	EXPECT_EQ(nodes[0].FindConnectingEdge(&nodes[2]), &edges[0]);
+	EXPECT_NE(TakeLog().find(Critical(117, "AI::NGNode::FindConnectingEdge",
+	                                  "Tried to find connection for unconnected nodes")),
+	          std::string::npos);
+	// The middle node's first slot is empty now: nothing to fall back on.
+	EXPECT_EQ(nodes[1].FindConnectingEdge(&nodes[0]), nullptr);
+	EXPECT_NE(TakeLog().find("Tried to find connection for unconnected nodes"), std::string::npos);
+}
+
+TEST_F(NodeGraphTest, AnEdgeWithAMissingNodeKeepsItsDistance)
+{
+	AI::NGNode node = MakeNode(5, {3.0f, 0.0f, 0.0f});
+	AI::NGEdge edge;
+	edge.SetDistance(7.5f);
+	edge.Connect(&node, nullptr);
+	EXPECT_NE(TakeLog().find("Tried to connect an edge to a missing node"), std::string::npos);
+	EXPECT_FLOAT_EQ(edge.GetDistance(), 7.5f);
+	EXPECT_EQ(edge.GetFirstConnectionID(), 5);
+	EXPECT_EQ(edge.GetSecondConnectionID(), 0);
+	edge.Render();
+	EXPECT_FLOAT_EQ(edge.GetDistance(), 7.5f);
+	edge.Connect(nullptr, &node);
+	EXPECT_EQ(edge.GetFirstConnectionID(), 0);
+	EXPECT_EQ(edge.GetSecondConnectionID(), 5);
+	EXPECT_EQ(edge.GetOtherNode(&node), nullptr) << "the other end is the missing one";
+
+	// A node with one empty slot has one neighbour at most; the missing end adds none.
+	node.AddEdge(&edge);
+	GrowingArray<AI::NGNode*> neighbours(2, 2);
+	node.GetNeighbours(neighbours);
+	EXPECT_EQ(neighbours.Count(), 0);
+}
+
+TEST_F(NodeGraphTest, VisualsNeedAnEngine)
+{
+	AI::NGNode node;
+	node.InitDebugInstance();
+	EXPECT_EQ(node.GetDebugInstance(), nullptr);
+	EXPECT_NE(TakeLog().find("Couldn't create the path node marker without an engine"), std::string::npos);
+	node.Render();
+	node.DestroyDebugInstance();
+
+	AI::NGEdge edge;
+	edge.InitDebugLine();
+	EXPECT_EQ(edge.GetDebugLine(), nullptr);
+	EXPECT_NE(TakeLog().find("Couldn't create the line model"), std::string::npos);
+	edge.DestroyDebugLine();
+}
+
+TEST_F(NodeGraphTest, CopiesShareEdgesAndNodes)
+{
+	AI::NGNode first = MakeNode(1, {0.0f, 0.0f, 0.0f});
+	AI::NGNode second = MakeNode(2, {0.0f, 1.0f, 0.0f});
+	AI::NGEdge edges[2];
+	first.AddEdge(&edges[0]);
+	first.AddEdge(&edges[1]);
+	edges[0].Connect(&first, &second);
+
+	const AI::NGNode nodeCopy = first;
+	EXPECT_EQ(nodeCopy.GetID(), 1);
+	EXPECT_EQ(nodeCopy.GetEdgeSlots()[0], &edges[0]);
+	EXPECT_EQ(nodeCopy.GetEdgeSlots()[1], &edges[1]);
+	AI::NGEdge edgeCopy;
+	edgeCopy = edges[0];
+	EXPECT_EQ(edgeCopy.GetConnections()[0], &first);
+	EXPECT_EQ(edgeCopy.GetConnections()[1], &second);
+	EXPECT_FLOAT_EQ(edgeCopy.GetDistance(), 1.0f);
+
+	// Assignment overwrites both slots, empty ones included.
+	StaticArray<AI::NGNode*, 2> slots;
+	slots[0] = &second;
+	slots[1] = &second;
+	StaticArray<AI::NGNode*, 2> other;
+	other[1] = &first;
+	slots = other;
+	EXPECT_EQ(slots[0], nullptr);
+	EXPECT_EQ(slots[1], &first);
+	const StaticArray<AI::NGNode*, 2> constructed(slots);
+	EXPECT_EQ(constructed[0], nullptr);
+	EXPECT_EQ(constructed[1], &first);
+}
