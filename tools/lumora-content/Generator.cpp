@@ -6,8 +6,11 @@
 
 #include "ColladaWriter.h"
 #include "ColorGrading.h"
+#include "DecalTextures.h"
 #include "EnvironmentMaps.h"
+#include "LevelWriter.h"
 #include "Models.h"
+#include "SampleLevels.h"
 #include "TextureBaker.h"
 #include "VolumeModels.h"
 #include "platform/dds/DdsFile.h"
@@ -88,6 +91,34 @@ bool Generate(const std::string& anOutDirectory, std::vector<std::string>& someW
 			}
 		}
 	}
+	// The editor loads a brick albedo and normal map of its own at start-up.
+	const struct
+	{
+		const char* myName;
+		MapKind myMap;
+	} editorTextures[] = {{"Particles/bricksAlbedo.dds", MapKind::Albedo},
+	                      {"Particles/bricksNormal.dds", MapKind::Normal}};
+	for (const auto& texture : editorTextures)
+	{
+		if (!writeImage(texture.myName, [&](Dds::Image& anImage) {
+			    return BakeMap(MaterialKind::Bricks, texture.myMap, anImage, anErrorOut);
+		    }))
+		{
+			return false;
+		}
+	}
+	for (const DecalKind decal : ourDecalKinds)
+	{
+		for (const MapKind map : {MapKind::Albedo, MapKind::Normal})
+		{
+			if (!writeImage("textures/" + DecalTextureFileName(decal, map), [&](Dds::Image& anImage) {
+				    return BakeDecalMap(decal, map, anImage, anErrorOut);
+			    }))
+			{
+				return false;
+			}
+		}
+	}
 	for (const GradingKind grading : {GradingKind::Neutral, GradingKind::Warm})
 	{
 		if (!writeImage(std::string("grading/") + GradingFileName(grading), [&](Dds::Image& anImage) {
@@ -97,9 +128,32 @@ bool Generate(const std::string& anOutDirectory, std::vector<std::string>& someW
 			return false;
 		}
 	}
-	return writeImage("Cubemaps/cubemap.dds",
-	                  [&](Dds::Image& anImage) { return BuildFallbackCubemap(anImage, anErrorOut); }) &&
-	       writeImage("Cubemaps/normaltest.dds",
-	                  [&](Dds::Image& anImage) { return BuildNormalTestCubemap(anImage, anErrorOut); });
+	if (!writeImage("Cubemaps/cubemap.dds",
+	                [&](Dds::Image& anImage) { return BuildFallbackCubemap(anImage, anErrorOut); }) ||
+	    !writeImage("Cubemaps/normaltest.dds",
+	                [&](Dds::Image& anImage) { return BuildNormalTestCubemap(anImage, anErrorOut); }))
+	{
+		return false;
+	}
+	if (!WriteEntityTypes(root + "XML/EntityTypes.xml", anErrorOut) ||
+	    !WriteDecalTypes(root + "XML/DecalTypes.xml", anErrorOut))
+	{
+		return false;
+	}
+	someWrittenOut.push_back("XML/EntityTypes.xml");
+	someWrittenOut.push_back("XML/DecalTypes.xml");
+	for (const LevelDescription& level : BuildSampleLevels())
+	{
+		const std::string directory = "XML/levels/" + level.myName + "/";
+		if (!WriteLevel(root + directory, level, anErrorOut))
+		{
+			return false;
+		}
+		for (const char* file : ourLevelFileNames)
+		{
+			someWrittenOut.push_back(directory + file);
+		}
+	}
+	return true;
 }
 } // namespace Content

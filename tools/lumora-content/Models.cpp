@@ -3,6 +3,8 @@
 #include <algorithm>
 #include <cmath>
 
+#include "RoomShapes.h"
+
 namespace Content
 {
 namespace
@@ -43,14 +45,6 @@ void AddBox(MeshBuilder& aMesh, uint32_t aSet, const Vec3& aMin, const Vec3& aMa
 	        aTile);
 }
 
-enum DoorSide
-{
-	DoorNorth = 1, // the wall at -z
-	DoorSouth = 2, // +z
-	DoorEast = 4,  // +x
-	DoorWest = 8   // -x
-};
-
 // A box room [-w/2, w/2] x [0, h] x [-d/2, d/2] seen from inside, with a door 1.2 m wide and 2.2 m
 // high in the middle of each wall named in aDoors. The walls are quads (a polylist in the file).
 ModelDescription Room(const std::string& aName, double aWidth, double aHeight, double aDepth, int aDoors,
@@ -69,8 +63,8 @@ ModelDescription Room(const std::string& aName, double aWidth, double aHeight, d
 	AddFace(mesh, ceiling, Vec3(0.0, aHeight, 0.0), ourUp * -1.0, Vec3(0.0, 0.0, 1.0), aWidth, aDepth,
 	        ourWallTile);
 
-	const double doorWidth = 1.2;
-	const double doorHeight = std::min(2.2, aHeight - 0.3);
+	const double doorWidth = ourDoorWidth;
+	const double doorHeight = DoorHeight(aHeight);
 	struct Wall
 	{
 		int myDoor;
@@ -337,12 +331,11 @@ ModelDescription Sculpture()
 std::vector<ModelDescription> BuildModels()
 {
 	std::vector<ModelDescription> models;
-	models.push_back(
-	    Room("room_small", 4.0, 3.0, 4.0, DoorSouth, MaterialKind::Bricks, MaterialKind::WoodPlanks));
-	models.push_back(Room("room_medium", 6.0, 3.0, 8.0, DoorNorth | DoorSouth, MaterialKind::Concrete,
-	                      MaterialKind::Concrete));
-	models.push_back(Room("room_large", 10.0, 4.0, 10.0, DoorNorth | DoorSouth | DoorEast | DoorWest,
-	                      MaterialKind::Bricks, MaterialKind::Marble));
+	for (const RoomShape& shape : RoomShapes())
+	{
+		models.push_back(Room(shape.myName, shape.myWidth, shape.myHeight, shape.myDepth, shape.myDoors,
+		                      shape.myWallMaterial, shape.myFloorMaterial));
+	}
 	models.push_back(FloorTile("floor_tile_marble", 1.0, 0.04, MaterialKind::Marble));
 	models.push_back(FloorTile("floor_tile_concrete", 2.0, 0.08, MaterialKind::Concrete));
 	models.push_back(Pillar());

@@ -1,10 +1,13 @@
-// lumora-content: writes the sample content: models, textures, grading lookups and cube maps.
+// lumora-content: writes the sample content: models, textures, grading lookups, cube maps, the
+// entity and decal type catalogues and the sample levels.
 //
 //   lumora-content [--out DIRECTORY]
 //
 // DIRECTORY defaults to "data": models (the light and decal volumes among them) go to
-// DIRECTORY/models/*.dae, textures to DIRECTORY/textures/*.dds, the colour-grading lookups to
-// DIRECTORY/grading/*.dds and the cube maps to DIRECTORY/Cubemaps/*.dds. The output is the same bytes on
+// DIRECTORY/models/*.dae, textures (decal textures among them) to DIRECTORY/textures/*.dds, the
+// colour-grading lookups to DIRECTORY/grading/*.dds, the cube maps to DIRECTORY/Cubemaps/*.dds, the
+// catalogues to DIRECTORY/XML/EntityTypes.xml and DIRECTORY/XML/DecalTypes.xml and the levels to
+// DIRECTORY/XML/levels/<level>/*.xml. The output is the same bytes on
 // every run, so the files under data/ are committed and a test regenerates them to check that they are
 // current. Run it from the repository root. The exit status is 1 on any error.
 

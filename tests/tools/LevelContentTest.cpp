@@ -1,0 +1,809 @@
+// The generated sample levels and catalogues, read back from the files the way the editor reads them:
+// every required value present and written as the editor's savers write it; room bounds that fit their
+// shells exactly, with every door joined to a neighbour's door; lights inside rooms and reaching a
+// surface; path graphs that are a chain and a ring through door openings; decals lying on the room
+// surfaces they face; and every entity type, decal type, model and texture named anywhere existing.
+
+#include <gtest/gtest.h>
+#include <tinyxml.h>
+
+#include <algorithm>
+#include <cmath>
+#include <locale>
+#include <map>
+#include <set>
+#include <sstream>
+#include <string>
+#include <vector>
+
+#include "GeneratedContent.h"
+#include "Models.h"
+#include "RoomShapes.h"
+#include "core/Matrix33.h"
+#include "core/Matrix44.h"
+#include "core/Vector3.h"
+#include "core/Vector4.h"
+#include "support/TestSupport.h"
+#include "xml/XML.h"
+
+namespace
+{
+using ContentTestSupport::GeneratedContent;
+using Vec = Vector3<float>;
+
+const char* const ourLevels[] = {"sample_small", "sample_large"};
+const char* const ourLevelFiles[] = {"rooms.xml", "entities.xml", "lights.xml", "nodegraph.xml",
+                                     "decals.xml"};
+constexpr float ourTolerance = 1e-3f;
+
+float Dot(const Vec& aLeft, const Vec& aRight)
+{
+	return aLeft.x * aRight.x + aLeft.y * aRight.y + aLeft.z * aRight.z;
+}
+
+float Component(const Vec& aVector, int anAxis)
+{
+	return anAxis == 0 ? aVector.x : (anAxis == 1 ? aVector.y : aVector.z);
+}
+
+struct Box
+{
+	Vec myMin;
+	Vec myMax;
+
+	// aMargin > 0 keeps that far from every face; a negative margin lets a point lie just outside.
+	bool Contains(const Vec& aPoint, float aMargin) const
+	{
+		for (int axis = 0; axis < 3; ++axis)
+		{
+			const float value = Component(aPoint, axis);
+			if (value < Component(myMin, axis) + aMargin || value > Component(myMax, axis) - aMargin)
+			{
+				return false;
+			}
+		}
+		return true;
+	}
+};
+
+struct Door
+{
+	Vec myCenter; // at floor level
+	Vec myOutward;
+	float myWidth = 0.0f;
+	float myHeight = 0.0f;
+};
+
+struct Room
+{
+	std::string myId;
+	Box myBox;
+	std::vector<Door> myDoors; // from the shell placed in the room
+	int myShells = 0;
+};
+
+struct Entity
+{
+	std::string myType;
+	Vec myPosition;
+	Vec myRotation;
+};
+
+struct Light
+{
+	bool mySpotFlag = false;
+	Vec myPosition;
+	Vector4<float> myColor;
+	float myFalloff = 0.0f;
+	Vec myDirection;
+	float myInner = 0.0f;
+	float myOuter = 0.0f;
+};
+
+struct Edge
+{
+	int myFirst = 0;
+	int mySecond = 0;
+	float myDistance = 0.0f;
+};
+
+struct Decal
+{
+	std::string myType;
+	Vec myPosition;
+	Vec myNorm;
+	float mySize = 0.0f;
+	float myDepth = 0.0f;
+};
+
+struct Level
+{
+	std::vector<Room> myRooms;
+	std::vector<Entity> myEntities;
+	std::vector<Light> myLights;
+	std::vector<std::pair<int, Vec>> myNodes;
+	std::vector<Edge> myEdges;
+	int myNodeCount = -1;
+	int myEdgeCount = -1;
+	std::vector<Decal> myDecals;
+};
+
+// Required values: a missing element or attribute fails the test that reads it, naming the file.
+const TiXmlElement* Child(const TiXmlElement* aParent, const char* aName, const std::string& aFile)
+{
+	const TiXmlElement* child = aParent ? aParent->FirstChildElement(aName) : nullptr;
+	if (!child)
+	{
+		ADD_FAILURE() << aFile << ": <" << (aParent ? aParent->Value() : "?") << "> lacks <" << aName << ">";
+	}
+	return child;
+}
+
+std::string Text(const TiXmlElement* anElement, const char* anAttribute, const std::string& aFile)
+{
+	const char* value = anElement ? anElement->Attribute(anAttribute) : nullptr;
+	if (!value)
+	{
+		ADD_FAILURE() << aFile << ": <" << (anElement ? anElement->Value() : "?") << "> lacks "
+		              << anAttribute;
+		return std::string();
+	}
+	return value;
+}
+
+float Number(const TiXmlElement* anElement, const char* anAttribute, const std::string& aFile)
+{
+	return XML::ConvertValue<float>(Text(anElement, anAttribute, aFile).c_str());
+}
+
+// A single value: the first attribute of the child, whatever its name (as the editor reads it).
+float Value(const TiXmlElement* aRecord, const char* aChild, const std::string& aFile)
+{
+	const TiXmlElement* child = Child(aRecord, aChild, aFile);
+	const TiXmlAttribute* first = child ? child->FirstAttribute() : nullptr;
+	EXPECT_NE(first, nullptr) << aFile << ": <" << aChild << "> holds no value";
+	return first ? XML::ConvertValue<float>(first->Value()) : 0.0f;
+}
+
+Vec Vector(const TiXmlElement* aRecord, const char* aChild, const std::string& aFile)
+{
+	const TiXmlElement* child = Child(aRecord, aChild, aFile);
+	return Vec(Number(child, "x", aFile), Number(child, "y", aFile), Number(child, "z", aFile));
+}
+
+Vector4<float> Colour(const TiXmlElement* aRecord, const std::string& aFile)
+{
+	const TiXmlElement* child = Child(aRecord, "color", aFile);
+	return Vector4<float>(Number(child, "r", aFile), Number(child, "g", aFile), Number(child, "b", aFile),
+	                      Number(child, "a", aFile));
+}
+
+// The records of one section, in document order; ASSERTs inside cannot return a value, so the caller
+// checks that the document loaded.
+std::vector<const TiXmlElement*> Records(const TiXmlDocument& aDocument, const char* aSection,
+                                         const char* aRecord)
+{
+	std::vector<const TiXmlElement*> records;
+	const TiXmlElement* root = aDocument.RootElement();
+	const TiXmlElement* section = root ? root->FirstChildElement(aSection) : nullptr;
+	EXPECT_NE(section, nullptr) << aDocument.Value() << ": no <" << aSection << ">";
+	for (const TiXmlElement* record = section ? section->FirstChildElement(aRecord) : nullptr; record;
+	     record = record->NextSiblingElement(aRecord))
+	{
+		records.push_back(record);
+	}
+	return records;
+}
+
+// The orientation the editor builds for an entity: translation, then z, y and x rotations in degrees.
+Matrix44<float> Orientation(const Entity& anEntity)
+{
+	const float degrees = 0.01745329238474369f;
+	Matrix44<float> orientation;
+	orientation.SetPosition(anEntity.myPosition);
+	orientation *= Matrix33<float>::CreateRotateAroundZ(anEntity.myRotation.z * degrees);
+	orientation *= Matrix33<float>::CreateRotateAroundY(anEntity.myRotation.y * degrees);
+	orientation *= Matrix33<float>::CreateRotateAroundX(anEntity.myRotation.x * degrees);
+	return orientation;
+}
+
+Vec Transform(const Vec& aPoint, const Matrix44<float>& anOrientation, float aW)
+{
+	const Vector4<float> world = Vector4<float>(aPoint.x, aPoint.y, aPoint.z, aW) * anOrientation;
+	return Vec(world.x, world.y, world.z);
+}
+
+Vec ToFloat(const Content::Vec3& aVector)
+{
+	return Vec(static_cast<float>(aVector.x), static_cast<float>(aVector.y), static_cast<float>(aVector.z));
+}
+
+// Entity type id -> model name ("crate" -> "crate"), from the catalogue's file paths.
+std::map<std::string, std::string> ModelsByType()
+{
+	const std::string file = "XML/EntityTypes.xml";
+	TiXmlDocument document;
+	EXPECT_TRUE(document.LoadFile(GeneratedContent::Get().Path(file))) << file;
+	std::map<std::string, std::string> models;
+	for (const TiXmlElement* record : Records(document, "entities", "entity"))
+	{
+		std::string path = Text(Child(record, "visual-component", file), "filepath", file);
+		path = path.substr(path.find_last_of('/') + 1);
+		models[Text(record, "id", file)] = path.substr(0, path.find('.'));
+	}
+	return models;
+}
+
+// Reads the five files as the editor does (rooms with their x mirrored back) and ties every room
+// shell to the room whose box holds all of its vertices, taking over the shell's doors in world space.
+Level LoadLevel(const std::string& aName)
+{
+	Level level;
+	TiXmlDocument documents[5];
+	std::string files[5];
+	for (int file = 0; file < 5; ++file)
+	{
+		files[file] = "XML/levels/" + aName + "/" + ourLevelFiles[file];
+		if (!documents[file].LoadFile(GeneratedContent::Get().Path(files[file])))
+		{
+			ADD_FAILURE() << files[file] << ": " << documents[file].ErrorDesc();
+			return level;
+		}
+	}
+	for (const TiXmlElement* record : Records(documents[0], "rooms", "room"))
+	{
+		Vec min = Vector(record, "min", files[0]);
+		Vec max = Vector(record, "max", files[0]);
+		const float mirroredMin = -min.x;
+		const float mirroredMax = -max.x;
+		min.x = std::min(mirroredMin, mirroredMax);
+		max.x = std::max(mirroredMin, mirroredMax);
+		const TiXmlElement* id = record->FirstChildElement("id");
+		Room room;
+		room.myId = id && id->FirstAttribute() ? id->FirstAttribute()->Value() : "NOT_SET";
+		room.myBox = {min, max};
+		level.myRooms.push_back(room);
+	}
+	for (const TiXmlElement* record : Records(documents[1], "entities", "entity"))
+	{
+		level.myEntities.push_back({Text(record, "type", files[1]), Vector(record, "position", files[1]),
+		                            Vector(record, "rotation", files[1])});
+	}
+	for (const TiXmlElement* record : Records(documents[2], "point-lights", "point-light"))
+	{
+		Light light;
+		light.myPosition = Vector(record, "position", files[2]);
+		light.myColor = Colour(record, files[2]);
+		light.myFalloff = Value(record, "falloff", files[2]);
+		level.myLights.push_back(light);
+	}
+	for (const TiXmlElement* record : Records(documents[2], "spot-lights", "spot-light"))
+	{
+		Light light;
+		light.mySpotFlag = true;
+		light.myPosition = Vector(record, "position", files[2]);
+		light.myColor = Colour(record, files[2]);
+		light.myFalloff = Value(record, "falloff", files[2]);
+		light.myDirection = Vector(record, "direction", files[2]);
+		light.myInner = Number(Child(record, "angles", files[2]), "inner", files[2]);
+		light.myOuter = Number(Child(record, "angles", files[2]), "outer", files[2]);
+		level.myLights.push_back(light);
+	}
+	const TiXmlElement* graph = Child(documents[3].RootElement(), "node-graph", files[3]);
+	const TiXmlElement* nodes = Child(graph, "nodes", files[3]);
+	const TiXmlElement* edges = Child(graph, "edges", files[3]);
+	level.myNodeCount = static_cast<int>(Number(nodes, "number-of-nodes", files[3]));
+	level.myEdgeCount = static_cast<int>(Number(edges, "number-of-edges", files[3]));
+	for (const TiXmlElement* node = nodes ? nodes->FirstChildElement("node") : nullptr; node;
+	     node = node->NextSiblingElement("node"))
+	{
+		level.myNodes.push_back(
+		    {XML::ConvertValue<int>(Text(node, "id", files[3]).c_str()), Vector(node, "position", files[3])});
+	}
+	for (const TiXmlElement* edge = edges ? edges->FirstChildElement("edge") : nullptr; edge;
+	     edge = edge->NextSiblingElement("edge"))
+	{
+		const TiXmlElement* connections = Child(edge, "connections", files[3]);
+		level.myEdges.push_back({XML::ConvertValue<int>(Text(connections, "firstID", files[3]).c_str()),
+		                         XML::ConvertValue<int>(Text(connections, "secondID", files[3]).c_str()),
+		                         Value(edge, "distance", files[3])});
+	}
+	for (const TiXmlElement* record : Records(documents[4], "decals", "decal"))
+	{
+		const TiXmlElement* type = Child(record, "decal-type", files[4]);
+		level.myDecals.push_back({type && type->FirstAttribute() ? type->FirstAttribute()->Value() : "",
+		                          Vector(record, "position", files[4]), Vector(record, "norm", files[4]),
+		                          Value(record, "size", files[4]), Value(record, "depth", files[4])});
+	}
+
+	static const std::vector<Content::ModelDescription> ourModels = Content::BuildModels();
+	const std::map<std::string, std::string> modelsByType = ModelsByType();
+	for (const Entity& entity : level.myEntities)
+	{
+		const auto model = modelsByType.find(entity.myType);
+		const Content::RoomShape* shape =
+		    model != modelsByType.end() ? Content::FindRoomShape(model->second) : nullptr;
+		if (!shape)
+		{
+			continue;
+		}
+		const auto description = std::find_if(ourModels.begin(), ourModels.end(), [&](const auto& aModel) {
+			return aModel.myName == shape->myName;
+		});
+		if (description == ourModels.end())
+		{
+			ADD_FAILURE() << "no model " << shape->myName;
+			continue;
+		}
+		const Matrix44<float> orientation = Orientation(entity);
+		Box bounds{Vec(1e9f, 1e9f, 1e9f), Vec(-1e9f, -1e9f, -1e9f)};
+		for (const Content::MeshVertex& vertex : description->myMesh.GetVertices())
+		{
+			const Vec world = Transform(ToFloat(vertex.myPosition), orientation, 1.0f);
+			bounds.myMin = Vec(std::min(bounds.myMin.x, world.x), std::min(bounds.myMin.y, world.y),
+			                   std::min(bounds.myMin.z, world.z));
+			bounds.myMax = Vec(std::max(bounds.myMax.x, world.x), std::max(bounds.myMax.y, world.y),
+			                   std::max(bounds.myMax.z, world.z));
+		}
+		Room* home = nullptr;
+		for (Room& room : level.myRooms)
+		{
+			if (room.myBox.Contains(bounds.myMin, -ourTolerance) &&
+			    room.myBox.Contains(bounds.myMax, -ourTolerance))
+			{
+				EXPECT_EQ(home, nullptr) << aName << ": the " << entity.myType << " shell fits two rooms";
+				home = &room;
+			}
+		}
+		if (!home)
+		{
+			ADD_FAILURE() << aName << ": no room encloses the " << entity.myType << " shell at "
+			              << entity.myPosition.x << ", " << entity.myPosition.z;
+			continue;
+		}
+		// Enclosing is not enough for the reflections, which project onto the room's box: it must
+		// be the shell's own bounds.
+		for (int axis = 0; axis < 3; ++axis)
+		{
+			EXPECT_NEAR(Component(home->myBox.myMin, axis), Component(bounds.myMin, axis), ourTolerance)
+			    << aName << ": room " << home->myId << " is larger than its shell";
+			EXPECT_NEAR(Component(home->myBox.myMax, axis), Component(bounds.myMax, axis), ourTolerance)
+			    << aName << ": room " << home->myId << " is larger than its shell";
+		}
+		++home->myShells;
+		for (const Content::DoorOpening& door : Content::RoomDoors(*shape))
+		{
+			home->myDoors.push_back({Transform(ToFloat(door.myCenter), orientation, 1.0f),
+			                         Transform(ToFloat(door.myOutward), orientation, 0.0f),
+			                         static_cast<float>(door.myWidth), static_cast<float>(door.myHeight)});
+		}
+	}
+	return level;
+}
+
+const Level& GetLevel(const std::string& aName)
+{
+	static std::map<std::string, Level> ourLevelsByName;
+	const auto found = ourLevelsByName.find(aName);
+	return found != ourLevelsByName.end() ? found->second : ourLevelsByName[aName] = LoadLevel(aName);
+}
+
+// The room holding a point at least aMargin inside its box, or null.
+const Room* RoomAround(const Level& aLevel, const Vec& aPoint, float aMargin)
+{
+	for (const Room& room : aLevel.myRooms)
+	{
+		if (room.myBox.Contains(aPoint, aMargin))
+		{
+			return &room;
+		}
+	}
+	return nullptr;
+}
+
+// True when aPoint lies in the opening of aDoor (on its wall plane).
+bool InOpening(const Door& aDoor, const Vec& aPoint)
+{
+	const Vec offset = aPoint - aDoor.myCenter;
+	const Vec along = Vec(0.0f, 1.0f, 0.0f).Cross(aDoor.myOutward);
+	return std::abs(Dot(offset, aDoor.myOutward)) < ourTolerance &&
+	       std::abs(Dot(offset, along)) <= aDoor.myWidth * 0.5f && offset.y >= -ourTolerance &&
+	       offset.y <= aDoor.myHeight;
+}
+
+// Distance from aPoint inside aBox to the face whose inward normal is aNormal, or -1 when aNormal is
+// not an axis of the box.
+float DistanceToFace(const Box& aBox, const Vec& aPoint, const Vec& aNormal)
+{
+	for (int axis = 0; axis < 3; ++axis)
+	{
+		const float along = Component(aNormal, axis);
+		if (std::abs(std::abs(along) - 1.0f) < 1e-4f)
+		{
+			return along > 0.0f ? Component(aPoint, axis) - Component(aBox.myMin, axis)
+			                    : Component(aBox.myMax, axis) - Component(aPoint, axis);
+		}
+	}
+	return -1.0f;
+}
+
+// Six significant digits in general notation, as the editor's savers write floats.
+std::string SaverText(float aValue)
+{
+	std::ostringstream stream;
+	stream.imbue(std::locale::classic());
+	stream << aValue;
+	return stream.str();
+}
+} // namespace
+
+TEST(SampleLevelTest, EveryFileIsWrittenAsTheEditorSavesIt)
+{
+	ASSERT_EQ(GeneratedContent::Get().Error(), "");
+	std::vector<std::string> files = {"XML/EntityTypes.xml", "XML/DecalTypes.xml"};
+	for (const char* level : ourLevels)
+	{
+		for (const char* file : ourLevelFiles)
+		{
+			files.push_back(std::string("XML/levels/") + level + "/" + file);
+		}
+	}
+	TestSupport::ScratchDir scratch;
+	for (const std::string& file : files)
+	{
+		const std::string path = GeneratedContent::Get().Path(file);
+		// Loaded and written back untouched by the editor's cursor: not a byte may change.
+		const std::string copy = scratch.File("copy.xml");
+		{
+			XML xml(path);
+			xml.CopyDocument(copy);
+		}
+		EXPECT_TRUE(TestSupport::ReadWholeFile(copy) == TestSupport::ReadWholeFile(path)) << file;
+		// Every number as the savers write it, so saving after an edit changes only the edited records.
+		TiXmlDocument document;
+		ASSERT_TRUE(document.LoadFile(path)) << file;
+		std::vector<const TiXmlElement*> pending = {document.RootElement()};
+		int numbers = 0;
+		while (!pending.empty())
+		{
+			const TiXmlElement* element = pending.back();
+			pending.pop_back();
+			for (const TiXmlElement* child = element->FirstChildElement(); child;
+			     child = child->NextSiblingElement())
+			{
+				pending.push_back(child);
+			}
+			for (const TiXmlAttribute* attribute = element->FirstAttribute(); attribute;
+			     attribute = attribute->Next())
+			{
+				std::istringstream stream(attribute->Value());
+				stream.imbue(std::locale::classic());
+				float value = 0.0f;
+				if (stream >> value && stream.peek() == std::char_traits<char>::eof())
+				{
+					++numbers;
+					EXPECT_EQ(attribute->ValueStr(), SaverText(value)) << file << ": " << attribute->Name();
+				}
+			}
+		}
+		EXPECT_EQ(numbers > 0, file.find("/levels/") != std::string::npos) << file;
+	}
+}
+
+TEST(SampleLevelTest, RoomBoundsFitTheirShellsAndEveryDoorJoinsANeighbour)
+{
+	ASSERT_EQ(GeneratedContent::Get().Error(), "");
+	for (const char* name : ourLevels)
+	{
+		const Level& level = GetLevel(name);
+		ASSERT_FALSE(level.myRooms.empty()) << name;
+		std::set<std::string> ids;
+		std::set<std::pair<float, float>> sizes;
+		for (const Room& room : level.myRooms)
+		{
+			EXPECT_TRUE(ids.insert(room.myId).second) << name << ": room id " << room.myId << " twice";
+			EXPECT_EQ(room.myShells, 1) << name << ": room " << room.myId;
+			sizes.insert({room.myBox.myMax.x - room.myBox.myMin.x, room.myBox.myMax.z - room.myBox.myMin.z});
+			for (const Room& other : level.myRooms)
+			{
+				const bool overlapFlag = &other != &room &&
+				                         room.myBox.myMin.x < other.myBox.myMax.x - ourTolerance &&
+				                         other.myBox.myMin.x < room.myBox.myMax.x - ourTolerance &&
+				                         room.myBox.myMin.z < other.myBox.myMax.z - ourTolerance &&
+				                         other.myBox.myMin.z < room.myBox.myMax.z - ourTolerance;
+				EXPECT_FALSE(overlapFlag)
+				    << name << ": rooms " << room.myId << " and " << other.myId << " overlap";
+			}
+			for (const Door& door : room.myDoors)
+			{
+				// Half a metre through the door, at head height: another room, or the outside.
+				const Vec beyond = door.myCenter + door.myOutward * 0.5f + Vec(0.0f, 1.5f, 0.0f);
+				const Room* neighbour = RoomAround(level, beyond, 0.0f);
+				if (!neighbour)
+				{
+					EXPECT_STREQ(name, "sample_small") << "a door of " << room.myId << " leads outside";
+					continue;
+				}
+				const bool matchedFlag = std::any_of(
+				    neighbour->myDoors.begin(), neighbour->myDoors.end(), [&](const Door& anOther) {
+					    return (anOther.myCenter - door.myCenter).Length() < ourTolerance &&
+					           Dot(anOther.myOutward, door.myOutward) < -0.999f &&
+					           std::abs(anOther.myWidth - door.myWidth) < ourTolerance &&
+					           std::abs(anOther.myHeight - door.myHeight) < ourTolerance;
+				    });
+				EXPECT_TRUE(matchedFlag) << name << ": the door of " << room.myId << " at " << door.myCenter.x
+				                         << ", " << door.myCenter.z << " meets a wall of " << neighbour->myId;
+			}
+		}
+		if (std::string(name) == "sample_large")
+		{
+			EXPECT_GE(level.myRooms.size(), 6u);
+			EXPECT_GE(sizes.size(), 6u) << "rooms of different sizes";
+		}
+	}
+}
+
+TEST(SampleLevelTest, LightsStandInsideRoomsAndReachASurface)
+{
+	ASSERT_EQ(GeneratedContent::Get().Error(), "");
+	for (const char* name : ourLevels)
+	{
+		const Level& level = GetLevel(name);
+		int spots = 0;
+		for (const Light& light : level.myLights)
+		{
+			spots += light.mySpotFlag ? 1 : 0;
+			const Vec& at = light.myPosition;
+			const Room* room = RoomAround(level, at, 0.1f);
+			if (!room)
+			{
+				ADD_FAILURE() << name << ": the light at " << at.x << ", " << at.y << ", " << at.z
+				              << " is in a wall or outside every room";
+				continue;
+			}
+			EXPECT_GT(light.myFalloff, 0.0f) << name;
+			EXPECT_TRUE(light.myColor.x >= 0.0f && light.myColor.y >= 0.0f && light.myColor.z >= 0.0f &&
+			            light.myColor.x + light.myColor.y + light.myColor.z > 0.0f)
+			    << name << ": light at " << at.x << ", " << at.y << ", " << at.z;
+			if (!light.mySpotFlag)
+			{
+				continue;
+			}
+			// A unit direction survives the editor's normalising and saving unchanged.
+			EXPECT_NEAR(light.myDirection.Length(), 1.0f, 1e-5f) << name;
+			EXPECT_TRUE(0.0f < light.myOuter && light.myOuter < light.myInner && light.myInner < 1.0f)
+			    << name << ": angles " << light.myInner << ", " << light.myOuter;
+			// Where the cone's axis leaves the room it meets a wall, the floor or the ceiling; the
+			// light must reach that far.
+			float exit = 1e9f;
+			for (int axis = 0; axis < 3; ++axis)
+			{
+				const float direction = Component(light.myDirection, axis);
+				if (std::abs(direction) > 1e-6f)
+				{
+					const float face =
+					    Component(direction > 0.0f ? room->myBox.myMax : room->myBox.myMin, axis);
+					exit = std::min(exit, (face - Component(at, axis)) / direction);
+				}
+			}
+			EXPECT_LE(exit, light.myFalloff + ourTolerance) << name << ": the spot light at " << at.x << ", "
+			                                                << at.y << ", " << at.z << " lights nothing";
+		}
+		EXPECT_GT(spots, 0) << name;
+		EXPECT_GT(static_cast<int>(level.myLights.size()) - spots, 0) << name;
+		EXPECT_GE(level.myLights.size(), std::string(name) == "sample_large" ? 30u : 3u) << name;
+	}
+}
+
+TEST(SampleLevelTest, PathsAreAChainAndARingThroughDoorOpenings)
+{
+	ASSERT_EQ(GeneratedContent::Get().Error(), "");
+	for (const char* name : ourLevels)
+	{
+		const Level& level = GetLevel(name);
+		const bool ringFlag = std::string(name) == "sample_large";
+		const int count = static_cast<int>(level.myNodes.size());
+		EXPECT_EQ(level.myNodeCount, count) << name;
+		EXPECT_EQ(level.myEdgeCount, static_cast<int>(level.myEdges.size())) << name;
+		EXPECT_EQ(static_cast<int>(level.myEdges.size()), ringFlag ? count : count - 1) << name;
+		std::map<int, Vec> positions;
+		for (int index = 0; index < count; ++index)
+		{
+			EXPECT_EQ(level.myNodes[index].first, index + 1) << name << ": IDs run from 1 in order";
+			positions[level.myNodes[index].first] = level.myNodes[index].second;
+		}
+		std::map<int, std::vector<int>> neighbours;
+		for (const Edge& edge : level.myEdges)
+		{
+			if (!positions.count(edge.myFirst) || !positions.count(edge.mySecond) ||
+			    edge.myFirst == edge.mySecond)
+			{
+				ADD_FAILURE() << name << ": edge " << edge.myFirst << "-" << edge.mySecond;
+				continue;
+			}
+			neighbours[edge.myFirst].push_back(edge.mySecond);
+			neighbours[edge.mySecond].push_back(edge.myFirst);
+			const Vec from = positions[edge.myFirst];
+			const Vec to = positions[edge.mySecond];
+			EXPECT_NEAR(edge.myDistance, (to - from).Length(), 1e-5f * (to - from).Length()) << name;
+			// A straight edge inside one room's box crosses no wall.
+			const bool sharedFlag =
+			    std::any_of(level.myRooms.begin(), level.myRooms.end(), [&](const Room& aRoom) {
+				    return aRoom.myBox.Contains(from, -ourTolerance) &&
+				           aRoom.myBox.Contains(to, -ourTolerance);
+			    });
+			EXPECT_TRUE(sharedFlag) << name << ": edge " << edge.myFirst << "-" << edge.mySecond
+			                        << " runs through a wall";
+		}
+		int ends = 0;
+		std::set<const Room*> visited;
+		for (const auto& [id, position] : positions)
+		{
+			const size_t degree = neighbours[id].size();
+			EXPECT_TRUE(degree == 2 || (!ringFlag && degree == 1))
+			    << name << ": node " << id << " has " << degree;
+			ends += degree == 1 ? 1 : 0;
+			visited.insert(RoomAround(level, position, 0.1f));
+			// A node on a wall stands in that wall's door.
+			for (const Room& room : level.myRooms)
+			{
+				if (!room.myBox.Contains(position, -ourTolerance) ||
+				    room.myBox.Contains(position, ourTolerance))
+				{
+					continue;
+				}
+				const bool doorFlag =
+				    std::any_of(room.myDoors.begin(), room.myDoors.end(),
+				                [&](const Door& aDoor) { return InOpening(aDoor, position); });
+				EXPECT_TRUE(doorFlag) << name << ": node " << id << " stands in a wall of " << room.myId;
+			}
+		}
+		EXPECT_EQ(ends, ringFlag ? 0 : 2) << name;
+		// Connected: a walk from node 1 reaches every node.
+		std::set<int> reached = {1};
+		std::vector<int> pending = {1};
+		while (!pending.empty())
+		{
+			const int id = pending.back();
+			pending.pop_back();
+			for (const int next : neighbours[id])
+			{
+				if (reached.insert(next).second)
+				{
+					pending.push_back(next);
+				}
+			}
+		}
+		EXPECT_EQ(static_cast<int>(reached.size()), count) << name;
+		visited.erase(nullptr);
+		if (ringFlag)
+		{
+			EXPECT_GE(visited.size(), 6u) << "the ring runs through the rooms";
+		}
+		else
+		{
+			EXPECT_TRUE(count >= 3 && count <= 5) << count;
+		}
+	}
+}
+
+TEST(SampleLevelTest, DecalsLieOnTheRoomSurfacesTheyFace)
+{
+	ASSERT_EQ(GeneratedContent::Get().Error(), "");
+	for (const char* name : ourLevels)
+	{
+		const Level& level = GetLevel(name);
+		std::set<std::string> types;
+		bool floorFlag = false;
+		bool wallFlag = false;
+		for (const Decal& decal : level.myDecals)
+		{
+			types.insert(decal.myType);
+			EXPECT_NEAR(decal.myNorm.Length(), 1.0f, 1e-5f) << name;
+			EXPECT_GT(decal.mySize, 0.0f) << name;
+			const Vec& at = decal.myPosition;
+			const Room* room = RoomAround(level, at, -ourTolerance);
+			const float distance = room ? DistanceToFace(room->myBox, at, decal.myNorm) : -1.0f;
+			// The projection box reaches the face, which faces the way the decal projects.
+			EXPECT_TRUE(distance >= -ourTolerance && distance < decal.myDepth * 0.5f)
+			    << name << ": the " << decal.myType << " decal at " << at.x << ", " << at.y << ", " << at.z;
+			if (!room || distance < -ourTolerance)
+			{
+				continue;
+			}
+			floorFlag = floorFlag || decal.myNorm.y > 0.999f;
+			wallFlag = wallFlag || std::abs(decal.myNorm.y) < 1e-3f;
+			// The decal's square stays on the face and off its doors.
+			const float half = decal.mySize * 0.5f;
+			for (int axis = 0; axis < 3; ++axis)
+			{
+				if (std::abs(Component(decal.myNorm, axis)) < 1e-3f)
+				{
+					EXPECT_TRUE(
+					    Component(at, axis) - half >= Component(room->myBox.myMin, axis) - ourTolerance &&
+					    Component(at, axis) + half <= Component(room->myBox.myMax, axis) + ourTolerance)
+					    << name << ": the " << decal.myType << " decal hangs over the face's edge";
+				}
+			}
+			for (const Door& door : room->myDoors)
+			{
+				const Vec along = Vec(0.0f, 1.0f, 0.0f).Cross(door.myOutward);
+				const Vec offset = at - door.myCenter;
+				const bool onDoorFlag = Dot(door.myOutward, decal.myNorm) < -0.999f &&
+				                        std::abs(Dot(offset, along)) < half + door.myWidth * 0.5f &&
+				                        offset.y - half < door.myHeight;
+				EXPECT_FALSE(onDoorFlag)
+				    << name << ": the " << decal.myType << " decal covers a door of " << room->myId;
+			}
+		}
+		EXPECT_FALSE(level.myDecals.empty()) << name;
+		if (std::string(name) == "sample_large")
+		{
+			EXPECT_GE(types.size(), 4u);
+			EXPECT_TRUE(floorFlag && wallFlag) << "decals on walls and on floors";
+		}
+	}
+}
+
+TEST(SampleLevelTest, EveryTypeModelAndTextureNamedExists)
+{
+	ASSERT_EQ(GeneratedContent::Get().Error(), "");
+	const std::vector<std::string>& generated = GeneratedContent::Get().Files();
+	auto exists = [&](const std::string& anEnginePath) {
+		return anEnginePath.starts_with("data/") &&
+		       std::find(generated.begin(), generated.end(), anEnginePath.substr(5)) != generated.end();
+	};
+
+	const std::string entityFile = "XML/EntityTypes.xml";
+	TiXmlDocument entityTypes;
+	ASSERT_TRUE(entityTypes.LoadFile(GeneratedContent::Get().Path(entityFile)));
+	std::set<std::string> entityIds;
+	std::set<std::string> models;
+	for (const TiXmlElement* record : Records(entityTypes, "entities", "entity"))
+	{
+		const std::string id = Text(record, "id", entityFile);
+		EXPECT_TRUE(entityIds.insert(id).second) << "entity type " << id << " twice";
+		const TiXmlElement* component = Child(record, "visual-component", entityFile);
+		EXPECT_EQ(Text(component, "type", entityFile), "model") << id;
+		const std::string path = Text(component, "filepath", entityFile);
+		EXPECT_TRUE(exists(path)) << id << ": " << path;
+		models.insert(path.substr(5));
+	}
+	// Every model a level can place is in the catalogue; the renderer's volumes are not placeable.
+	for (const std::string& document : GeneratedContent::Get().Documents())
+	{
+		const bool volumeFlag =
+		    document.starts_with("models/light_volume_") || document == "models/decal_box.dae";
+		EXPECT_EQ(models.count(document), volumeFlag ? 0u : 1u) << document;
+	}
+
+	const std::string decalFile = "XML/DecalTypes.xml";
+	TiXmlDocument decalTypes;
+	ASSERT_TRUE(decalTypes.LoadFile(GeneratedContent::Get().Path(decalFile)));
+	std::set<std::string> decalIds;
+	for (const TiXmlElement* record = decalTypes.RootElement()->FirstChildElement("decal"); record;
+	     record = record->NextSiblingElement("decal"))
+	{
+		const std::string id = Text(record, "id", decalFile);
+		EXPECT_TRUE(decalIds.insert(id).second) << "decal type " << id << " twice";
+		for (const char* map : {"texture", "normal"})
+		{
+			const std::string path = Text(Child(record, map, decalFile), "path", decalFile);
+			EXPECT_TRUE(exists(path)) << id << ": " << path;
+		}
+	}
+	// A decal added in the editor is a "brick" until the designer picks another type.
+	EXPECT_EQ(decalIds.count("brick"), 1u);
+
+	for (const char* name : ourLevels)
+	{
+		for (const Entity& entity : GetLevel(name).myEntities)
+		{
+			EXPECT_EQ(entityIds.count(entity.myType), 1u) << name << ": entity type " << entity.myType;
+		}
+		for (const Decal& decal : GetLevel(name).myDecals)
+		{
+			EXPECT_EQ(decalIds.count(decal.myType), 1u) << name << ": decal type " << decal.myType;
+		}
+	}
+}
