@@ -31,6 +31,7 @@ public:
 	void SetSize(float aSize) { mySize = aSize; }
 	// UTF-8; a byte sequence that is not UTF-8 becomes '?'.
 	void SetText(const std::string& aText);
+	const std::wstring& GetText() const { return myText; }
 
 	// aNowFlag: draw into the bound render target at once; otherwise queue with the renderer.
 	void Render(bool aNowFlag);

@@ -1,0 +1,252 @@
+#pragma once
+// LumoraWrapper: the one class an editor front end sees. It owns the editor's scene
+// (rooms, placed entities, point and spot lights, decals, the AI path graph), the
+// editor camera, the info line and the marker geometry, and keeps the front end's two
+// threads apart.
+//
+//   Lumora::LumoraWrapper::Create(windowHandle, 1280, 720);   // 0: headless
+//   Lumora::LumoraWrapper* editor = Lumora::LumoraWrapper::GetInstance();
+//   editor->ParseLevel(u"sample_small");
+//   // render loop thread:                 // user-interface thread:
+//   editor->Update(16.0f);                  editor->DoIntersection(x, y);
+//   editor->Render();                       editor->MoveSelectedVector(0, 1, 0);
+//                                           editor->SaveLights(u"sample_small");
+//   Lumora::LumoraWrapper::ShutDown();
+//
+// Threads. Update and Render are frame steps: they run only when the facade is free
+// and no claim is waiting, and return at once otherwise (the frame is dropped, not
+// queued). Editing operations and saving claim the facade: they wait (polling every
+// millisecond) until it is free, take it, work and free it. Loading and the settings
+// updates claim after the frame: they wait until no frame is being rendered and no
+// update runs, then claim. Picking and the queries take nothing. Whoever holds the busy
+// flag makes the engine's GL context current on its thread and lets it go when it
+// frees the flag, so the context is never current on two threads.
+//
+// Strings from the front end are UTF-16; the engine's strings are UTF-8.
+#include <atomic>
+#include <functional>
+#include <map>
+#include <memory>
+#include <string>
+
+#include "ai/NGEdge.h"
+#include "ai/NGNode.h"
+#include "core/GrowingArray.h"
+#include "editor/DecalStruct.h"
+#include "editor/DecalType.h"
+#include "editor/DecalTypeStruct.h"
+#include "editor/LumoraMode.h"
+#include "editor/PointLightStruct.h"
+#include "editor/SpotLightStruct.h"
+#include "renderer/DecalData.h"
+#include "renderer/PointLightData.h"
+#include "renderer/SpotLightData.h"
+
+namespace Zeph
+{
+class Camera;
+class CameraInstance;
+class Instance;
+class Room;
+class Text;
+class Texture;
+} // namespace Zeph
+
+namespace Lumora
+{
+class LumoraWrapper
+{
+public:
+	// The scene arrays' starting room and growth step. The path graph never grows past
+	// it: nodes and edges point at each other's elements, which must not move.
+	static constexpr int ourArraySize = 2000;
+
+	// Lifecycle and frame loop.
+	static bool Create(uint64_t aHwnd, int aWidth, int aHeight);
+	static LumoraWrapper* GetInstance() { return ourInstance; }
+	static void ShutDown();
+	void Update(float someElapsedTime);
+	void Render();
+
+	// Modes, display and camera.
+	void SetIsLightMode(int aMode);
+	void RenderMeshes(bool aRenderFlag);
+	void RenderRooms(bool aRenderFlag);
+	void PitchCamera(float aPitch);
+	void YawCamera(float aYaw);
+	void Zoom(float aZoom);
+	void Strafe(float aStrafe);
+
+	// Picking and selection.
+	void DoIntersection(float aMouseX, float aMouseY);
+	bool TryGetCurrentPointLight(PointLightStruct& aPointLightRef) const;
+	bool TryGetCurrentSpotLight(SpotLightStruct& aSpotLightRef) const;
+	bool TryGetCurrentDecal(DecalStruct& aDecalRef) const;
+
+	// Editing.
+	void AddPointLight();
+	void AddSpotLight();
+	void AddDecal();
+	void AddPathNode();
+	void CopyPointLight();
+	void CopySpotLight();
+	void CopyDecal();
+	void RemoveSelectedPointLight();
+	void RemoveSelectedSpotLight();
+	void RemoveSelectedDecal();
+	void RemoveSelectedNode();
+	void DeleteSelected();
+	void MoveSelectedVector(float anX, float aY, float aZ);
+	void MoveSelectedVert(float aMovement);
+	void MoveSelectedHor(float aMovement);
+	void MoveSelectedDepth(float aMovement);
+	void PitchSpotLight(float aPitch);
+	void YawSpotLight(float aYaw);
+	void ChangeColorPointLight(float anR, float aG, float aB);
+	void ChangeColorSpotLight(float anR, float aG, float aB);
+	void ChangeColorDecal(float anR, float aG, float aB);
+	void ChangeFalloffPointLight(float aFalloff);
+	void ChangeFalloffSpotLight(float aFalloff);
+	void ChangeAnglesSpotLight(float anInnerValue, float anOuterValue);
+	void ChangeDecalSize(float aSize);
+	void ChangeDecalDepth(float aDepth);
+	void ChangeDecalType(const std::u16string& aDecalType);
+	void GetCurrentDecalTypes(DecalTypeStruct& aDecalTypeRef) const;
+
+	// Post-processing settings.
+	void UpdateSSAO(float aScale, float aSampleRadius, float aBias, float anIntensity);
+	void UpdateHDRandBloom(float anAutoExposure, float aLumMin, float aLumMax, float aBloomThresh,
+	                       float aBloomFactor, float anEmissiveMultiplier);
+
+	// Levels.
+	void ParseLevel(const std::u16string& aLevel);
+	void SaveLights(const std::u16string& aLevel);
+	void SaveDecals(const std::u16string& aLevel);
+
+	// Read access for tools and tests (the front end does not need these).
+	LumoraMode GetMode() const { return myMode; }
+	const Zeph::CameraInstance* GetCameraInstance() const { return myCameraInstance.get(); }
+	const Zeph::Text* GetInfoText() const { return myInfoText.get(); }
+	int GetSelectedPoint() const { return myCurrentSelectedPoint; }
+	int GetSelectedSpot() const { return myCurrentSelectedSpot; }
+	int GetSelectedNode() const { return myCurrentSelectedNode; }
+	int GetSelectedDecal() const { return myCurrentSelectedDecal; }
+	const GrowingArray<Zeph::PointLightData>& GetPointLights() const { return myEnvironmentPointLights; }
+	const GrowingArray<Zeph::SpotLightData>& GetSpotLights() const { return myEnvironmentSpotLights; }
+	const GrowingArray<Zeph::DecalData>& GetDecals() const { return myDecals; }
+	const GrowingArray<AI::NGNode>& GetNodes() const { return myNodes; }
+	const GrowingArray<AI::NGEdge>& GetEdges() const { return myEdges; }
+	const GrowingArray<Zeph::Room*>& GetRooms() const { return myRooms; }
+	const GrowingArray<Zeph::Instance*>& GetEntities() const { return myEntities; }
+	const GrowingArray<Zeph::Instance*>& GetLightGizmos() const { return myLightGizmos; }
+	const Zeph::Instance* GetMarkedGizmo() const { return myMarkedGizmo.get(); }
+	const Zeph::Instance* GetDecalBox() const { return myDecalBox.get(); }
+	const std::map<std::string, DecalType>& GetDecalTypes() const { return myDecalTypes; }
+	const std::map<std::string, std::string>& GetEntityBank() const { return myEntityBank; }
+	bool IsBusy() const { return myPausedFlag.load(); }
+	bool IsUpdateActive() const { return myUpdateActive.load(); }
+	// Called by Render with the busy flag held, after the scene is submitted and before
+	// the engine draws it: a hook for tools and tests that check what a frame sees. Set
+	// it while no frame step can run.
+	using FrameObserver = std::function<void(const LumoraWrapper&)>;
+	void SetFrameObserver(FrameObserver anObserver) { myFrameObserver = std::move(anObserver); }
+	int GetNodeIDCounter() const { return myNodeIDCounter; }
+
+private:
+	LumoraWrapper() = default;
+	~LumoraWrapper() = default;
+	LumoraWrapper(const LumoraWrapper&) = delete;
+	LumoraWrapper& operator=(const LumoraWrapper&) = delete;
+
+	void Init();
+	void InitScene();
+	void DestroyScene();
+	void UpdateScene(float someElapsedTime);
+	void RenderScene();
+	void ResetIndices();
+	std::string SysSTringToStdString(const std::u16string& aString) const;
+
+	// The four waiting disciplines. Every Claim... returns with the busy flag held and
+	// the GL context current on the calling thread; Release frees both.
+	bool TryClaimForUpdate();
+	bool TryClaimForRender();
+	void Claim();
+	void WaitUntilFree() const;
+	void ClaimAfterTheFrame();
+	void Release();
+
+	// A marker box instance: a generated box of half extents myNodeHalfDimensions.
+	Zeph::Instance* NewGizmo(const char* aModelName, const Vector4<float>& aColor) const;
+
+	// Level loading and saving.
+	void ParseRooms(const std::string& aPath);
+	void ParseEntities(const std::string& aLevel);
+	void ParseEntities();
+	void ParseLights(const std::string& aPath);
+	void ParseNodes(const std::string& aPath);
+	void ParseDecals(const std::string& aPath);
+	void ParseDecalTypes(const std::string& aPath);
+	void SaveNodes(const std::string& aLevel);
+
+	// Private helpers of picking and editing (Picking.cpp, Editing.cpp).
+	// Waits until the facade is free and takes it when aSelection (read after the
+	// wait) names an object; false, with the flag untouched, when it is -1.
+	bool ClaimForSelection(const int& aSelection);
+	// Whether the current mode's moving or turning has a selected object to act on;
+	// aNodesFlag: path nodes count in NODE_MODE.
+	bool HasSelectionForMode(bool aNodesFlag) const;
+	// Waits, then adds the offset (given in world space, or as aMovement along the
+	// camera's row anAxisRow: 0 right, 1 up, 2 forward) to the mode's selection.
+	void MoveSelectedByMode(const Vector3<float>& anOffset, bool aNodesFlag);
+	void MoveSelectedAlongCamera(int anAxisRow, float aMovement);
+	// Waits, then turns the selected spot light (LIGHT_MODE) or decal (DECAL_MODE).
+	void TurnSelected(const Matrix33<float>& aRotation);
+	// p + aDistance * f for the camera's position p and forward row f.
+	Vector3<float> InFrontOfCamera(float aDistance) const;
+	// Detaches the edge at anIndex from the nodes that hold it, destroys its line and
+	// removes it; an edge moved into its place has its nodes pointed at the new address.
+	void RemoveEdgeAt(int anIndex);
+	// (end of picking and editing helpers)
+
+	// Private helpers of level loading and saving (src/level/).
+	// (end of level helpers)
+
+	static LumoraWrapper* ourInstance;
+
+	int myNodeIDCounter = 1;
+	int myCurrentSelectedPoint = -1;
+	int myCurrentSelectedSpot = -1;
+	int myCurrentSelectedNode = -1;
+	int myCurrentSelectedDecal = -1;
+	std::atomic<bool> myRenderIsDoneFlag{true};
+	std::atomic<bool> myPausedFlag{false};
+	std::atomic<bool> myUpdateActive{false};
+	// Claimants waiting for the busy flag. While any waits, frame steps are dropped, so a
+	// render loop that runs without pause cannot starve the user-interface thread.
+	mutable std::atomic<int> myWaitingClaims{0};
+	bool myRenderRoomsFlag = false;
+	bool myRenderMeshesFlag = true;
+	float myNodeHalfDimensions = 0.25f;
+	std::unique_ptr<Zeph::Camera> myCamera;
+	std::unique_ptr<Zeph::CameraInstance> myCameraInstance;
+	std::unique_ptr<Zeph::Text> myInfoText;
+	GrowingArray<Zeph::Instance*> myEntities{ourArraySize, ourArraySize, true};
+	GrowingArray<Zeph::Instance*> myLightGizmos{ourArraySize, ourArraySize, true};
+	GrowingArray<Zeph::PointLightData> myEnvironmentPointLights{ourArraySize, ourArraySize, true};
+	GrowingArray<Zeph::SpotLightData> myEnvironmentSpotLights{ourArraySize, ourArraySize, true};
+	GrowingArray<Zeph::Room*> myRooms{ourArraySize, ourArraySize, true};
+	GrowingArray<AI::NGNode> myNodes{ourArraySize, ourArraySize, true};
+	GrowingArray<AI::NGEdge> myEdges{ourArraySize, ourArraySize, true};
+	std::map<std::string, std::string> myEntityBank;
+	std::map<std::string, bool> myEntityShadowCasterBank;
+	std::map<std::string, DecalType> myDecalTypes;
+	GrowingArray<Zeph::DecalData> myDecals{ourArraySize, ourArraySize, true};
+	Zeph::Texture* myTexture = nullptr;
+	Zeph::Texture* myNormTexture = nullptr;
+	std::unique_ptr<Zeph::Instance> myDecalBox;
+	std::unique_ptr<Zeph::Instance> myMarkedGizmo;
+	LumoraMode myMode = LIGHT_MODE;
+	bool mySceneFlag = false;
+	FrameObserver myFrameObserver;
+};
+} // namespace Lumora

@@ -1,0 +1,136 @@
+#pragma once
+// The fixture for tests that drive the editor facade headless. The facade writes
+// "DebugLogger.txt" into the working directory and reads data/ from it, so each test
+// runs in its own scratch directory: data/ there holds links to the repository's data
+// folders, except data/XML, which is a copy (tests may write level files into it).
+// The facade is created at 160 x 90 without a window; where no OpenGL 4.5 context can
+// be made the test is skipped, except under CI=true. The facade's log makes severe and
+// critical reports fatal, so a test that provokes one ends the process: tests assert
+// on the log's debug entries only.
+//
+//   TEST_F(FacadeTest, Something)
+//   {
+//       Facade().AddPointLight();
+//       EXPECT_NE(LogText().find("..."), std::string::npos);
+//   }
+
+#include <filesystem>
+#include <gtest/gtest.h>
+#include <string>
+#include <system_error>
+
+#include "core/Matrix44.h"
+#include "core/Vector4.h"
+#include "editor/LumoraWrapper.h"
+#include "engine/CameraInstance.h"
+#include "platform/gpu/Device.h"
+#include "support/GlSupport.h"
+#include "support/TestSupport.h"
+
+class FacadeTest : public testing::Test
+{
+protected:
+	static constexpr int ourWidth = 160;
+	static constexpr int ourHeight = 90;
+
+	void SetUp() override
+	{
+		if (!HasGl())
+		{
+			ASSERT_FALSE(TestSupport::IsCi()) << "No OpenGL 4.5 core context under CI";
+			GTEST_SKIP() << "No OpenGL 4.5 core context";
+		}
+		MakeDataFolder();
+		PrepareData(myScratch.Path() / "data");
+		myPreviousDirectory = std::filesystem::current_path();
+		std::filesystem::current_path(myScratch.Path());
+		myChangedDirectoryFlag = true;
+		ASSERT_TRUE(Lumora::LumoraWrapper::Create(0, ourWidth, ourHeight)) << LogText();
+		myFacade = Lumora::LumoraWrapper::GetInstance();
+		ASSERT_NE(myFacade, nullptr);
+	}
+
+	void TearDown() override
+	{
+		if (myFacade != nullptr)
+		{
+			Lumora::LumoraWrapper::ShutDown();
+			myFacade = nullptr;
+		}
+		if (myChangedDirectoryFlag)
+		{
+			std::filesystem::current_path(myPreviousDirectory);
+		}
+	}
+
+	// Runs before the facade is created, for fixtures that put files of their own into
+	// the scratch data folder (its XML folder is a copy; the other folders are links to
+	// the repository's data and must not be written).
+	virtual void PrepareData(const std::filesystem::path& aDataPath) { static_cast<void>(aDataPath); }
+
+	Lumora::LumoraWrapper& Facade() { return *myFacade; }
+	const std::filesystem::path& ScratchPath() const { return myScratch.Path(); }
+	// The whole log as written so far (each entry is flushed as it is written).
+	std::string LogText() const { return TestSupport::ReadWholeFile(myScratch.File("DebugLogger.txt")); }
+
+	// The pixel at which the editor camera sees aPosition, through the camera's view and
+	// projection (the path the renderer draws with), so clicks there must hit it.
+	void PixelOf(const Vector3<float>& aPosition, float& anXOut, float& aYOut) const
+	{
+		const Zeph::CameraInstance& camera = *myFacade->GetCameraInstance();
+		const Vector4<float> clip = Vector4<float>(aPosition) * camera.GetView() * camera.GetProjection();
+		anXOut = (clip.x / clip.w + 1.0f) * 0.5f * static_cast<float>(ourWidth);
+		aYOut = (1.0f - clip.y / clip.w) * 0.5f * static_cast<float>(ourHeight);
+	}
+
+	void ClickAt(const Vector3<float>& aPosition)
+	{
+		float x = 0.0f;
+		float y = 0.0f;
+		PixelOf(aPosition, x, y);
+		myFacade->DoIntersection(x, y);
+	}
+
+	void ClickCentre() { myFacade->DoIntersection(0.5f * ourWidth, 0.5f * ourHeight); }
+
+private:
+	// One probe per process: a headless context that is made and dropped at once.
+	static bool HasGl()
+	{
+		static const bool ourHasGlFlag = [] {
+			Gpu::Device probe;
+			const bool result = probe.Init(16, 16);
+			if (result)
+			{
+				probe.Destroy();
+			}
+			return result;
+		}();
+		return ourHasGlFlag;
+	}
+
+	void MakeDataFolder()
+	{
+		namespace fs = std::filesystem;
+		const fs::path source = fs::path(LUMORA_TEST_SOURCE_ROOT) / "data";
+		const fs::path data = myScratch.Path() / "data";
+		fs::create_directories(data / "XML");
+		for (const fs::directory_entry& entry : fs::directory_iterator(source))
+		{
+			const fs::path name = entry.path().filename();
+			if (name == "XML")
+			{
+				fs::copy(entry.path(), data / "XML", fs::copy_options::recursive);
+			}
+			else
+			{
+				fs::create_directory_symlink(entry.path(), data / name);
+			}
+		}
+	}
+
+	TestSupport::ScratchDir myScratch;
+	std::filesystem::path myPreviousDirectory;
+	bool myChangedDirectoryFlag = false;
+	Lumora::LumoraWrapper* myFacade = nullptr;
+};
