@@ -1,0 +1,655 @@
+// Loading and saving levels through the facade: what each file puts into the scene, what is
+// left out with a message, and what a save writes back (and keeps) in the level's files.
+#include <csignal>
+#include <cstdlib>
+#include <filesystem>
+#include <sstream>
+#include <string>
+
+#include "engine/Instance.h"
+#include "engine/Room.h"
+#include "level/LevelFixture.h"
+#include "model/Model.h"
+#include "model/ModelNode.h"
+
+namespace
+{
+using Lumora::LIGHT_MODE;
+using Lumora::NODE_MODE;
+
+const char* const ourRoomsText = R"(<root>
+	<rooms>
+		<room>
+			<min x="2" y="0" z="0" />
+			<max x="5" y="4" z="10" />
+			<id value="hall" />
+		</room>
+		<room>
+			<max x="10" y="1" z="10" />
+			<min x="-10" y="3" z="0" />
+		</room>
+	</rooms>
+</root>
+)";
+
+const char* const ourEntitiesText = R"(<root>
+	<entities>
+		<entity type="crate">
+			<position x="-3.5" y="2" z="5" />
+			<rotation x="0" y="90" z="0" />
+		</entity>
+		<entity type="ghost">
+			<position x="0" y="0" z="0" />
+			<rotation x="0" y="0" z="0" />
+		</entity>
+		<entity type="lamp">
+			<position x="0" y="0" z="0" />
+			<rotation x="0" y="0" z="0" />
+		</entity>
+		<entity type="pillar">
+			<position x="0" y="100" z="0" />
+			<rotation x="0" y="0" z="0" />
+		</entity>
+	</entities>
+</root>
+)";
+
+const char* const ourLightsText = R"(<?xml version="1.0" ?>
+<!-- lights of the small level -->
+<root>
+	<point-lights>
+		<point-light>
+			<position x="1" y="2" z="3" />
+			<color r="1" g="0.5" b="0.25" a="2" />
+			<falloff value="0.5" />
+		</point-light>
+		<point-light note="by hand">
+			<falloff f="4" />
+			<color a="1" b="3" g="2" r="1.5" />
+			<position x="-1" y="1234.5678" z="0.1" />
+			<extra />
+		</point-light>
+	</point-lights>
+	<foreign>
+		<keep me="yes" />
+	</foreign>
+	<spot-lights>
+		<spot-light>
+			<position x="0" y="5" z="0" />
+			<color r="1" g="1" b="1" a="1" />
+			<falloff value="8" />
+			<direction x="0" y="-2" z="0" />
+			<angles inner="0.9" outer="0.7" />
+		</spot-light>
+		<spot-light>
+			<angles outer="0.5" inner="0.8" />
+			<direction x="0" y="0" z="3" />
+			<falloff value="6" />
+			<color r="0" g="1" b="0" a="1" />
+			<position x="3" y="2" z="1" />
+		</spot-light>
+	</spot-lights>
+</root>
+)";
+
+const char* const ourNodeGraphText = R"(<root>
+	<!-- the guards' path -->
+	<node-graph>
+		<nodes number-of-nodes="3">
+			<node id="4">
+				<position x="0" y="0" z="0" />
+			</node>
+			<node id="9">
+				<position x="3" y="0" z="0" />
+			</node>
+			<node id="2">
+				<position x="3" y="4" z="0" />
+			</node>
+		</nodes>
+		<edges number-of-edges="2">
+			<edge>
+				<connections firstID="4" secondID="9" />
+				<distance value="100" />
+			</edge>
+			<edge>
+				<distance value="7" />
+				<connections secondID="2" firstID="9" />
+			</edge>
+		</edges>
+	</node-graph>
+</root>
+)";
+
+const char* const ourDecalsText = R"(<root>
+	<decals>
+		<decal>
+			<decal-type id="wood" />
+			<position x="1" y="0" z="2" />
+			<norm x="0" y="1" z="0" />
+			<color r="1" g="1" b="1" a="0.5" />
+			<size value="2" />
+			<depth value="0.25" />
+		</decal>
+		<decal>
+			<depth d="0.5" />
+			<size s="1.5" />
+			<color r="0.2" g="0.3" b="0.4" a="1" />
+			<norm x="0" y="0" z="-1" />
+			<position x="-4" y="1" z="6" />
+			<decal-type name="bricks" />
+		</decal>
+	</decals>
+</root>
+)";
+
+class LevelLoadSaveTest : public LevelTest
+{
+protected:
+	void WriteSmallLevel(const std::string& aLevel)
+	{
+		WriteLevelFile(aLevel, "rooms.xml", ourRoomsText);
+		WriteLevelFile(aLevel, "entities.xml", ourEntitiesText);
+		WriteLevelFile(aLevel, "lights.xml", ourLightsText);
+		WriteLevelFile(aLevel, "nodegraph.xml", ourNodeGraphText);
+		WriteLevelFile(aLevel, "decals.xml", ourDecalsText);
+	}
+
+	// The three files the savers write, in one string.
+	std::string SavedFiles(const std::string& aLevel)
+	{
+		Facade().SaveLights(std::u16string(aLevel.begin(), aLevel.end()));
+		Facade().SaveDecals(std::u16string(aLevel.begin(), aLevel.end()));
+		return ReadLevelFile(aLevel, "lights.xml") + ReadLevelFile(aLevel, "nodegraph.xml") +
+		       ReadLevelFile(aLevel, "decals.xml");
+	}
+};
+
+void ExpectVector(const Vector3<float>& anActual, float anX, float aY, float aZ)
+{
+	EXPECT_NEAR(anActual.x, anX, 1e-5f);
+	EXPECT_NEAR(anActual.y, aY, 1e-5f);
+	EXPECT_NEAR(anActual.z, aZ, 1e-5f);
+}
+
+const Zeph::RoomData& RoomDataOf(const Zeph::Instance& anInstance)
+{
+	return anInstance.GetRootNode()->GetRenderData().myRoomData;
+}
+
+// The first model of a tree, depth-first.
+const Zeph::Model* FirstModel(const Zeph::ModelNode& aNode)
+{
+	if (aNode.GetModel() != nullptr)
+	{
+		return aNode.GetModel();
+	}
+	for (int index = 0; index < aNode.GetChildren().Count(); ++index)
+	{
+		if (const Zeph::Model* model = FirstModel(*aNode.GetChildren()[index]))
+		{
+			return model;
+		}
+	}
+	return nullptr;
+}
+} // namespace
+
+TEST_F(LevelLoadSaveTest, CataloguesRegisterModelTypesAndDecalTextures)
+{
+	const auto& bank = Facade().GetEntityBank();
+	ASSERT_EQ(bank.size(), 2u);
+	EXPECT_EQ(bank.at("crate"), "data/models/crate.dae");
+	EXPECT_EQ(bank.at("pillar"), "data/models/pillar.dae");
+	const auto& decalTypes = Facade().GetDecalTypes();
+	ASSERT_EQ(decalTypes.size(), 2u);
+	for (const auto& [name, type] : decalTypes)
+	{
+		EXPECT_NE(type.myTexture, nullptr) << name;
+		EXPECT_NE(type.myNormalTexture, nullptr) << name;
+	}
+	EXPECT_NE(decalTypes.at("bricks").myTexture, decalTypes.at("wood").myTexture);
+}
+
+TEST_F(LevelLoadSaveTest, SmallLevelFillsEveryPartOfTheScene)
+{
+	WriteSmallLevel("small");
+	Facade().ParseLevel(u"small");
+
+	const auto& rooms = Facade().GetRooms();
+	ASSERT_EQ(rooms.Count(), 2);
+	EXPECT_EQ(rooms[0]->GetID(), "hall");
+	ExpectVector(rooms[0]->GetMin(), -5.0f, 0.0f, 0.0f);
+	ExpectVector(rooms[0]->GetMax(), -2.0f, 4.0f, 10.0f);
+	EXPECT_EQ(rooms[1]->GetID(), "NOT_SET");
+	// Only x is mirrored and put in order.
+	ExpectVector(rooms[1]->GetMin(), -10.0f, 3.0f, 0.0f);
+	ExpectVector(rooms[1]->GetMax(), 10.0f, 1.0f, 10.0f);
+	EXPECT_NE(rooms[0]->GetDebugInstance(), nullptr);
+
+	// The unknown type and the type that is no model place nothing.
+	const auto& entities = Facade().GetEntities();
+	ASSERT_EQ(entities.Count(), 2);
+	const Matrix44<float>& crate = entities[0]->GetOrientation();
+	ExpectVector(crate.GetRight(), 0.0f, 0.0f, 1.0f);
+	ExpectVector(crate.GetPosition(), -3.5f, 2.0f, 5.0f);
+	EXPECT_EQ(RoomDataOf(*entities[0]).myRoomIndex, 0);
+	ExpectVector(RoomDataOf(*entities[0]).myMin, -5.0f, 0.0f, 0.0f);
+	EXPECT_NE(RoomDataOf(*entities[0]).myCubemap, nullptr);
+	EXPECT_EQ(RoomDataOf(*entities[1]).myRoomIndex, -1);
+	ExpectVector(RoomDataOf(*entities[1]).myMin, -1.0f, -1.0f, -1.0f);
+	ExpectVector(RoomDataOf(*entities[1]).myMax, 1.0f, 1.0f, 1.0f);
+	const Zeph::Model* crateModel = FirstModel(*entities[0]->GetModelNode());
+	const Zeph::Model* pillarModel = FirstModel(*entities[1]->GetModelNode());
+	ASSERT_TRUE(crateModel != nullptr && pillarModel != nullptr);
+	EXPECT_FALSE(crateModel->GetIsShadowCasterFlag());
+	EXPECT_TRUE(pillarModel->GetIsShadowCasterFlag());
+
+	const auto& points = Facade().GetPointLights();
+	ASSERT_EQ(points.Count(), 2);
+	ExpectVector(points[0].myPosition, 1.0f, 2.0f, 3.0f);
+	EXPECT_FLOAT_EQ(points[0].myColor.w, 2.0f);
+	EXPECT_FLOAT_EQ(points[0].myFalloff, 0.5f);
+	// A single value is the first attribute, whatever its name; colour by component name.
+	EXPECT_FLOAT_EQ(points[1].myFalloff, 4.0f);
+	EXPECT_FLOAT_EQ(points[1].myColor.x, 1.5f);
+	EXPECT_FLOAT_EQ(points[1].myColor.z, 3.0f);
+
+	const auto& spots = Facade().GetSpotLights();
+	ASSERT_EQ(spots.Count(), 2);
+	const Matrix44<float>& down = spots[0].myOrientation;
+	ExpectVector(down.GetPosition(), 0.0f, 5.0f, 0.0f);
+	ExpectVector(down.GetForward(), 0.0f, -1.0f, 0.0f);
+	ExpectVector(down.GetRight(), 1.0f, 0.0f, 0.0f);
+	ExpectVector(down.GetUp(), 0.0f, 0.0f, 1.0f);
+	EXPECT_FLOAT_EQ(spots[0].myFalloff, 8.0f);
+	const Matrix44<float>& ahead = spots[1].myOrientation;
+	ExpectVector(ahead.GetForward(), 0.0f, 0.0f, 1.0f);
+	ExpectVector(ahead.GetRight(), 1.0f, 0.0f, 0.0f);
+	ExpectVector(ahead.GetUp(), 0.0f, 1.0f, 0.0f);
+	EXPECT_FLOAT_EQ(spots[1].myAngles.x, 0.8f);
+	EXPECT_FLOAT_EQ(spots[1].myAngles.y, 0.5f);
+	EXPECT_FLOAT_EQ(spots[1].myColor.y, 1.0f);
+
+	const auto& nodes = Facade().GetNodes();
+	const auto& edges = Facade().GetEdges();
+	ASSERT_EQ(nodes.Count(), 3);
+	ASSERT_EQ(edges.Count(), 2);
+	EXPECT_EQ(nodes[2].GetID(), 2);
+	// Numbering goes on from the last node of the file, not from the largest ID.
+	EXPECT_EQ(Facade().GetNodeIDCounter(), 3);
+	// The stored distances give way to the lengths between the nodes.
+	EXPECT_FLOAT_EQ(edges[0].GetDistance(), 3.0f);
+	EXPECT_FLOAT_EQ(edges[1].GetDistance(), 4.0f);
+	EXPECT_EQ(edges[1].GetFirstConnectionID(), 9);
+	EXPECT_EQ(edges[1].GetSecondConnectionID(), 2);
+	EXPECT_EQ(nodes[0].GetEdgeSlots()[0], &edges[0]);
+	EXPECT_EQ(nodes[1].GetEdgeSlots()[0], &edges[0]);
+	EXPECT_EQ(nodes[1].GetEdgeSlots()[1], &edges[1]);
+	EXPECT_EQ(nodes[2].GetEdgeSlots()[0], &edges[1]);
+	EXPECT_NE(edges[0].GetDebugLine(), nullptr);
+	EXPECT_NE(nodes[0].GetDebugInstance(), nullptr);
+
+	const auto& decals = Facade().GetDecals();
+	ASSERT_EQ(decals.Count(), 2);
+	const auto& types = Facade().GetDecalTypes();
+	EXPECT_EQ(decals[0].myTypeId, "wood");
+	EXPECT_EQ(decals[0].myTexture, types.at("wood").myTexture);
+	EXPECT_EQ(decals[0].myNormalTexture, types.at("wood").myNormalTexture);
+	ExpectVector(decals[0].myNorm, 0.0f, 1.0f, 0.0f);
+	EXPECT_FLOAT_EQ(decals[0].mySize, 2.0f);
+	EXPECT_FLOAT_EQ(decals[0].myDepth, 0.25f);
+	EXPECT_EQ(decals[1].myTypeId, "bricks");
+	EXPECT_EQ(decals[1].myTexture, types.at("bricks").myTexture);
+	EXPECT_FLOAT_EQ(decals[1].myDepth, 0.5f);
+	ExpectVector(decals[1].myPosition, -4.0f, 1.0f, 6.0f);
+
+	EXPECT_EQ(ErrorEntryCount(), 0) << LogText();
+	EXPECT_FALSE(Facade().IsBusy());
+}
+
+TEST_F(LevelLoadSaveTest, NextLevelReplacesTheSceneAndMissingSectionsAreEmpty)
+{
+	WriteSmallLevel("small");
+	WriteLevelFile("sparse", "rooms.xml",
+	               "<root><rooms><room><min x=\"0\" y=\"0\" z=\"0\" />"
+	               "<max x=\"1\" y=\"1\" z=\"1\" /></room></rooms></root>");
+	WriteLevelFile("sparse", "entities.xml", "<root />");
+	WriteLevelFile("sparse", "lights.xml", "<root><spot-lights /></root>");
+	WriteLevelFile("sparse", "nodegraph.xml", "<root><node-graph><edges /></node-graph></root>");
+	WriteLevelFile("sparse", "decals.xml", "<root><decoration /></root>");
+
+	Facade().ParseLevel(u"small");
+	Facade().Update(16.0f);
+	ASSERT_EQ(Facade().GetLightGizmos().Count(), 4);
+	Facade().SetIsLightMode(NODE_MODE);
+	Facade().Zoom(5.0f);
+	Facade().YawCamera(0.5f);
+	Facade().SetIsLightMode(LIGHT_MODE);
+
+	Facade().ParseLevel(u"sparse");
+	EXPECT_EQ(Facade().GetRooms().Count(), 1);
+	EXPECT_EQ(Facade().GetEntities().Count(), 0);
+	EXPECT_EQ(Facade().GetPointLights().Count(), 0);
+	EXPECT_EQ(Facade().GetSpotLights().Count(), 0);
+	EXPECT_EQ(Facade().GetLightGizmos().Count(), 0);
+	EXPECT_EQ(Facade().GetNodes().Count(), 0);
+	EXPECT_EQ(Facade().GetEdges().Count(), 0);
+	EXPECT_EQ(Facade().GetDecals().Count(), 0);
+	EXPECT_EQ(Facade().GetNodeIDCounter(), 1);
+	const Zeph::CameraInstance& camera = *Facade().GetCameraInstance();
+	ExpectVector(camera.GetPosition(), 0.0f, 10.0f, 0.0f);
+	ExpectVector(camera.GetActualOrientation().GetForward(), 0.0f, 0.0f, 1.0f);
+	ExpectVector(camera.GetActualOrientation().GetRight(), 1.0f, 0.0f, 0.0f);
+	EXPECT_EQ(ErrorEntryCount(), 0) << LogText();
+
+	// A frame of the emptied scene runs.
+	Facade().Update(16.0f);
+	Facade().Render();
+	EXPECT_FALSE(Facade().IsBusy());
+}
+
+TEST_F(LevelLoadSaveTest, LoadingClearsTheSelection)
+{
+	WriteSmallLevel("small");
+	Facade().ParseLevel(u"small");
+	Facade().AddPointLight();
+	ASSERT_EQ(Facade().GetSelectedPoint(), 2);
+	Facade().ParseLevel(u"small");
+	EXPECT_EQ(Facade().GetSelectedPoint(), -1);
+	EXPECT_EQ(Facade().GetSelectedSpot(), -1);
+	EXPECT_EQ(Facade().GetSelectedNode(), -1);
+	EXPECT_EQ(Facade().GetSelectedDecal(), -1);
+}
+
+TEST_F(LevelLoadSaveTest, SaveRewritesOwnSectionsOnlyAndIsStable)
+{
+	WriteSmallLevel("small");
+	Facade().ParseLevel(u"small");
+	const std::string first = SavedFiles("small");
+	Facade().ParseLevel(u"small");
+	const std::string second = SavedFiles("small");
+	EXPECT_EQ(first, second);
+
+	const std::string lights = ReadLevelFile("small", "lights.xml");
+	EXPECT_NE(lights.find("<!-- lights of the small level -->"), std::string::npos) << lights;
+	EXPECT_NE(lights.find("<keep me=\"yes\" />"), std::string::npos) << lights;
+	EXPECT_EQ(lights.find("by hand"), std::string::npos) << lights;
+	EXPECT_EQ(lights.find("<extra"), std::string::npos) << lights;
+	EXPECT_EQ(CountOf(lights, "<point-light>"), 2);
+	EXPECT_NE(lights.find("<falloff value=\"4\" />"), std::string::npos) << lights;
+	// Six significant digits.
+	EXPECT_NE(lights.find("<position x=\"-1\" y=\"1234.57\" z=\"0.1\" />"), std::string::npos) << lights;
+	// Only the direction is stored, normalised; children in the writer's order.
+	EXPECT_NE(lights.find("<position x=\"3\" y=\"2\" z=\"1\" />\n"
+	                      "            <color r=\"0\" g=\"1\" b=\"0\" a=\"1\" />\n"
+	                      "            <falloff value=\"6\" />\n"
+	                      "            <direction x=\"0\" y=\"0\" z=\"1\" />\n"
+	                      "            <angles inner=\"0.8\" outer=\"0.5\" />"),
+	          std::string::npos)
+	    << lights;
+	EXPECT_NE(lights.find("<direction x=\"0\" y=\"-1\" z=\"0\" />"), std::string::npos) << lights;
+
+	const std::string graph = ReadLevelFile("small", "nodegraph.xml");
+	EXPECT_NE(graph.find("<!-- the guards' path -->"), std::string::npos) << graph;
+	EXPECT_NE(graph.find("<nodes number-of-nodes=\"3\">"), std::string::npos) << graph;
+	EXPECT_NE(graph.find("<edges number-of-edges=\"2\">"), std::string::npos) << graph;
+	EXPECT_NE(graph.find("<node id=\"9\">"), std::string::npos) << graph;
+	EXPECT_NE(graph.find("<connections firstID=\"4\" secondID=\"9\" />\n"
+	                     "                <distance value=\"3\" />"),
+	          std::string::npos)
+	    << graph;
+	EXPECT_EQ(graph.find("100"), std::string::npos) << graph;
+
+	const std::string decals = ReadLevelFile("small", "decals.xml");
+	EXPECT_NE(decals.find("<decal-type id=\"bricks\" />\n"
+	                      "            <position x=\"-4\" y=\"1\" z=\"6\" />\n"
+	                      "            <norm x=\"0\" y=\"0\" z=\"-1\" />\n"
+	                      "            <color r=\"0.2\" g=\"0.3\" b=\"0.4\" a=\"1\" />\n"
+	                      "            <size value=\"1.5\" />\n"
+	                      "            <depth value=\"0.5\" />"),
+	          std::string::npos)
+	    << decals;
+
+	// Decals are saved alone; lights take the path graph with them.
+	const std::string graphBefore = ReadLevelFile("small", "nodegraph.xml");
+	WriteLevelFile("small", "lights.xml", ourLightsText);
+	Facade().SaveDecals(u"small");
+	EXPECT_EQ(ReadLevelFile("small", "lights.xml"), ourLightsText);
+	WriteLevelFile("small", "nodegraph.xml", ourNodeGraphText);
+	Facade().SaveLights(u"small");
+	EXPECT_EQ(ReadLevelFile("small", "nodegraph.xml"), graphBefore);
+	EXPECT_FALSE(Facade().IsBusy());
+}
+
+TEST_F(LevelLoadSaveTest, SavedDistancesFollowTheNodesAsDrawn)
+{
+	WriteSmallLevel("small");
+	Facade().ParseLevel(u"small");
+	Facade().SetIsLightMode(NODE_MODE);
+	Facade().Update(16.0f);
+	Facade().Render();
+	EXPECT_FLOAT_EQ(Facade().GetEdges()[1].GetDistance(), 4.0f);
+	Facade().SaveLights(u"small");
+	const std::string graph = ReadLevelFile("small", "nodegraph.xml");
+	EXPECT_NE(graph.find("<distance value=\"3\" />"), std::string::npos) << graph;
+	EXPECT_NE(graph.find("<distance value=\"4\" />"), std::string::npos) << graph;
+	EXPECT_EQ(graph.find("<distance value=\"7\" />"), std::string::npos) << graph;
+}
+
+TEST_F(LevelLoadSaveTest, SavingANewLevelCreatesItsFiles)
+{
+	WriteSmallLevel("small");
+	Facade().ParseLevel(u"small");
+	ASSERT_FALSE(std::filesystem::exists("data/XML/levels/fresh"));
+	Facade().SaveLights(u"fresh");
+	Facade().SaveDecals(u"fresh");
+	for (const char* file : {"lights.xml", "nodegraph.xml", "decals.xml"})
+	{
+		EXPECT_TRUE(std::filesystem::is_regular_file(LevelFile("fresh", file))) << file;
+	}
+	// No temporary is left beside them.
+	int files = 0;
+	for ([[maybe_unused]] const auto& entry : std::filesystem::directory_iterator("data/XML/levels/fresh"))
+	{
+		++files;
+	}
+	EXPECT_EQ(files, 3);
+
+	WriteLevelFile("fresh", "rooms.xml", ourRoomsText);
+	WriteLevelFile("fresh", "entities.xml", ourEntitiesText);
+	Facade().ParseLevel(u"fresh");
+	EXPECT_EQ(Facade().GetPointLights().Count(), 2);
+	EXPECT_EQ(Facade().GetSpotLights().Count(), 2);
+	EXPECT_EQ(Facade().GetNodes().Count(), 3);
+	EXPECT_EQ(Facade().GetEdges().Count(), 2);
+	EXPECT_EQ(Facade().GetDecals().Count(), 2);
+	EXPECT_EQ(ErrorEntryCount(), 0) << LogText();
+}
+
+TEST_F(LevelLoadSaveTest, EdgesToMissingNodesAndUnknownDecalTypesAreLeftOutWithAMessage)
+{
+	WriteSmallLevel("faulty");
+	WriteLevelFile("faulty", "nodegraph.xml", R"(<root><node-graph>
+		<nodes><node id="1"><position x="0" y="0" z="0" /></node>
+		       <node id="2"><position x="0" y="0" z="2" /></node></nodes>
+		<edges><edge><connections firstID="1" secondID="77" /><distance value="1" /></edge>
+		       <edge><connections firstID="1" secondID="2" /><distance value="1" /></edge>
+		       <edge><connections firstID="2" secondID="0" /><distance value="1" /></edge></edges>
+	</node-graph></root>)");
+	WriteLevelFile("faulty", "decals.xml", R"(<root><decals>
+		<decal><decal-type id="marble" /><position x="0" y="0" z="0" /><norm x="0" y="0" z="1" />
+		       <color r="1" g="1" b="1" a="1" /><size value="1" /><depth value="1" /></decal>
+		<decal><decal-type id="wood" /><position x="5" y="0" z="0" /><norm x="0" y="0" z="1" />
+		       <color r="1" g="1" b="1" a="1" /><size value="1" /><depth value="1" /></decal>
+	</decals></root>)");
+	Facade().ParseLevel(u"faulty");
+
+	ASSERT_EQ(Facade().GetEdges().Count(), 1);
+	EXPECT_EQ(Facade().GetEdges()[0].GetSecondConnectionID(), 2);
+	EXPECT_FLOAT_EQ(Facade().GetEdges()[0].GetDistance(), 2.0f);
+	EXPECT_EQ(Facade().GetNodes()[0].GetEdgeSlots()[1], nullptr);
+	ASSERT_EQ(Facade().GetDecals().Count(), 1);
+	EXPECT_EQ(Facade().GetDecals()[0].myTypeId, "wood");
+
+	const std::string log = LogText();
+	EXPECT_EQ(ErrorEntryCount(), 3) << log;
+	EXPECT_NE(log.find("Edge between path nodes 1 and 77 in [data/XML/levels/faulty/nodegraph.xml] names a "
+	                   "missing node: left out"),
+	          std::string::npos)
+	    << log;
+	EXPECT_NE(log.find("Edge between path nodes 2 and 0 in"), std::string::npos) << log;
+	EXPECT_NE(log.find("\"Function:\"\"Lumora::LumoraWrapper::ParseNodes\""), std::string::npos) << log;
+	EXPECT_NE(log.find("Unknown decal-type [marble] in [data/XML/levels/faulty/decals.xml]: decal left out"),
+	          std::string::npos)
+	    << log;
+	EXPECT_NE(log.find("\"Function:\"\"Lumora::LumoraWrapper::ParseDecals\""), std::string::npos) << log;
+}
+
+TEST_F(LevelLoadSaveTest, PathGraphStopsAtTheArraySizeAndNeverMoves)
+{
+	constexpr int nodeCount = Lumora::LumoraWrapper::ourArraySize + 1;
+	std::ostringstream graph;
+	graph << "<root><node-graph><nodes>";
+	for (int id = 1; id <= nodeCount; ++id)
+	{
+		graph << "<node id=\"" << id << "\"><position x=\"" << id << "\" y=\"0\" z=\"0\" /></node>";
+	}
+	// A ring over the nodes that fit (no chain needed), then one edge more than the array holds.
+	graph << "</nodes><edges>";
+	for (int id = 1; id < nodeCount; ++id)
+	{
+		const int next = id + 1 < nodeCount ? id + 1 : 1;
+		graph << "<edge><connections firstID=\"" << id << "\" secondID=\"" << next
+		      << "\" /><distance value=\"1\" /></edge>";
+	}
+	graph << "<edge><connections firstID=\"" << nodeCount - 1 << "\" secondID=\"" << nodeCount
+	      << "\" /><distance value=\"1\" /></edge>";
+	graph << "</edges></node-graph></root>";
+	WriteSmallLevel("crowded");
+	WriteLevelFile("crowded", "nodegraph.xml", graph.str());
+	Facade().ParseLevel(u"crowded");
+
+	const auto& nodes = Facade().GetNodes();
+	const auto& edges = Facade().GetEdges();
+	ASSERT_EQ(nodes.Count(), Lumora::LumoraWrapper::ourArraySize);
+	ASSERT_EQ(edges.Count(), Lumora::LumoraWrapper::ourArraySize);
+	EXPECT_EQ(Facade().GetNodeIDCounter(), nodeCount);
+	EXPECT_FLOAT_EQ(edges.Last().GetDistance(), static_cast<float>(nodeCount - 2));
+	// Every pointer of the graph lands on an element of the arrays as they are now.
+	const AI::NGNode* firstNode = &nodes[0];
+	const AI::NGEdge* firstEdge = &edges[0];
+	for (int index = 0; index < edges.Count(); ++index)
+	{
+		for (int end = 0; end < 2; ++end)
+		{
+			const AI::NGNode* node = edges[index].GetConnections()[end];
+			ASSERT_TRUE(node >= firstNode && node < firstNode + nodes.Count()) << index;
+		}
+	}
+	for (int index = 0; index < nodes.Count(); ++index)
+	{
+		for (int slot = 0; slot < 2; ++slot)
+		{
+			const AI::NGEdge* edge = nodes[index].GetEdgeSlots()[slot];
+			ASSERT_TRUE(edge >= firstEdge && edge < firstEdge + edges.Count()) << index;
+		}
+	}
+	const std::string log = LogText();
+	EXPECT_NE(log.find("holds more than 2000 path nodes: 1 nodes were left out"), std::string::npos) << log;
+	EXPECT_NE(log.find("holds more than 2000 path edges: 1 edges were left out"), std::string::npos) << log;
+}
+
+TEST_F(LevelLoadSaveTest, LargeLevelLoadsRendersAndSaves)
+{
+	constexpr int count = 2000;
+	std::ostringstream lights;
+	std::ostringstream decals;
+	std::ostringstream graph;
+	lights << "<root><point-lights>";
+	decals << "<root><decals>";
+	graph << "<root><node-graph><nodes>";
+	for (int index = 0; index < count; ++index)
+	{
+		const float x = static_cast<float>(index % 50) - 25.0f;
+		const float z = static_cast<float>(index / 50);
+		lights << "<point-light><position x=\"" << x << "\" y=\"1\" z=\"" << z
+		       << "\" /><color r=\"1\" g=\"0.5\" b=\"0.25\" a=\"1\" /><falloff value=\"2\" /></point-light>";
+		decals << "<decal><decal-type id=\"" << (index % 2 == 0 ? "wood" : "bricks") << "\" /><position x=\""
+		       << x << "\" y=\"0\" z=\"" << z << "\" /><norm x=\"0\" y=\"1\" z=\"0\" />"
+		       << "<color r=\"1\" g=\"1\" b=\"1\" a=\"1\" /><size value=\"0.5\" /><depth value=\"0.2\" "
+		          "/></decal>";
+		graph << "<node id=\"" << index + 1 << "\"><position x=\"" << x << "\" y=\"0\" z=\"" << z
+		      << "\" /></node>";
+	}
+	graph << "</nodes><edges>";
+	for (int id = 1; id < count; ++id)
+	{
+		graph << "<edge><connections firstID=\"" << id << "\" secondID=\"" << id + 1
+		      << "\" /><distance value=\"0\" /></edge>";
+	}
+	lights << "</point-lights><spot-lights /></root>";
+	decals << "</decals></root>";
+	graph << "</edges></node-graph></root>";
+	WriteLevelFile("large", "rooms.xml", ourRoomsText);
+	WriteLevelFile("large", "entities.xml", ourEntitiesText);
+	WriteLevelFile("large", "lights.xml", lights.str());
+	WriteLevelFile("large", "decals.xml", decals.str());
+	WriteLevelFile("large", "nodegraph.xml", graph.str());
+
+	Facade().ParseLevel(u"large");
+	ASSERT_EQ(Facade().GetPointLights().Count(), count);
+	ASSERT_EQ(Facade().GetDecals().Count(), count);
+	ASSERT_EQ(Facade().GetNodes().Count(), count);
+	ASSERT_EQ(Facade().GetEdges().Count(), count - 1);
+	Facade().Update(16.0f);
+	Facade().Render();
+	EXPECT_EQ(Facade().GetLightGizmos().Count(), count);
+
+	Facade().SaveLights(u"large");
+	Facade().SaveDecals(u"large");
+	EXPECT_EQ(CountOf(ReadLevelFile("large", "lights.xml"), "<point-light>"), count);
+	EXPECT_EQ(CountOf(ReadLevelFile("large", "decals.xml"), "<decal>"), count);
+	const std::string saved = ReadLevelFile("large", "nodegraph.xml");
+	EXPECT_EQ(CountOf(saved, "<node id="), count);
+	EXPECT_EQ(CountOf(saved, "<edge>"), count - 1);
+	EXPECT_EQ(ErrorEntryCount(), 0) << LogText();
+	EXPECT_FALSE(Facade().IsBusy());
+}
+
+// A required value that a level lacks ends the editor with the cursor's report in the log.
+// The child runs in a fresh process (the GL driver's threads do not survive a fork); it
+// names its scratch directory in a file the parent chose, since each has its own.
+TEST_F(LevelLoadSaveTest, MissingRequiredAttributeEndsTheEditorWithTheCursorsMessage)
+{
+	GTEST_FLAG_SET(death_test_style, "threadsafe");
+	constexpr const char* variable = "LUMORA_LEVEL_DEATH_MARKER";
+	const bool parentFlag = std::getenv(variable) == nullptr;
+	const std::string marker = (ScratchPath() / "child-scratch.txt").string();
+	if (parentFlag)
+	{
+		setenv(variable, marker.c_str(), 1);
+	}
+	WriteSmallLevel("broken");
+	std::string lights = ourLightsText;
+	lights.replace(lights.find(" outer=\"0.5\""), 12, "");
+	WriteLevelFile("broken", "lights.xml", lights);
+
+	EXPECT_EXIT(
+	    {
+		    TestSupport::WriteWholeFile(std::getenv(variable), ScratchPath().string());
+		    Facade().ParseLevel(u"broken");
+	    },
+	    testing::KilledBySignal(SIGABRT), "");
+	unsetenv(variable);
+
+	const std::filesystem::path child = TestSupport::ReadWholeFile(marker);
+	ASSERT_FALSE(child.empty());
+	const std::string log = TestSupport::ReadWholeFile((child / "DebugLogger.txt").string());
+	std::error_code ignored;
+	std::filesystem::remove_all(child, ignored);
+	EXPECT_NE(log.find("\"Error Type:\"\"CRITICAL ERROR\"\n\"Line:\"278\n\"Function:\"\"XML::Error\"\n"
+	                   "\"Could not find name [outer] in [angles] in [spot-light] in "
+	                   "[data/XML/levels/broken/lights.xml]"),
+	          std::string::npos)
+	    << log;
+}
