@@ -1,7 +1,8 @@
 #!/usr/bin/env bash
 # The main job: sets up, builds and runs the lumora tool from the repository root.
-# With no arguments it reports the build and the GPU, then renders a frame through
-# the engine headless to out/demo-frame.png.
+# With no arguments it reports the build and the GPU, renders a frame of the demo scene
+# through the engine headless to out/demo-frame.png, and loads the larger sample level
+# through the editor facade and renders it to out/level-frame.png.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 
@@ -12,3 +13,4 @@ if [ $# -gt 0 ]; then
 fi
 ./build/tools/lumora/lumora
 ./build/tools/lumora/lumora --demo-frame out/demo-frame.png
+./build/tools/lumora/lumora --level-frame sample_large out/level-frame.png

@@ -4,6 +4,7 @@
 #include <cstring>
 
 #include "DemoFrame.h"
+#include "LevelFrame.h"
 #include "lumora.h"
 #include "platform/gpu/Device.h"
 
@@ -47,10 +48,26 @@ int main(int argc, char** argv)
 		std::printf("wrote %s (640x360)\n", argv[2]);
 		return 0;
 	}
+	if (argc > 1 && std::strcmp(argv[1], "--level-frame") == 0)
+	{
+		if (argc != 4)
+		{
+			std::fprintf(stderr, "usage: lumora --level-frame LEVEL OUT.png\n");
+			return 2;
+		}
+		if (!LumoraTool::RenderLevelFrame(argv[2], argv[3], 1280, 720))
+		{
+			return 1;
+		}
+		std::printf("wrote %s (1280x720)\n", argv[3]);
+		return 0;
+	}
 	if (argc > 1)
 	{
-		std::fprintf(stderr, "lumora: unknown argument '%s' (this build knows --version and --demo-frame)\n",
-		             argv[1]);
+		std::fprintf(
+		    stderr,
+		    "lumora: unknown argument '%s' (this build knows --version, --demo-frame and --level-frame)\n",
+		    argv[1]);
 		return 2;
 	}
 	std::printf("Lumora %s\n%s", Lumora::GetVersion(), Lumora::GetBuildInfo().c_str());
