@@ -26,6 +26,7 @@
 #include "model/ModelFactory.h"
 #include "model/ModelNode.h"
 #include "renderer/CubemapContainer.h"
+#include "renderer/Renderer.h"
 #include "xml/XML.h"
 
 namespace Lumora
@@ -84,7 +85,7 @@ void LumoraWrapper::ParseLevel(const std::u16string& aLevel)
 	ParseLights(base + "/lights.xml");
 	ParseNodes(base + "/nodegraph.xml");
 	ParseDecals(base + "/decals.xml");
-	// The ambient volume: Renderer::SetSH(base + "/ambient.sh") goes here once the ambient bake exists.
+	Zeph::Engine::GetInstance()->GetRenderer().SetSH(base + "/ambient.sh");
 
 	myCameraInstance->SetOrientation(Matrix44<float>());
 	myCameraInstance->SetPosition(Vector3<float>(0.0f, 10.0f, 0.0f));

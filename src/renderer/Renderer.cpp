@@ -1,8 +1,11 @@
 #include "renderer/Renderer.h"
 
+#include "renderer/AmbientVolumeFile.h"
+
 #include <algorithm>
 
 #include "engine/CameraInstance.h"
+#include "engine/Debug.h"
 #include "engine/Effect.h"
 #include "engine/EffectContainer.h"
 #include "engine/Engine.h"
@@ -348,6 +351,39 @@ void Renderer::UpdateScreenCamera(const CameraInstance& aCamera)
 	}
 }
 
+void Renderer::SetSH(const std::string& aPath)
+{
+	AmbientVolume volume;
+	std::string problem;
+	const AmbientVolumeRead result = ReadAmbientVolume(aPath, volume, problem);
+	if (result == AmbientVolumeRead::DAMAGED)
+	{
+		if (Debug* log = Debug::GetInstance())
+		{
+			log->ErrorMessage(__LINE__, "Zeph::Renderer::SetSH", "Damaged ambient light, not loaded: %s",
+			                  problem.c_str());
+		}
+		return;
+	}
+	myProbeHelper.reset();
+	myProbeHelper = std::make_unique<ProbeHelper>();
+	myProbeHelper->Init();
+	mySHLoadedFlag = false;
+	// The old volume's views are gone: nothing may stay bound to them.
+	PublishSHViews();
+	if (result == AmbientVolumeRead::CANNOT_OPEN)
+	{
+		// Unbaked level: no volume, so the ambient pass adds nothing.
+		SetVolumeBounds(Vector3<float>(0.0f, 0.0f, 0.0f), Vector3<float>(0.0f, 0.0f, 0.0f));
+		return;
+	}
+	SetVolumeBounds(volume.myWorldMin, volume.myWorldSize);
+	if (UploadSHToGPU(false, volume.myBlocks, volume.myCounts[0], volume.myCounts[1], volume.myCounts[2]))
+	{
+		mySHLoadedFlag = true;
+	}
+}
+
 bool Renderer::UploadSHToGPU(bool anUpdateFlag, const std::vector<uint32_t>* someBlocks, int anX, int aY,
                              int aZ)
 {
@@ -357,15 +393,22 @@ bool Renderer::UploadSHToGPU(bool anUpdateFlag, const std::vector<uint32_t>* som
 		myProbeHelper->Init();
 	}
 	const bool uploaded = myProbeHelper->Upload(anUpdateFlag, someBlocks, anX, aY, aZ);
-	Effect* effect = myFullScreenHelper.GetEffect();
-	if (effect != nullptr)
-	{
-		for (int block = 0; block < ProbeHelper::ourBlockCount; ++block)
-		{
-			effect->SetShaderResource(ourSHVariables[block], myProbeHelper->GetView(block));
-		}
-	}
+	PublishSHViews();
 	return uploaded;
+}
+
+void Renderer::PublishSHViews()
+{
+	Effect* effect = myFullScreenHelper.GetEffect();
+	if (effect == nullptr)
+	{
+		return;
+	}
+	for (int block = 0; block < ProbeHelper::ourBlockCount; ++block)
+	{
+		effect->SetShaderResource(ourSHVariables[block],
+		                          myProbeHelper ? myProbeHelper->GetView(block) : nullptr);
+	}
 }
 
 void Renderer::SetVolumeBounds(const Vector3<float>& aWorldMin, const Vector3<float>& aWorldSize)

@@ -104,6 +104,11 @@ public:
 
 	// The irradiance volume: update false creates the seven 3D textures from the
 	// blocks, true overwrites them; both bind them to the full-screen effect.
+	// Loads a level's baked ambient light (ambient.sh) and uploads it. A file that
+	// cannot be opened leaves no volume (the level has not been baked); a damaged file
+	// (counts that do not match its size, or outside 1..2048) is reported and the
+	// volume shown so far stays.
+	void SetSH(const std::string& aPath);
 	bool UploadSHToGPU(bool anUpdateFlag, const std::vector<uint32_t>* someBlocks, int anX, int aY, int aZ);
 	// "WorldMin" and "WorldSize" of the volume on the full-screen effect.
 	void SetVolumeBounds(const Vector3<float>& aWorldMin, const Vector3<float>& aWorldSize);
@@ -162,6 +167,9 @@ private:
 	void RenderLights(DeferredRenderTargetHelper& aGBuffer);
 	void RenderAmbient(DeferredRenderTargetHelper& aGBuffer, int aWidth, int aHeight);
 	void RenderPostChain();
+	// Binds the probe helper's seven volume views (null where there is none) to the
+	// full-screen effect's "cArTexture" .. "cCTexture".
+	void PublishSHViews();
 	void RenderLateItems();
 	void RenderDebugTextures();
 	void RegisterDebugTextures();

@@ -1,0 +1,174 @@
+// The baked ambient light's file, ambient.sh: written whole through a temporary and
+// read back unchanged; damaged files are refused with a reason; SetSH keeps the
+// volume shown so far when the file is damaged, drops it when the level has none,
+// and a loaded volume lights the frame.
+#include <filesystem>
+#include <fstream>
+#include <gtest/gtest.h>
+#include <string>
+#include <vector>
+
+#include "FrameFixture.h"
+#include "renderer/AmbientVolumeFile.h"
+#include "renderer/Renderer.h"
+#include "support/TestSupport.h"
+
+using namespace FrameTesting;
+
+namespace
+{
+// A 3 x 2 x 2 volume whose every texel differs, so a swapped block or cell shows.
+Zeph::AmbientVolume MakeVolume(int anX = 3, int aY = 2, int aZ = 2)
+{
+	Zeph::AmbientVolume volume;
+	volume.myWorldSize = Vector3<float>(6.0f, 4.0f, 4.5f);
+	volume.myWorldMin = Vector3<float>(-3.0f, 0.0f, -2.25f);
+	volume.myCounts[0] = anX;
+	volume.myCounts[1] = aY;
+	volume.myCounts[2] = aZ;
+	uint32_t next = 0x01020304u;
+	for (std::vector<uint32_t>& block : volume.myBlocks)
+	{
+		block.resize(static_cast<size_t>(anX * aY * aZ));
+		for (uint32_t& texel : block)
+		{
+			texel = next;
+			next = next * 2654435761u + 97u;
+		}
+	}
+	return volume;
+}
+
+// The uniform volume the bake would write for E / pi = aLevel everywhere.
+Zeph::AmbientVolume UniformVolume(float aLevel)
+{
+	Zeph::AmbientVolume volume = MakeVolume(2, 2, 2);
+	volume.myWorldMin = Vector3<float>(-2.0f, 0.0f, -2.0f);
+	volume.myWorldSize = Vector3<float>(4.0f, 3.0f, 4.0f);
+	const auto byte = [](float aValue) { return static_cast<uint32_t>((aValue + 1.0f) * 0.5f * 255.0f); };
+	const uint32_t zero = byte(0.0f) * 0x01010101u;
+	for (int block = 0; block < Zeph::AmbientVolume::ourBlockCount; ++block)
+	{
+		const uint32_t texel = block < 3 ? (zero & 0x00FFFFFFu) | (byte(aLevel) << 24) : zero;
+		volume.myBlocks[block].assign(volume.myBlocks[block].size(), texel);
+	}
+	return volume;
+}
+} // namespace
+
+TEST(AmbientVolumeFileTest, WrittenFileReadsBackUnchangedAndLeavesNoTemporary)
+{
+	TestSupport::ScratchDir scratch;
+	const std::string path = scratch.File("levels/a/ambient.sh");
+	const Zeph::AmbientVolume written = MakeVolume();
+	ASSERT_TRUE(Zeph::WriteAmbientVolume(path, written)) << "the missing directories are made";
+	EXPECT_EQ(std::filesystem::file_size(path), 36u + 28u * 12u);
+	EXPECT_EQ(std::distance(std::filesystem::directory_iterator(scratch.Path() / "levels/a"),
+	                        std::filesystem::directory_iterator()),
+	          1);
+
+	Zeph::AmbientVolume read;
+	std::string problem;
+	ASSERT_EQ(Zeph::ReadAmbientVolume(path, read, problem), Zeph::AmbientVolumeRead::OK) << problem;
+	EXPECT_EQ(read.myWorldSize.z, 4.5f);
+	EXPECT_EQ(read.myWorldMin.x, -3.0f);
+	EXPECT_EQ(read.myCounts[0], 3);
+	EXPECT_EQ(read.myCounts[2], 2);
+	for (int block = 0; block < Zeph::AmbientVolume::ourBlockCount; ++block)
+	{
+		EXPECT_EQ(read.myBlocks[block], written.myBlocks[block]) << "block " << block;
+	}
+	// The layout is the documented one: counts at 24, block 0 from byte 36, little-endian.
+	const std::string bytes = TestSupport::ReadWholeFile(path);
+	EXPECT_EQ(static_cast<uint8_t>(bytes[24]), 3);
+	EXPECT_EQ(static_cast<uint8_t>(bytes[36]), written.myBlocks[0][0] & 0xFF);
+	EXPECT_EQ(static_cast<uint8_t>(bytes[36 + 12 * 4]), written.myBlocks[1][0] & 0xFF);
+
+	Zeph::AmbientVolume incomplete = MakeVolume();
+	incomplete.myBlocks[6].pop_back();
+	EXPECT_FALSE(Zeph::WriteAmbientVolume(path, incomplete));
+	ASSERT_EQ(Zeph::ReadAmbientVolume(path, read, problem), Zeph::AmbientVolumeRead::OK)
+	    << "a refused write leaves the old file";
+}
+
+TEST(AmbientVolumeFileTest, DamagedFilesAreRefusedWithTheirReason)
+{
+	TestSupport::ScratchDir scratch;
+	const std::string good = scratch.File("good.sh");
+	ASSERT_TRUE(Zeph::WriteAmbientVolume(good, MakeVolume()));
+	const std::string bytes = TestSupport::ReadWholeFile(good);
+	const auto withCounts = [&](int anX, int aY, int aZ) {
+		std::string damaged = bytes;
+		const int counts[3] = {anX, aY, aZ};
+		damaged.replace(24, 12, reinterpret_cast<const char*>(counts), 12);
+		return damaged;
+	};
+	const struct
+	{
+		const char* myName;
+		std::string myBytes;
+		const char* myReason;
+	} cases[] = {
+	    {"short", bytes.substr(0, 20), "header"},
+	    {"cut", bytes.substr(0, bytes.size() - 1), "bytes"},
+	    {"longer", bytes + "x", "bytes"},
+	    {"zero", withCounts(3, 0, 2), "probe counts"},
+	    {"negative", withCounts(-3, -2, 2), "probe counts"},
+	    {"huge", withCounts(4096, 1, 1), "probe counts"},
+	    {"swapped", withCounts(2, 2, 2), "bytes"},
+	};
+	for (const auto& test : cases)
+	{
+		const std::string path = scratch.File(std::string(test.myName) + ".sh");
+		std::ofstream(path, std::ios::binary) << test.myBytes;
+		Zeph::AmbientVolume volume;
+		std::string problem;
+		EXPECT_EQ(Zeph::ReadAmbientVolume(path, volume, problem), Zeph::AmbientVolumeRead::DAMAGED)
+		    << test.myName;
+		EXPECT_NE(problem.find(test.myReason), std::string::npos) << test.myName << ": " << problem;
+		EXPECT_NE(problem.find(path), std::string::npos) << "the file is named";
+	}
+	Zeph::AmbientVolume volume;
+	std::string problem;
+	EXPECT_EQ(Zeph::ReadAmbientVolume(scratch.File("missing.sh"), volume, problem),
+	          Zeph::AmbientVolumeRead::CANNOT_OPEN);
+}
+
+TEST_F(FrameTest, SetShLightsTheFrameKeepsItOverADamagedFileAndDropsItForAnUnbakedLevel)
+{
+	if (!Start())
+	{
+		return;
+	}
+	TestSupport::ScratchDir scratch;
+	Place("data/models/room_small.dae", {0.0f, 0.0f, 0.0f});
+	Look({1.6f, 1.7f, -1.7f}, {-0.3f, 0.7f, 0.6f});
+	const Pixel floor = Project({0.5f, 0.0f, 0.5f});
+	Render("ambient-none");
+	const float dark = Luminance(myLit, floor);
+
+	const std::string baked = scratch.File("baked/ambient.sh");
+	ASSERT_TRUE(Zeph::WriteAmbientVolume(baked, UniformVolume(0.5f)));
+	Renderer().SetSH(baked);
+	EXPECT_TRUE(Renderer().IsSHLoaded());
+	Render("ambient-loaded");
+	const float lit = Luminance(myLit, floor);
+	EXPECT_GT(lit, 3.0f * dark) << "the volume lights the floor";
+
+	// A damaged file is reported and the volume stays.
+	const std::string damaged = scratch.File("damaged/ambient.sh");
+	std::filesystem::create_directories(scratch.Path() / "damaged");
+	std::ofstream(damaged, std::ios::binary) << TestSupport::ReadWholeFile(baked).substr(0, 50);
+	Renderer().SetSH(damaged);
+	const std::string log = TakeLog();
+	EXPECT_NE(log.find("Damaged ambient light, not loaded: " + damaged), std::string::npos) << log;
+	EXPECT_TRUE(Renderer().IsSHLoaded());
+	Render("ambient-kept");
+	EXPECT_NEAR(Luminance(myLit, floor), lit, 1e-4f);
+
+	// A level without the file has no ambient light.
+	Renderer().SetSH(scratch.File("unbaked/ambient.sh"));
+	EXPECT_FALSE(Renderer().IsSHLoaded());
+	Render("ambient-dropped");
+	EXPECT_NEAR(Luminance(myLit, floor), dark, 1e-4f);
+}
