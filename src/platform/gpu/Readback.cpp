@@ -6,6 +6,7 @@
 #include "platform/gpu/Context.h"
 #include "platform/gpu/Formats.h"
 #include "platform/gpu/Report.h"
+#include "platform/gpu/Texture.h"
 #include "platform/gpu/TextureView.h"
 #include "platform/paths/Paths.h"
 
@@ -56,6 +57,43 @@ bool ReadRenderTarget(Context& aContext, const RenderTargetView& aView, std::vec
 	}
 	someValues.resize(static_cast<size_t>(aView.GetWidth()) * static_cast<size_t>(aView.GetHeight()) * 4);
 	return ReadPixels(aContext, aView, GL_FLOAT, someValues.size() * sizeof(float), someValues.data());
+}
+
+bool ReadTexture(const Texture& aTexture, int aMip, int aFirstSlice, int aSliceCount,
+                 std::vector<float>& someValues)
+{
+	const char* function = "Gpu::ReadTexture";
+	if (!aTexture.IsInitialized())
+	{
+		ReportError(__LINE__, function, "The texture is not initialised");
+		return false;
+	}
+	const TextureDesc& desc = aTexture.GetDesc();
+	const FormatInfo info = GetFormatInfo(desc.myFormat);
+	if (info.myDepthFlag || info.myCompressedFlag)
+	{
+		ReportError(__LINE__, function, "Texture '%s': format %u does not read back as colours",
+		            desc.myLabel.c_str(), static_cast<unsigned>(desc.myFormat));
+		return false;
+	}
+	const int slices = aMip >= 0 && aTexture.GetTarget() == GL_TEXTURE_3D ? aTexture.GetMipDepth(aMip)
+	                                                                      : aTexture.GetSliceCount();
+	if (aMip < 0 || aMip >= aTexture.GetMipLevels() || aFirstSlice < 0 || aSliceCount < 1 ||
+	    aFirstSlice + aSliceCount > slices)
+	{
+		ReportError(__LINE__, function, "Texture '%s': no mip %d slices %d+%d (%d mips, %d slices)",
+		            desc.myLabel.c_str(), aMip, aFirstSlice, aSliceCount, aTexture.GetMipLevels(), slices);
+		return false;
+	}
+	const int width = aTexture.GetMipWidth(aMip);
+	const int height = aTexture.GetMipHeight(aMip);
+	someValues.resize(static_cast<size_t>(width) * static_cast<size_t>(height) *
+	                  static_cast<size_t>(aSliceCount) * 4);
+	glGetTextureSubImage(aTexture.GetName(), aMip, 0, 0, aFirstSlice, width, height, aSliceCount, GL_RGBA,
+	                     GL_FLOAT, static_cast<GLsizei>(someValues.size() * sizeof(float)),
+	                     someValues.data());
+	LUMORA_GL_CHECK(function);
+	return true;
 }
 
 bool SavePng(const std::string& aPath, int aWidth, int aHeight, const uint8_t* somePixels)

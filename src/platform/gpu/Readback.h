@@ -17,12 +17,18 @@ namespace Gpu
 {
 class Context;
 class RenderTargetView;
+class Texture;
 
 // RGBA8 bytes (B8G8R8A8 targets come back in R, G, B, A order too) of an 8-bit
 // colour target; false, reported, for other formats.
 bool ReadRenderTarget(Context& aContext, const RenderTargetView& aView, std::vector<uint8_t>& someBytes);
 // RGBA floats of any colour target; 8-bit targets come back as 0..1.
 bool ReadRenderTarget(Context& aContext, const RenderTargetView& aView, std::vector<float>& someValues);
+// RGBA floats of mip aMip of a colour texture, slices aFirstSlice to aFirstSlice + aSliceCount - 1
+// (array layers, cube faces +X..-Z, or depth slices of a 3D texture) one after another, each row 0
+// first; channels the format lacks read as 0 (alpha as 1). Reported and false for a missing range.
+bool ReadTexture(const Texture& aTexture, int aMip, int aFirstSlice, int aSliceCount,
+                 std::vector<float>& someValues);
 
 // Writes RGBA8 pixels (row 0 at the top) as a PNG, through a temporary file that
 // replaces aPath only when complete. Missing directories are created.
