@@ -18,6 +18,11 @@ public:
 	bool Init();
 	void Destroy();
 	void Apply(Effect& anEffect) const;
+	// A 1x1 white texture (for passes that want "no attenuation" where a mask goes).
+	Gpu::ShaderResourceView* GetWhite() const
+	{
+		return myWhite ? myWhite->GetDefaultShaderResourceView() : nullptr;
+	}
 
 private:
 	std::unique_ptr<Gpu::Texture> myWhite;

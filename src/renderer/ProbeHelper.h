@@ -37,6 +37,7 @@ public:
 	// returns false when a texture or view cannot be made.
 	bool Upload(bool anUpdateFlag, const std::vector<uint32_t>* someBlocks, int anX, int aY, int aZ);
 	Gpu::ShaderResourceView* GetView(int aBlock) const { return myViews[aBlock]; }
+	const Gpu::Texture* GetTexture(int aBlock) const { return myTextures[aBlock].get(); }
 	bool HasVolume() const { return myViews[0] != nullptr; }
 
 	DynamicCubemap* GetSHCubemap() const { return mySHCubemap.get(); }

@@ -131,6 +131,11 @@ bool Renderer::Init(int aWidth, int aHeight)
 		stage->Init(aWidth, aHeight, &myFullScreenHelper, &myComputeHelper);
 	}
 	myMaterialDefaults.Init();
+	// Until a shadow map is resolved (never, at quality 0) nothing blocks the sun.
+	if (Effect* fullScreen = myFullScreenHelper.GetEffect())
+	{
+		fullScreen->SetShaderResource("ShadowMap", myMaterialDefaults.GetWhite());
+	}
 	myDeferredHelper.Init(aWidth, aHeight);
 	myDecalHelper.Init(aWidth, aHeight, &myFullScreenHelper, &myDeferredHelper);
 	myShadowHelper.Init(myShadowMapSize, aWidth, aHeight);

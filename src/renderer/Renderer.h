@@ -16,6 +16,7 @@
 //   engine->RenderScene();                       // Render(back buffer, depth) + present
 //
 // Owned by the Engine; Init runs once the device exists and before the first frame.
+#include <atomic>
 #include <memory>
 #include <string>
 #include <vector>
@@ -60,6 +61,8 @@ namespace Zeph
 class CameraInstance;
 class Instance;
 class ProbeHelper;
+class Room;
+class DynamicCubemap;
 class Text;
 class Texture;
 
@@ -102,13 +105,13 @@ public:
 	void SetHDRandBloomVariables(float anAutoExposure, float aLumMin, float aLumMax, float aBloomThreshold,
 	                             float aBloomFactor, float anEmissiveMultiplier);
 
-	// The irradiance volume: update false creates the seven 3D textures from the
-	// blocks, true overwrites them; both bind them to the full-screen effect.
 	// Loads a level's baked ambient light (ambient.sh) and uploads it. A file that
 	// cannot be opened leaves no volume (the level has not been baked); a damaged file
 	// (counts that do not match its size, or outside 1..2048) is reported and the
 	// volume shown so far stays.
 	void SetSH(const std::string& aPath);
+	// The irradiance volume: update false creates the seven 3D textures from the
+	// blocks, true overwrites them; both bind them to the full-screen effect.
 	bool UploadSHToGPU(bool anUpdateFlag, const std::vector<uint32_t>* someBlocks, int anX, int aY, int aZ);
 	// "WorldMin" and "WorldSize" of the volume on the full-screen effect.
 	void SetVolumeBounds(const Vector3<float>& aWorldMin, const Vector3<float>& aWorldSize);
@@ -127,7 +130,24 @@ public:
 	int GetShadowMapSize() const { return myShadowMapSize; }
 	int GetWidth() const { return myWidth; }
 	int GetHeight() const { return myHeight; }
-	int GetBakingProgress() const { return myBakingProgress; }
+	// The bakes. Both render what the collector holds (queued by the caller, as the
+	// editor's bake commands do) from probe cubemaps through the frame's G-buffer,
+	// light and ambient passes, and run to their end on the calling thread; the
+	// progress (0..100) may be read from another thread meanwhile.
+	//
+	// GenerateSH: the SH irradiance volume over the rooms' bounds (a probe every 2
+	// units), aBounces times, each bounce lit by the previous one's volume; the last
+	// bounce is written to aPath (ambient.sh); aDebugFlag saves every probe cubemap.
+	void GenerateSH(const GrowingArray<Room*>& someRooms, const std::string& aPath, int aBounces,
+	                bool aDebugFlag);
+	// Projects the SH probe cubemap onto SH and stores the seven packed vectors of
+	// cell (anX, aY, aZ) of a volume of aCountX x aCountY x aCountZ cells.
+	void AddScalars(DynamicCubemap& aCube, std::vector<uint32_t>* someBlocks, int anX, int aY, int aZ,
+	                int aCountX, int aCountY, int aCountZ);
+	// GenerateReflections: a 256-texel cubemap at every room's centre, pre-filtered
+	// into its mips, saved to "data/Cubemaps/" + aLevel + "/" + room id + ".dds".
+	void GenerateReflections(const GrowingArray<Room*>& someRooms, const std::string& aLevel);
+	int GetBakingProgress() const { return myBakingProgress.load(); }
 	bool IsSHLoaded() const { return mySHLoadedFlag; }
 	ProbeHelper* GetProbeHelper() const { return myProbeHelper.get(); }
 	FullScreenHelper& GetFullScreenHelper() { return myFullScreenHelper; }
@@ -151,6 +171,20 @@ public:
 	const std::vector<PassTime>& GetPassTimes() const { return myPassTimes; }
 
 private:
+	// One face of a probe cubemap, as both bakes capture it: the face and the cube's
+	// depth cleared, the face camera moved to aPosition, the collector's shadow-casting
+	// static batches drawn into aGBuffer (cleared first when aClearGBufferFlag), the
+	// point and spot light passes and the ambient pass (without the sun's shadow) into
+	// the face. Shadows, decals, skinned and unshadowed geometry, SSAO and
+	// post-processing are left out.
+	void RenderProbeFace(DynamicCubemap& aCube, int aFace, const Vector3<float>& aPosition,
+	                     DeferredRenderTargetHelper& aGBuffer, bool aClearGBufferFlag);
+	// The reflection cubemap's mips 1..8 filtered from mip 0 through the cross of each
+	// face and its neighbours (the ProbeHelper's filter target).
+	void PrefilterReflection(DynamicCubemap& aCube);
+	// The SH bake's debug capture: the probe cubemap's faces written as a DDS.
+	void SaveProbeCapture(DynamicCubemap& aCube, const std::string& aPath);
+
 	struct DebugTexture
 	{
 		std::string myName;
@@ -181,7 +215,9 @@ private:
 	int myShadowMapSize = 4096;
 	int myWidth = 0;
 	int myHeight = 0;
-	int myBakingProgress = 0;
+	std::atomic<int> myBakingProgress{0};
+	// Cells visited by the current bake, over every bounce.
+	long long myBakingProgressCounter = 0;
 	bool mySHLoadedFlag = false;
 	std::unique_ptr<ProbeHelper> myProbeHelper;
 	std::unique_ptr<Texture> myHDRTargets[2];
