@@ -14,7 +14,9 @@
 #include "engine/Room.h"
 #include "platform/dds/DdsFile.h"
 #include "platform/dds/Image.h"
+#include "platform/gpu/Context.h"
 #include "platform/gpu/Readback.h"
+#include "platform/gpu/Texture.h"
 #include "platform/sh/ShProjection.h"
 #include "renderer/AmbientVolumeFile.h"
 #include "renderer/DynamicCubemap.h"
@@ -51,6 +53,91 @@ const ShConstants& Constants()
 	}();
 	return constants;
 }
+
+// The seven packed vectors of one cell from its red, green and blue coefficients.
+void StoreScalars(const float* aRed, const float* aGreen, const float* aBlue,
+                  std::vector<uint32_t>* someBlocks, size_t aCell)
+{
+	const ShConstants& c = Constants();
+	const float* channels[3] = {aRed, aGreen, aBlue};
+	for (int channel = 0; channel < 3; ++channel)
+	{
+		const float* s = channels[channel];
+		someBlocks[channel][aCell] =
+		    PackSHVector(-c.myC1 * s[3], -c.myC1 * s[1], c.myC1 * s[2], c.myC0 * s[0] - c.myC3 * s[6]);
+		someBlocks[3 + channel][aCell] =
+		    PackSHVector(c.myC2 * s[4], -c.myC2 * s[5], 3.0f * c.myC3 * s[6], -c.myC2 * s[7]);
+	}
+	someBlocks[6][aCell] = PackSHVector(c.myC4 * aRed[8], c.myC4 * aGreen[8], c.myC4 * aBlue[8], 1.0f);
+}
+
+// Probes rendered one after another are gathered in an atlas (each face copied into
+// its tile) and read back together: on a software rasterizer every read-back waits
+// for the whole pipeline, so one per batch instead of one per probe.
+class ProbeAtlas
+{
+public:
+	static constexpr int ourCubesPerBatch = 64;
+	static constexpr int ourTilesPerRow = 48;
+
+	bool Init(Gpu::Context& aContext, int aFaceSize)
+	{
+		myFaceSize = aFaceSize;
+		Gpu::TextureDesc desc;
+		desc.myWidth = ourTilesPerRow * aFaceSize;
+		desc.myHeight = (ourCubesPerBatch * 6 + ourTilesPerRow - 1) / ourTilesPerRow * aFaceSize;
+		desc.myFormat = Dds::Format::R16G16B16A16_FLOAT;
+		desc.myLabel = "SH probe atlas";
+		return myTexture.Init(aContext, desc);
+	}
+	bool IsFull() const { return static_cast<int>(myCells.size()) == ourCubesPerBatch; }
+	bool IsEmpty() const { return myCells.empty(); }
+
+	// Copies mip 0 of the cube's six faces into the next cube's tiles.
+	bool Add(Gpu::Context& aContext, const Gpu::Texture& aCube, size_t aCell)
+	{
+		const int first = static_cast<int>(myCells.size()) * 6;
+		for (int face = 0; face < 6; ++face)
+		{
+			const int tile = first + face;
+			if (!aContext.CopySubresourceRegion(myTexture, 0, 0, (tile % ourTilesPerRow) * myFaceSize,
+			                                    (tile / ourTilesPerRow) * myFaceSize, 0, aCube, 0, face))
+			{
+				return false;
+			}
+		}
+		myCells.push_back(aCell);
+		return true;
+	}
+
+	// One read-back and projection for every cube gathered; their cells' vectors stored.
+	bool Flush(Gpu::Context& aContext, std::vector<uint32_t>* someBlocks)
+	{
+		if (myCells.empty())
+		{
+			return true;
+		}
+		std::vector<float> coefficients(myCells.size() * Sh::ourCubeCoefficientCount);
+		const bool projected = Sh::ProjectCubeAtlas(aContext, myTexture, myFaceSize,
+		                                            static_cast<int>(myCells.size()), coefficients.data());
+		if (projected)
+		{
+			for (size_t index = 0; index < myCells.size(); ++index)
+			{
+				const float* rgb = &coefficients[index * Sh::ourCubeCoefficientCount];
+				StoreScalars(rgb, rgb + Sh::ourCoefficientCount, rgb + 2 * Sh::ourCoefficientCount,
+				             someBlocks, myCells[index]);
+			}
+		}
+		myCells.clear();
+		return projected;
+	}
+
+private:
+	Gpu::Texture myTexture;
+	int myFaceSize = 0;
+	std::vector<size_t> myCells;
+};
 
 bool StrictlyInsideAnyRoom(const GrowingArray<Room*>& someRooms, const Vector3<float>& aPoint)
 {
@@ -134,6 +221,7 @@ void Renderer::GenerateSH(const GrowingArray<Room*>& someRooms, const std::strin
 	                       static_cast<int>(std::ceil(worldSize.z / ourProbeSpacing))};
 	myBakingProgressCounter = 0;
 	myBakingProgress = 0;
+	myBakedProbeCount = 0;
 	// Without rooms (or with rooms of no extent) there is no grid: nothing is baked and
 	// no file is written; the volume stays empty.
 	if (counts[0] <= 0 || counts[1] <= 0 || counts[2] <= 0 || counts[0] > AmbientVolume::ourMaxCount ||
@@ -154,6 +242,14 @@ void Renderer::GenerateSH(const GrowingArray<Room*>& someRooms, const std::strin
 	UploadSHToGPU(false, blocks, counts[0], counts[1], counts[2]);
 
 	Gpu::Context& context = engine->GetContext();
+	ProbeAtlas atlas;
+	const bool batchedFlag = myProbeBatchingFlag && atlas.Init(context, cube->GetSize());
+	const auto flush = [&] {
+		if (!atlas.Flush(context, blocks))
+		{
+			ReportCritical(1154, "Zeph::Renderer::AddScalars", "FAILED TO REFRESH CUBEMAP");
+		}
+	};
 	const double total = static_cast<double>(cells) * std::max(aBounces, 1);
 	for (int bounce = 0; bounce < aBounces; ++bounce)
 	{
@@ -180,7 +276,20 @@ void Renderer::GenerateSH(const GrowingArray<Room*>& someRooms, const std::strin
 							SaveProbeCapture(*cube, "data/cubemaps/sh debug/" + std::to_string(cell) +
 							                            "bounce" + std::to_string(bounce) + ".dds");
 						}
-						AddScalars(*cube, blocks, ix, iy, iz, counts[0], counts[1], counts[2]);
+						// Batched where the atlas could be made, else one read-back per probe.
+						if (batchedFlag && cube->GetTexture() != nullptr &&
+						    atlas.Add(context, *cube->GetTexture(), cell))
+						{
+							if (atlas.IsFull())
+							{
+								flush();
+							}
+						}
+						else
+						{
+							AddScalars(*cube, blocks, ix, iy, iz, counts[0], counts[1], counts[2]);
+						}
+						++myBakedProbeCount;
 					}
 					else
 					{
@@ -195,6 +304,7 @@ void Renderer::GenerateSH(const GrowingArray<Room*>& someRooms, const std::strin
 				}
 			}
 		}
+		flush();
 		// Only now does the next bounce see this one: within a bounce every probe is lit
 		// by the previous bounce's volume.
 		UploadSHToGPU(true, blocks, counts[0], counts[1], counts[2]);
@@ -231,17 +341,6 @@ void Renderer::AddScalars(DynamicCubemap& aCube, std::vector<uint32_t>* someBloc
 		ReportCritical(1154, "Zeph::Renderer::AddScalars", "FAILED TO REFRESH CUBEMAP");
 		return;
 	}
-	const ShConstants& c = Constants();
-	const size_t cell = static_cast<size_t>((aZ * aCountY + aY) * aCountX + anX);
-	const float* channels[3] = {red, green, blue};
-	for (int channel = 0; channel < 3; ++channel)
-	{
-		const float* s = channels[channel];
-		someBlocks[channel][cell] =
-		    PackSHVector(-c.myC1 * s[3], -c.myC1 * s[1], c.myC1 * s[2], c.myC0 * s[0] - c.myC3 * s[6]);
-		someBlocks[3 + channel][cell] =
-		    PackSHVector(c.myC2 * s[4], -c.myC2 * s[5], 3.0f * c.myC3 * s[6], -c.myC2 * s[7]);
-	}
-	someBlocks[6][cell] = PackSHVector(c.myC4 * red[8], c.myC4 * green[8], c.myC4 * blue[8], 1.0f);
+	StoreScalars(red, green, blue, someBlocks, static_cast<size_t>((aZ * aCountY + aY) * aCountX + anX));
 }
 } // namespace Zeph

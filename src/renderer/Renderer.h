@@ -87,6 +87,9 @@ public:
 	void RenderLateInstance(Instance* anInstance);
 	void RenderLateText(Text* aText);
 	int GetLateCount() const { return myLateItems.Count(); }
+	// Forgets the queued late items without drawing them (after a bake, whose queued
+	// scene never becomes a frame and whose overlay objects may go before the next one).
+	void DiscardLateItems() { myLateItems.RemoveAll(); }
 	int GetLateCapacity() const { return myLateItems.GetCapacity(); }
 
 	// Adds aDelta to the accumulated time and writes the total to "Time" (the model
@@ -148,6 +151,11 @@ public:
 	// into its mips, saved to "data/Cubemaps/" + aLevel + "/" + room id + ".dds".
 	void GenerateReflections(const GrowingArray<Room*>& someRooms, const std::string& aLevel);
 	int GetBakingProgress() const { return myBakingProgress.load(); }
+	// The ambient bake reads its probes back in batches (true, the default) or one by
+	// one; the volume is the same either way.
+	void SetProbeBatchingFlag(bool aFlag) { myProbeBatchingFlag = aFlag; }
+	// Probe cubemaps the last ambient bake rendered and projected, over all bounces.
+	long long GetBakedProbeCount() const { return myBakedProbeCount; }
 	bool IsSHLoaded() const { return mySHLoadedFlag; }
 	ProbeHelper* GetProbeHelper() const { return myProbeHelper.get(); }
 	FullScreenHelper& GetFullScreenHelper() { return myFullScreenHelper; }
@@ -218,6 +226,8 @@ private:
 	std::atomic<int> myBakingProgress{0};
 	// Cells visited by the current bake, over every bounce.
 	long long myBakingProgressCounter = 0;
+	long long myBakedProbeCount = 0;
+	bool myProbeBatchingFlag = true;
 	bool mySHLoadedFlag = false;
 	std::unique_ptr<ProbeHelper> myProbeHelper;
 	std::unique_ptr<Texture> myHDRTargets[2];

@@ -135,6 +135,13 @@ TEST_F(AmbientBakeTest, RoomLitFromPlusXBrightensSurfacesFacingPlusXAndLoadsBack
 		EXPECT_GT(facingPlusX, 2.0f * std::max(facingMinusX, 0.0f) + 0.02f) << "cell " << cell;
 	}
 
+	// Reading the probes back one by one instead of in batches gives the same file.
+	Renderer().SetProbeBatchingFlag(false);
+	const std::string single = myScratch.File("single/ambient.sh");
+	Bake(single, 1);
+	Renderer().SetProbeBatchingFlag(true);
+	EXPECT_EQ(TestSupport::ReadWholeFile(single), TestSupport::ReadWholeFile(path));
+
 	// The file loaded back gives the GPU exactly the bytes it holds.
 	Renderer().SetSH(path);
 	ASSERT_TRUE(Renderer().IsSHLoaded());
