@@ -1,8 +1,9 @@
 // Full-screen passes of the deferred frame: copies and debug views, the shadow
 // resolve, the ambient and image-based light, screen-space ambient occlusion,
-// eye-adapted tone mapping, bloom, colour grading, the selection outline, motion blur
-// and FXAA. Each technique is one pass drawing the quad below with blending (unless
-// it says otherwise), depth and culling off; its main input is SourceTexture.
+// eye-adapted tone mapping, bloom, colour grading, the selection outline, motion blur,
+// FXAA and the reflection cubemaps' filter. Each technique is one pass drawing the quad
+// below with blending (unless it says otherwise), depth and culling off; its main input
+// is SourceTexture.
 
 #include "../Common/Transforms.fxh"
 #include "../Common/Lighting.fxh"
@@ -336,3 +337,4 @@ vertex VS_Quad
 #include "Exposure.fxh"
 #include "Outline.fxh"
 #include "Fxaa.fxh"
+#include "CubemapFilter.fxh"

@@ -1,0 +1,537 @@
+// The reflection bake on a headless engine: the files it writes (read back through the DDS
+// reader), where light lands on the cube's faces, the filtered mips measured against the
+// cosine-power lobes integrated on the CPU from mip 0, the progress after each room, and the
+// cube container loading a baked file. The bake writes "data/Cubemaps/<level>/", so each test
+// runs in a scratch directory whose data/ links the repository's folders, except Cubemaps,
+// which holds copies of the two cube maps the renderer reads. Pictures of the baked cubes go
+// to /tmp/lumora-bake-tests/.
+#include <algorithm>
+#include <array>
+#include <cmath>
+#include <cstring>
+#include <filesystem>
+#include <gtest/gtest.h>
+#include <limits>
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "FrameFixture.h"
+#include "core/CoreReport.h"
+#include "core/GrowingArray.h"
+#include "engine/Room.h"
+#include "platform/dds/DdsFile.h"
+#include "renderer/BakeProgress.h"
+#include "renderer/CubemapContainer.h"
+#include "renderer/DynamicCubemap.h"
+
+using namespace FrameTesting;
+
+namespace
+{
+namespace fs = std::filesystem;
+
+constexpr int ourFaceSize = 256;
+constexpr int ourMipCount = 9;
+
+float HalfToFloat(uint16_t aHalf)
+{
+	const int exponent = (aHalf >> 10) & 31;
+	const int mantissa = aHalf & 1023;
+	float value = 0.0f;
+	if (exponent == 0)
+	{
+		value = std::ldexp(static_cast<float>(mantissa), -24);
+	}
+	else if (exponent == 31)
+	{
+		value =
+		    mantissa == 0 ? std::numeric_limits<float>::infinity() : std::numeric_limits<float>::quiet_NaN();
+	}
+	else
+	{
+		value = std::ldexp(static_cast<float>(mantissa + 1024), exponent - 25);
+	}
+	return (aHalf & 0x8000) != 0 ? -value : value;
+}
+
+using Rgb = std::array<double, 3>;
+
+// A baked cube file: RGBA halves, faces +X, -X, +Y, -Y, +Z, -Z, each with its mips.
+struct CubeFile
+{
+	Dds::Image myImage;
+
+	int Size(int aMip) const { return std::max(1, ourFaceSize >> aMip); }
+	Rgb Texel(int aFace, int aMip, int anX, int aY) const
+	{
+		const uint8_t* data = myImage.Data(static_cast<uint32_t>(aMip), static_cast<uint32_t>(aFace));
+		uint16_t halves[4];
+		std::memcpy(halves, data + (static_cast<size_t>(aY) * Size(aMip) + anX) * 8, sizeof(halves));
+		return {HalfToFloat(halves[0]), HalfToFloat(halves[1]), HalfToFloat(halves[2])};
+	}
+	// Mean of the texels (aLeft..aRight, aTop..aBottom) of a face at mip 0, per channel.
+	Rgb Mean(int aFace, int aLeft, int aTop, int aRight, int aBottom) const
+	{
+		Rgb sum{};
+		for (int y = aTop; y <= aBottom; ++y)
+		{
+			for (int x = aLeft; x <= aRight; ++x)
+			{
+				const Rgb texel = Texel(aFace, 0, x, y);
+				for (int channel = 0; channel < 3; ++channel)
+				{
+					sum[channel] += texel[channel];
+				}
+			}
+		}
+		for (double& channel : sum)
+		{
+			channel /= static_cast<double>((aBottom - aTop + 1) * (aRight - aLeft + 1));
+		}
+		return sum;
+	}
+};
+
+// The direction through (a, b) of a face, a to the right and b down, both -1..1, in Direct3D's
+// cube layout (the face's own axis component is +-1).
+std::array<double, 3> FacePoint(int aFace, double anA, double aB)
+{
+	switch (aFace)
+	{
+	case 0:
+		return {1.0, -aB, -anA};
+	case 1:
+		return {-1.0, -aB, anA};
+	case 2:
+		return {anA, 1.0, aB};
+	case 3:
+		return {anA, -1.0, -aB};
+	case 4:
+		return {anA, -aB, 1.0};
+	default:
+		return {-anA, -aB, -1.0};
+	}
+}
+
+// Mip 0 reduced to a coarser cube for the reference integrals: per texel its unit direction,
+// its solid angle and its mean colour.
+struct Radiance
+{
+	std::vector<std::array<double, 3>> myDirections;
+	std::vector<double> mySolidAngles;
+	std::vector<Rgb> myColors;
+
+	Radiance(const CubeFile& aCube, int aSize)
+	{
+		const int block = ourFaceSize / aSize;
+		for (int face = 0; face < Zeph::DynamicCubemap::ourFaceCount; ++face)
+		{
+			for (int y = 0; y < aSize; ++y)
+			{
+				for (int x = 0; x < aSize; ++x)
+				{
+					const std::array<double, 3> point =
+					    FacePoint(face, (2.0 * x + 1.0) / aSize - 1.0, (2.0 * y + 1.0) / aSize - 1.0);
+					const double length =
+					    std::sqrt(point[0] * point[0] + point[1] * point[1] + point[2] * point[2]);
+					myDirections.push_back({point[0] / length, point[1] / length, point[2] / length});
+					mySolidAngles.push_back(4.0 / (aSize * aSize) / (length * length * length));
+					Rgb color{};
+					for (int row = 0; row < block; ++row)
+					{
+						for (int column = 0; column < block; ++column)
+						{
+							const Rgb texel = aCube.Texel(face, 0, x * block + column, y * block + row);
+							for (int channel = 0; channel < 3; ++channel)
+							{
+								color[channel] += texel[channel] / (block * block);
+							}
+						}
+					}
+					myColors.push_back(color);
+				}
+			}
+		}
+	}
+
+	// The radiance averaged over the sphere with the weight max(0, cos)^aPower around aNormal.
+	Rgb Lobe(const std::array<double, 3>& aNormal, double aPower) const
+	{
+		Rgb sum{};
+		double total = 0.0;
+		for (size_t texel = 0; texel < myDirections.size(); ++texel)
+		{
+			const std::array<double, 3>& direction = myDirections[texel];
+			const double cosine =
+			    aNormal[0] * direction[0] + aNormal[1] * direction[1] + aNormal[2] * direction[2];
+			if (cosine <= 0.0)
+			{
+				continue;
+			}
+			const double weight = std::pow(cosine, aPower) * mySolidAngles[texel];
+			for (int channel = 0; channel < 3; ++channel)
+			{
+				sum[channel] += myColors[texel][channel] * weight;
+			}
+			total += weight;
+		}
+		for (double& channel : sum)
+		{
+			channel /= total;
+		}
+		return sum;
+	}
+};
+
+// Progress read by the report hook each time a cube file cannot be saved (which happens in
+// the bake after the rooms before it are done and before its own progress is stored).
+std::vector<int> ourProgressAtFailedSaves;
+std::vector<std::string> ourFailedSaveMessages;
+CoreReport::Handler ourLogHandler = nullptr;
+
+void RecordFailedSave(int aLine, const char* aFunctionName, const char* aMessage)
+{
+	if (std::string(aFunctionName) == "Gpu::SaveTextureToDds")
+	{
+		ourProgressAtFailedSaves.push_back(Zeph::Engine::GetInstance()->GetRenderer().GetBakingProgress());
+		ourFailedSaveMessages.push_back(aMessage);
+		return;
+	}
+	if (ourLogHandler != nullptr)
+	{
+		ourLogHandler(aLine, aFunctionName, aMessage);
+	}
+}
+
+class ReflectionBakeTest : public FrameTest
+{
+protected:
+	void SetUp() override
+	{
+		FrameTest::SetUp();
+		const fs::path source = fs::path(LUMORA_TEST_SOURCE_ROOT) / "data";
+		const fs::path data = myWorkDirectory.Path() / "data";
+		fs::create_directories(data / "Cubemaps");
+		for (const fs::directory_entry& entry : fs::directory_iterator(source))
+		{
+			if (entry.path().filename() != "Cubemaps")
+			{
+				fs::create_directory_symlink(entry.path(), data / entry.path().filename());
+			}
+		}
+		for (const char* file : {"cubemap.dds", "normaltest.dds"})
+		{
+			fs::copy_file(source / "Cubemaps" / file, data / "Cubemaps" / file);
+		}
+		myPreviousDirectory = fs::current_path();
+		fs::current_path(myWorkDirectory.Path());
+	}
+
+	void TearDown() override
+	{
+		FrameTest::TearDown();
+		fs::current_path(myPreviousDirectory);
+	}
+
+	// A room box of room_small's size (4 x 3 x 4, floor at y 0) around aCentre's foot.
+	Zeph::Room* AddRoom(const std::string& anID, const Vector3<float>& aFoot)
+	{
+		myRoomOwners.push_back(std::make_unique<Zeph::Room>(aFoot + Vector3<float>(-2.0f, 0.0f, -2.0f),
+		                                                    aFoot + Vector3<float>(2.0f, 3.0f, 2.0f)));
+		myRoomOwners.back()->SetID(anID);
+		myRooms.Add(myRoomOwners.back().get());
+		return myRoomOwners.back().get();
+	}
+
+	// Queues the scene as the editor does before a bake, and bakes.
+	void Bake(const std::string& aLevel)
+	{
+		Queue();
+		Renderer().GenerateReflections(myRooms, aLevel);
+	}
+
+	static std::string CubePath(const std::string& aLevel, const std::string& anID)
+	{
+		return "data/Cubemaps/" + aLevel + "/" + anID + ".dds";
+	}
+
+	static bool Load(const std::string& aPath, CubeFile& aCubeOut)
+	{
+		std::string error;
+		const bool loaded = Dds::LoadFromFile(aPath, aCubeOut.myImage, error);
+		EXPECT_TRUE(loaded) << error;
+		return loaded;
+	}
+
+	// Every mip of the six faces, side by side, each scaled (nearest) to aTile pixels and
+	// tone-mapped x / (1 + x), one row of faces per mip from mip 0 to aLastMip.
+	static void SavePicture(const CubeFile& aCube, const std::string& aName, int aTile = 128,
+	                        int aLastMip = ourMipCount - 1)
+	{
+		const int tile = aTile;
+		const int width = tile * Zeph::DynamicCubemap::ourFaceCount;
+		std::vector<uint8_t> pixels(static_cast<size_t>(width) * tile * (aLastMip + 1) * 4, 255);
+		for (int mip = 0; mip <= aLastMip; ++mip)
+		{
+			const int size = aCube.Size(mip);
+			for (int face = 0; face < Zeph::DynamicCubemap::ourFaceCount; ++face)
+			{
+				for (int y = 0; y < tile; ++y)
+				{
+					for (int x = 0; x < tile; ++x)
+					{
+						const Rgb texel = aCube.Texel(face, mip, x * size / tile, y * size / tile);
+						uint8_t* pixel =
+						    &pixels[(static_cast<size_t>(mip * tile + y) * width + face * tile + x) * 4];
+						for (int channel = 0; channel < 3; ++channel)
+						{
+							const double mapped =
+							    std::pow(texel[channel] / (1.0 + texel[channel]), 1.0 / 2.2);
+							pixel[channel] = static_cast<uint8_t>(std::clamp(mapped, 0.0, 1.0) * 255.0 + 0.5);
+						}
+					}
+				}
+			}
+		}
+		Gpu::SavePng("/tmp/lumora-bake-tests/" + aName + ".png", width, tile * (aLastMip + 1), pixels.data());
+	}
+
+	// room_small at the origin lit by four lights, none in the middle of anything, so that no
+	// face looks the same turned or mirrored: a red one before the +X wall (above and to the right
+	// of the middle of face 0), a blue one under the ceiling towards +X and -Z, and two green ones,
+	// one low over the floor and one low in the -X, +Z corner. Each lights only its own part of
+	// the room.
+	void LightTheSmallRoom()
+	{
+		Place("data/models/room_small.dae", {0.0f, 0.0f, 0.0f});
+		const struct
+		{
+			Vector3<float> myPosition;
+			float myFalloff;
+			Vector4<float> myColor;
+		} lights[] = {{{1.6f, 1.8f, -0.5f}, 1.0f, {8.0f, 0.0f, 0.0f, 1.0f}},
+		              {{1.0f, 2.7f, -1.0f}, 1.2f, {0.0f, 0.0f, 6.0f, 1.0f}},
+		              {{0.6f, 0.3f, 0.4f}, 3.0f, {0.0f, 8.0f, 0.0f, 1.0f}},
+		              {{-1.5f, 0.5f, 1.3f}, 1.0f, {0.0f, 6.0f, 0.0f, 1.0f}}};
+		for (const auto& light : lights)
+		{
+			Zeph::PointLightData data;
+			data.myPosition = light.myPosition;
+			data.myFalloff = light.myFalloff;
+			data.myColor = light.myColor;
+			myPointLights.push_back(data);
+		}
+		AddRoom("small", {0.0f, 0.0f, 0.0f});
+	}
+
+	TestSupport::ScratchDir myWorkDirectory;
+	fs::path myPreviousDirectory;
+	std::vector<std::unique_ptr<Zeph::Room>> myRoomOwners;
+	GrowingArray<Zeph::Room*> myRooms{4, 4};
+};
+} // namespace
+
+TEST(BakeProgressTest, IsTheTruncatedPercentageOfDoneSteps)
+{
+	EXPECT_EQ(Zeph::BakeProgress(1, 3), 33);
+	EXPECT_EQ(Zeph::BakeProgress(2, 3), 66);
+	EXPECT_EQ(Zeph::BakeProgress(3, 3), 100);
+	EXPECT_EQ(Zeph::BakeProgress(1, 7), 14);
+	EXPECT_EQ(Zeph::BakeProgress(8, 7), 100) << "never above 100";
+	EXPECT_EQ(Zeph::BakeProgress(0, 0), 0) << "nothing to do";
+}
+
+TEST_F(ReflectionBakeTest, NoRoomsWritesNothingAndResetsTheProgress)
+{
+	if (!Start())
+	{
+		return;
+	}
+	Place("data/models/room_small.dae", {0.0f, 0.0f, 0.0f});
+	AddRoom("small", {0.0f, 0.0f, 0.0f});
+	Bake("first");
+	ASSERT_EQ(Renderer().GetBakingProgress(), 100);
+
+	myRooms.RemoveAll();
+	Bake("empty");
+	EXPECT_EQ(Renderer().GetBakingProgress(), 0);
+	EXPECT_FALSE(fs::exists("data/Cubemaps/empty"));
+	std::vector<std::string> written;
+	for (const fs::directory_entry& entry : fs::recursive_directory_iterator("data/Cubemaps"))
+	{
+		written.push_back(entry.path().string());
+	}
+	std::sort(written.begin(), written.end());
+	EXPECT_EQ(written,
+	          (std::vector<std::string>{"data/Cubemaps/cubemap.dds", "data/Cubemaps/first",
+	                                    "data/Cubemaps/first/small.dds", "data/Cubemaps/normaltest.dds"}));
+	EXPECT_EQ(Renderer().GetRTC().GetPointLights().Count(), 0) << "the bake empties the collector";
+}
+
+TEST_F(ReflectionBakeTest, ProgressIsStoredAfterEachRoomAndEveryRoomGetsItsFile)
+{
+	if (!Start())
+	{
+		return;
+	}
+	Place("data/models/room_small.dae", {0.0f, 0.0f, 0.0f});
+	AddRoom("west", {-4.0f, 0.0f, 0.0f});
+	AddRoom("middle", {0.0f, 0.0f, 0.0f});
+	AddRoom("east", {4.0f, 0.0f, 0.0f});
+
+	// Folders where the files of the second and third rooms should go: their saves fail, each
+	// failure is reported, and the report shows the progress the rooms before it left.
+	fs::create_directories(CubePath("three", "middle"));
+	fs::create_directories(CubePath("three", "east"));
+	ourProgressAtFailedSaves.clear();
+	ourFailedSaveMessages.clear();
+	ourLogHandler = CoreReport::GetCriticalHandler();
+	CoreReport::SetCriticalHandler(&RecordFailedSave);
+	Bake("three");
+	CoreReport::SetCriticalHandler(ourLogHandler);
+	EXPECT_EQ(ourProgressAtFailedSaves, (std::vector<int>{33, 66}));
+	EXPECT_EQ(Renderer().GetBakingProgress(), 100);
+	ASSERT_EQ(ourFailedSaveMessages.size(), 2u);
+	EXPECT_NE(ourFailedSaveMessages[0].find(CubePath("three", "middle")), std::string::npos)
+	    << ourFailedSaveMessages[0];
+	EXPECT_NE(ourFailedSaveMessages[1].find(CubePath("three", "east")), std::string::npos)
+	    << ourFailedSaveMessages[1];
+	CubeFile west;
+	EXPECT_TRUE(Load(CubePath("three", "west"), west));
+}
+
+TEST_F(ReflectionBakeTest, LightLandsOnTheFacesItShouldAndTheMipsFollowTheLobes)
+{
+	if (!Start())
+	{
+		return;
+	}
+	LightTheSmallRoom();
+	Bake("lit");
+	CubeFile cube;
+	ASSERT_TRUE(Load(CubePath("lit", "small"), cube));
+	SavePicture(cube, "lit-small");
+	SavePicture(cube, "lit-small-mip0", ourFaceSize, 0);
+
+	const Dds::ImageInfo& info = cube.myImage.Info();
+	EXPECT_TRUE(info.IsCube());
+	EXPECT_EQ(info.myArraySize, 6u);
+	EXPECT_EQ(info.myMipLevels, static_cast<uint32_t>(ourMipCount));
+	EXPECT_EQ(info.myWidth, static_cast<uint32_t>(ourFaceSize));
+	EXPECT_EQ(info.myHeight, static_cast<uint32_t>(ourFaceSize));
+	EXPECT_EQ(info.myFormat, Dds::Format::R16G16B16A16_FLOAT);
+
+	// The room's walls are grey and the light the ambient pass adds is grey too, so each light
+	// shows as its channel above the smaller of the other two. The red light is before the +X
+	// wall: red on face 0, none on face 1 (-X).
+	const auto redExcess = [](const Rgb& aColor) { return aColor[0] - std::min(aColor[1], aColor[2]); };
+	const auto greenExcess = [](const Rgb& aColor) { return aColor[1] - std::min(aColor[0], aColor[2]); };
+	const Rgb plusX = cube.Mean(0, 0, 64, ourFaceSize - 1, 191);
+	const Rgb minusX = cube.Mean(1, 0, 0, ourFaceSize - 1, ourFaceSize - 1);
+	EXPECT_GT(redExcess(plusX), 0.01);
+	EXPECT_LT(std::abs(redExcess(minusX)), 0.02 * redExcess(plusX)) << redExcess(minusX);
+	// The green light is low in the room: on every side face the lower half of the wall (rows
+	// 166..216; the floor starts below) is greener than its upper half (rows 40..90).
+	for (int face : {0, 1, 4, 5})
+	{
+		const Rgb upper = cube.Mean(face, 0, 40, ourFaceSize - 1, 90);
+		const Rgb lower = cube.Mean(face, 0, 166, ourFaceSize - 1, 216);
+		EXPECT_GT(greenExcess(lower), 0.005) << "face " << face;
+		EXPECT_GT(greenExcess(lower), 3.0 * std::abs(greenExcess(upper)))
+		    << "face " << face << ": row 0 looks up";
+	}
+	// -Y (face 3) looks down at the floor under the green light, +Y (face 2) at the ceiling far above it.
+	const Rgb floor = cube.Mean(3, 64, 64, 191, 191);
+	const Rgb ceiling = cube.Mean(2, 64, 64, 191, 191);
+	EXPECT_GT(greenExcess(floor), 4.0 * greenExcess(ceiling));
+
+	// The filtered mips against the lobes max(0, cos)^p, p = 8192^((8 - m) / 8), integrated on the
+	// CPU over mip 0 (reduced where the lobe is wide enough): mip 1 is mip 0 hardly blurred, mip 8
+	// its cosine-weighted hemisphere. The sharp mips are measured on a grid that includes the
+	// faces' edges and centres, the others at every texel.
+	const Radiance full(cube, ourFaceSize);
+	const Radiance half(cube, ourFaceSize / 2);
+	const Radiance quarter(cube, ourFaceSize / 4);
+	for (int mip = 1; mip < ourMipCount; ++mip)
+	{
+		const Radiance& radiance = mip == 1 ? full : mip == 2 ? half : quarter;
+		const double power = std::pow(8192.0, (8 - mip) * 0.125);
+		const int size = cube.Size(mip);
+		std::vector<int> samples;
+		for (int sample = 0; sample < size; ++sample)
+		{
+			samples.push_back(sample);
+		}
+		if (size > 16)
+		{
+			samples = {0, size / 4, size / 2, size * 3 / 4, size - 1};
+		}
+		double worst = 0.0;
+		double brightest = 0.0;
+		for (int face = 0; face < 6; ++face)
+		{
+			for (int y : samples)
+			{
+				for (int x : samples)
+				{
+					std::array<double, 3> normal =
+					    FacePoint(face, (2.0 * x + 1.0) / size - 1.0, (2.0 * y + 1.0) / size - 1.0);
+					const double length =
+					    std::sqrt(normal[0] * normal[0] + normal[1] * normal[1] + normal[2] * normal[2]);
+					for (double& component : normal)
+					{
+						component /= length;
+					}
+					const Rgb expected = radiance.Lobe(normal, power);
+					const Rgb actual = cube.Texel(face, mip, x, y);
+					for (int channel = 0; channel < 3; ++channel)
+					{
+						worst = std::max(worst, std::abs(actual[channel] - expected[channel]));
+						brightest = std::max(brightest, expected[channel]);
+					}
+				}
+			}
+		}
+		EXPECT_GT(brightest, 0.01) << "mip " << mip;
+		EXPECT_LT(worst, 0.05 * brightest)
+		    << "mip " << mip << ": worst difference " << worst << " of " << brightest;
+	}
+}
+
+TEST_F(ReflectionBakeTest, TheCubemapContainerLoadsABakedRoom)
+{
+	if (!Start())
+	{
+		return;
+	}
+	LightTheSmallRoom();
+	Bake("loaded");
+	CubeFile file;
+	ASSERT_TRUE(Load(CubePath("loaded", "small"), file));
+
+	Zeph::CubemapContainer& container = Zeph::Engine::GetInstance()->GetCubemapContainer();
+	Zeph::DynamicCubemap* fallback = container.GetCubemap(-1, "");
+	Zeph::DynamicCubemap* room = container.GetCubemap(0, CubePath("loaded", "small"));
+	ASSERT_NE(room, nullptr);
+	EXPECT_NE(room, fallback);
+	ASSERT_NE(room->GetTexture(), nullptr);
+	EXPECT_NE(room->GetCubeShaderResourceView(), nullptr);
+	EXPECT_EQ(room->GetTexture()->GetMipLevels(), ourMipCount);
+	for (int mip : {0, 8})
+	{
+		std::vector<float> texels;
+		ASSERT_TRUE(Gpu::ReadTexture(*room->GetTexture(), mip, 0, 6, texels));
+		const int size = file.Size(mip);
+		for (int face = 0; face < 6; ++face)
+		{
+			const Rgb expected = file.Texel(face, mip, size / 2, size / 2);
+			const size_t at = ((static_cast<size_t>(face) * size + size / 2) * size + size / 2) * 4;
+			for (int channel = 0; channel < 3; ++channel)
+			{
+				EXPECT_FLOAT_EQ(texels[at + channel], static_cast<float>(expected[channel]))
+				    << "face " << face << " mip " << mip;
+			}
+		}
+	}
+}
