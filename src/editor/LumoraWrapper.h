@@ -113,6 +113,12 @@ public:
 	void ChangeDecalType(const std::u16string& aDecalType);
 	void GetCurrentDecalTypes(DecalTypeStruct& aDecalTypeRef) const;
 
+	// Bakes (they hold the facade for their whole run; frames are dropped meanwhile)
+	// and the progress of the running or last bake, 0..100, readable from any thread.
+	void BakeAmbient(const std::u16string& aLevel, int aNumOfBounces, bool aSaveToDDSFlag);
+	void BakeSpecular(const std::u16string& aLevel);
+	int GetBakeProgress() const;
+
 	// Post-processing settings.
 	void UpdateSSAO(float aScale, float aSampleRadius, float aBias, float anIntensity);
 	void UpdateHDRandBloom(float anAutoExposure, float aLumMin, float aLumMax, float aBloomThresh,
@@ -214,10 +220,12 @@ private:
 	static LumoraWrapper* ourInstance;
 
 	int myNodeIDCounter = 1;
-	int myCurrentSelectedPoint = -1;
-	int myCurrentSelectedSpot = -1;
-	int myCurrentSelectedNode = -1;
-	int myCurrentSelectedDecal = -1;
+	// The selection: written by picking on the user-interface thread without the busy
+	// flag and read by the frame, so each index is one atomic store and load.
+	std::atomic<int> myCurrentSelectedPoint{-1};
+	std::atomic<int> myCurrentSelectedSpot{-1};
+	std::atomic<int> myCurrentSelectedNode{-1};
+	std::atomic<int> myCurrentSelectedDecal{-1};
 	std::atomic<bool> myRenderIsDoneFlag{true};
 	std::atomic<bool> myPausedFlag{false};
 	std::atomic<bool> myUpdateActive{false};

@@ -1,0 +1,54 @@
+// The ambient bake of the larger sample level through the editor facade, headless:
+// one iteration is one whole bake (1, 2 or 3 bounces), with the probes read back in
+// batches or one by one. Counters: probes rendered and
+// projected per second (a probe is six 32 x 32 deferred faces, one read-back of the
+// cube and its SH projection) and the probe count. Writes the level's ambient.sh in
+// the working directory's data/ (run from the repository root, or a copy of it).
+
+#include <benchmark/benchmark.h>
+
+#include "editor/LumoraWrapper.h"
+#include "engine/Engine.h"
+#include "renderer/Renderer.h"
+
+namespace
+{
+void BM_AmbientBake(benchmark::State& aState)
+{
+	const int bounces = static_cast<int>(aState.range(0));
+	const bool batchedFlag = aState.range(1) != 0;
+	if (!Lumora::LumoraWrapper::Create(0, 1280, 720))
+	{
+		aState.SkipWithError("the editor could not start (no OpenGL 4.5 core context?)");
+		return;
+	}
+	Lumora::LumoraWrapper& editor = *Lumora::LumoraWrapper::GetInstance();
+	editor.ParseLevel(u"sample_large");
+	if (editor.GetRooms().Count() == 0)
+	{
+		aState.SkipWithError("data/XML/levels/sample_large did not load (run from the repository root)");
+		Lumora::LumoraWrapper::ShutDown();
+		return;
+	}
+	Zeph::Engine::GetInstance()->GetRenderer().SetProbeBatchingFlag(batchedFlag);
+	long long probes = 0;
+	for (auto _ : aState)
+	{
+		editor.BakeAmbient(u"sample_large", bounces, false);
+		probes += Zeph::Engine::GetInstance()->GetRenderer().GetBakedProbeCount();
+	}
+	aState.counters["probes/s"] =
+	    benchmark::Counter(static_cast<double>(probes), benchmark::Counter::kIsRate);
+	aState.counters["probes"] = static_cast<double>(probes) / static_cast<double>(aState.iterations());
+	Lumora::LumoraWrapper::ShutDown();
+}
+// Arguments: bounces, then 1 for read-backs batched through the atlas, 0 for one per probe.
+BENCHMARK(BM_AmbientBake)
+    ->Args({1, 0})
+    ->Args({1, 1})
+    ->Args({2, 1})
+    ->Args({3, 1})
+    ->Unit(benchmark::kMillisecond)
+    ->UseRealTime()
+    ->Iterations(1);
+} // namespace

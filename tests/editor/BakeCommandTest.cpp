@@ -1,0 +1,173 @@
+// The facade's ambient bake on the small sample level: what it writes, what the
+// editor shows afterwards, and its handshake with a render loop that keeps running
+// and a third thread that polls the progress.
+#include <algorithm>
+#include <atomic>
+#include <chrono>
+#include <cmath>
+#include <filesystem>
+#include <gtest/gtest.h>
+#include <thread>
+#include <vector>
+
+#include "FacadeFixture.h"
+#include "engine/Engine.h"
+#include "engine/Room.h"
+#include "renderer/AmbientVolumeFile.h"
+#include "renderer/ProbeHelper.h"
+#include "renderer/Renderer.h"
+
+namespace
+{
+class BakeCommandTest : public FacadeTest
+{
+protected:
+	// The probe counts the bake's grid has over the loaded rooms.
+	void ExpectedCounts(int (&someCountsOut)[3]) const
+	{
+		Vector3<float> minimum(2000000.0f, 2000000.0f, 2000000.0f);
+		Vector3<float> maximum(-2000000.0f, -2000000.0f, -2000000.0f);
+		const auto& rooms = myFacadeRooms();
+		for (int index = 0; index < rooms.Count(); ++index)
+		{
+			minimum.Set(std::min(minimum.x, rooms[index]->GetMin().x),
+			            std::min(minimum.y, rooms[index]->GetMin().y),
+			            std::min(minimum.z, rooms[index]->GetMin().z));
+			maximum.Set(std::max(maximum.x, rooms[index]->GetMax().x),
+			            std::max(maximum.y, rooms[index]->GetMax().y),
+			            std::max(maximum.z, rooms[index]->GetMax().z));
+		}
+		someCountsOut[0] = static_cast<int>(std::ceil((maximum.x - minimum.x) / 2.0f));
+		someCountsOut[1] = static_cast<int>(std::ceil((maximum.y - minimum.y) / 2.0f));
+		someCountsOut[2] = static_cast<int>(std::ceil((maximum.z - minimum.z) / 2.0f));
+	}
+	const GrowingArray<Zeph::Room*>& myFacadeRooms() const
+	{
+		return Lumora::LumoraWrapper::GetInstance()->GetRooms();
+	}
+};
+
+// The constant term of the red irradiance (E / pi) a cell holds: cAr.w decoded.
+float RedConstant(const Zeph::AmbientVolume& aVolume, size_t aCell)
+{
+	return static_cast<float>(aVolume.myBlocks[0][aCell] >> 24) / 255.0f * 2.0f - 1.0f;
+}
+} // namespace
+
+TEST_F(BakeCommandTest, AmbientBakeWritesTheVolumeKeepsTheModeAndTheEditorShowsIt)
+{
+	Facade().ParseLevel(u"sample_small");
+	ASSERT_GT(Facade().GetRooms().Count(), 0);
+	Facade().SetIsLightMode(Lumora::DECAL_MODE);
+	const std::filesystem::path file = ScratchPath() / "data/XML/levels/sample_small/ambient.sh";
+	ASSERT_FALSE(std::filesystem::exists(file));
+
+	// Zero bounces write nothing.
+	Facade().BakeAmbient(u"sample_small", 0, false);
+	EXPECT_FALSE(std::filesystem::exists(file));
+	EXPECT_EQ(Facade().GetBakeProgress(), 0);
+
+	Facade().BakeAmbient(u"sample_small", 1, false);
+	EXPECT_EQ(Facade().GetMode(), Lumora::DECAL_MODE) << "the mode comes back after the bake";
+	EXPECT_FALSE(Facade().IsBusy());
+	Zeph::AmbientVolume volume;
+	std::string problem;
+	ASSERT_EQ(Zeph::ReadAmbientVolume(file.string(), volume, problem), Zeph::AmbientVolumeRead::OK)
+	    << problem;
+	int counts[3];
+	ExpectedCounts(counts);
+	EXPECT_EQ(volume.myCounts[0], counts[0]);
+	EXPECT_EQ(volume.myCounts[1], counts[1]);
+	EXPECT_EQ(volume.myCounts[2], counts[2]);
+	// The room is lit: some probe received light, and none is brighter than the lights allow.
+	float brightest = -1.0f;
+	for (size_t cell = 0; cell < volume.myBlocks[0].size(); ++cell)
+	{
+		brightest = std::max(brightest, RedConstant(volume, cell));
+	}
+	EXPECT_GT(brightest, 0.01f) << "no probe saw the lights";
+	EXPECT_NE(Zeph::Engine::GetInstance()->GetRenderer().GetProbeHelper()->GetView(0), nullptr)
+	    << "the baked volume stays bound";
+
+	// Loading the level again reads the baked file, and the next frames draw (the bake's
+	// queued markers, deleted by the load, are not drawn).
+	Facade().ParseLevel(u"sample_small");
+	EXPECT_TRUE(Zeph::Engine::GetInstance()->GetRenderer().IsSHLoaded());
+	Facade().Update(16.0f);
+	Facade().Render();
+	Facade().Render();
+}
+
+TEST_F(BakeCommandTest, ABakeHoldsOffTheRenderLoopAndItsProgressNeverGoesBack)
+{
+	Facade().ParseLevel(u"sample_small");
+	std::atomic<int> frames{0};
+	Facade().SetFrameObserver([&](const Lumora::LumoraWrapper&) { frames.fetch_add(1); });
+	std::atomic<bool> stop{false};
+	std::thread renderLoop([&] {
+		Lumora::LumoraWrapper* facade = Lumora::LumoraWrapper::GetInstance();
+		while (!stop.load())
+		{
+			facade->Update(16.0f);
+			facade->Render();
+		}
+	});
+	// A third thread polls the progress and notes how many frames had been drawn.
+	struct Sample
+	{
+		int myProgress;
+		int myFrames;
+	};
+	std::vector<Sample> samples;
+	std::thread poller([&] {
+		while (!stop.load())
+		{
+			const int progress = Lumora::LumoraWrapper::GetInstance()->GetBakeProgress();
+			samples.push_back({progress, frames.load()});
+			std::this_thread::sleep_for(std::chrono::milliseconds(1));
+		}
+	});
+	// Let the loop draw, then bake from this (the user-interface) thread.
+	while (frames.load() < 2)
+	{
+		std::this_thread::sleep_for(std::chrono::milliseconds(1));
+	}
+	Facade().BakeAmbient(u"sample_small", 2, false);
+	const int framesAfterBake = frames.load();
+	while (frames.load() < framesAfterBake + 2)
+	{
+		std::this_thread::sleep_for(std::chrono::milliseconds(1));
+	}
+	stop = true;
+	renderLoop.join();
+	poller.join();
+
+	ASSERT_FALSE(samples.empty());
+	const int finalProgress = Facade().GetBakeProgress();
+	EXPECT_GT(finalProgress, 0);
+	EXPECT_EQ(samples.back().myProgress, finalProgress);
+	// While the bake runs (from its first progress until it reaches its final value) it
+	// holds the facade: every frame step returns at once, so the frame count stands still.
+	// (The small level's rooms leave some grid cells unvisited, so the final value is
+	// below 100 and stays after the bake.)
+	int framesInBake = -1;
+	int samplesInBake = 0;
+	for (size_t index = 0; index < samples.size(); ++index)
+	{
+		if (index > 0)
+		{
+			ASSERT_LE(samples[index - 1].myProgress, samples[index].myProgress) << "progress went back";
+		}
+		if (samples[index].myProgress > 0 && samples[index].myProgress < finalProgress)
+		{
+			++samplesInBake;
+			if (framesInBake < 0)
+			{
+				framesInBake = samples[index].myFrames;
+			}
+			EXPECT_EQ(samples[index].myFrames, framesInBake) << "a frame ran during the bake";
+		}
+	}
+	EXPECT_GT(samplesInBake, 0) << "the poller never saw the bake running";
+	EXPECT_FALSE(Facade().IsBusy());
+}
