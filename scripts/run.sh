@@ -2,7 +2,8 @@
 # The main job: sets up, builds and runs the lumora tool from the repository root.
 # With no arguments it reports the build and the GPU, renders a frame of the demo scene
 # through the engine headless to out/demo-frame.png, and loads the larger sample level
-# through the editor facade and renders it to out/level-frame.png.
+# through the editor facade, bakes its ambient light (2 bounces) and renders it to
+# out/level-frame.png.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 
@@ -13,4 +14,4 @@ if [ $# -gt 0 ]; then
 fi
 ./build/tools/lumora/lumora
 ./build/tools/lumora/lumora --demo-frame out/demo-frame.png
-./build/tools/lumora/lumora --level-frame sample_large out/level-frame.png
+./build/tools/lumora/lumora --level-frame sample_large out/level-frame.png --bake-bounces 2

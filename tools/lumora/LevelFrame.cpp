@@ -1,5 +1,6 @@
 #include "LevelFrame.h"
 
+#include <chrono>
 #include <cmath>
 #include <cstdio>
 #include <filesystem>
@@ -41,7 +42,8 @@ void PlaceCamera(Lumora::LumoraWrapper& anEditor)
 }
 } // namespace
 
-bool RenderLevelFrame(const std::string& aLevel, const std::string& aPath, int aWidth, int aHeight)
+bool RenderLevelFrame(const std::string& aLevel, const std::string& aPath, int aWidth, int aHeight,
+                      int aBounces)
 {
 	if (!std::filesystem::is_directory("data/XML/levels/" + aLevel))
 	{
@@ -56,6 +58,16 @@ bool RenderLevelFrame(const std::string& aLevel, const std::string& aPath, int a
 	}
 	Lumora::LumoraWrapper& editor = *Lumora::LumoraWrapper::GetInstance();
 	editor.ParseLevel(Lumora::ToWide(aLevel));
+	if (aBounces > 0)
+	{
+		const auto start = std::chrono::steady_clock::now();
+		editor.BakeAmbient(Lumora::ToWide(aLevel), aBounces, false);
+		const double seconds =
+		    std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
+		std::printf("baked the ambient light of %s, %d bounce%s, in %.1f s\n", aLevel.c_str(), aBounces,
+		            aBounces == 1 ? "" : "s", seconds);
+		editor.ParseLevel(Lumora::ToWide(aLevel));
+	}
 	PlaceCamera(editor);
 	// A picture of the lit level: without the light gizmos and light volume outlines.
 	editor.RenderMeshes(false);

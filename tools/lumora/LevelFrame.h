@@ -9,5 +9,8 @@
 namespace LumoraTool
 {
 // Writes the frame as a PNG; prints what went wrong and returns false otherwise.
-bool RenderLevelFrame(const std::string& aLevel, const std::string& aPath, int aWidth, int aHeight);
+// With aBounces above 0 the level's ambient light is baked first (written to the
+// level's ambient.sh) and the level loaded again, so the picture shows it.
+bool RenderLevelFrame(const std::string& aLevel, const std::string& aPath, int aWidth, int aHeight,
+                      int aBounces = 0);
 } // namespace LumoraTool

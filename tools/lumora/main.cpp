@@ -1,6 +1,7 @@
 // lumora: headless jobs on a level. This first version tells what the build holds
 // and whether this machine gives it an OpenGL 4.5 core context.
 #include <cstdio>
+#include <cstdlib>
 #include <cstring>
 
 #include "DemoFrame.h"
@@ -50,12 +51,18 @@ int main(int argc, char** argv)
 	}
 	if (argc > 1 && std::strcmp(argv[1], "--level-frame") == 0)
 	{
-		if (argc != 4)
+		int bounces = 0;
+		if (argc == 6 && std::strcmp(argv[4], "--bake-bounces") == 0)
 		{
-			std::fprintf(stderr, "usage: lumora --level-frame LEVEL OUT.png\n");
+			bounces = std::atoi(argv[5]);
+		}
+		if ((argc != 4 && argc != 6) || bounces < 0 ||
+		    (argc == 6 && bounces == 0 && std::strcmp(argv[5], "0") != 0))
+		{
+			std::fprintf(stderr, "usage: lumora --level-frame LEVEL OUT.png [--bake-bounces N]\n");
 			return 2;
 		}
-		if (!LumoraTool::RenderLevelFrame(argv[2], argv[3], 1280, 720))
+		if (!LumoraTool::RenderLevelFrame(argv[2], argv[3], 1280, 720, bounces))
 		{
 			return 1;
 		}
