@@ -1,17 +1,23 @@
 // The facade's lifecycle and frame loop, headless: what Create leaves, what a frame
 // submits in each mode (gizmo pool, marked gizmo, node marker lights, decal box), the
 // dropped update, two renders in a row and the info line.
+#include <chrono>
 #include <epoxy/egl.h>
 #include <gtest/gtest.h>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include "FacadeFixture.h"
+#include "engine/Effect.h"
 #include "engine/Engine.h"
 #include "engine/Instance.h"
 #include "engine/Text.h"
+#include "platform/fx/Effect.h"
+#include "platform/fx/Variable.h"
 #include "platform/gpu/Readback.h"
 #include "renderer/Renderer.h"
+#include "renderer/post/FullScreenHelper.h"
 
 namespace
 {
@@ -257,4 +263,39 @@ TEST_F(FacadeFrameTest, TheLightsAndTheSelectedLightsGizmoReachThePicture)
 	EXPECT_LT(red[1], 40);
 	EXPECT_GT(green[1], 200);
 	EXPECT_LT(green[0], 40);
+}
+
+TEST_F(FacadeFrameTest, SettingsChangedDuringAFrameWaitForItAndArriveInOrder)
+{
+	// Inside a frame another thread changes the SSAO settings: the change waits for the
+	// frame to end, then reaches the renderer's variables in the order given.
+	using Clock = std::chrono::steady_clock;
+	Clock::time_point observerDone{};
+	Clock::time_point settingsReturned{};
+	std::thread settings;
+	Facade().SetFrameObserver([&](const Lumora::LumoraWrapper&) {
+		if (settings.joinable())
+		{
+			return;
+		}
+		settings = std::thread([&] {
+			Lumora::LumoraWrapper::GetInstance()->UpdateSSAO(1.0f, 2.0f, 3.0f, 4.0f);
+			settingsReturned = Clock::now();
+		});
+		// Long enough for a change that did not wait to be over before this point.
+		std::this_thread::sleep_for(std::chrono::milliseconds(30));
+		observerDone = Clock::now();
+	});
+	Facade().Render();
+	settings.join();
+	EXPECT_GT(settingsReturned, observerDone) << "the settings change did not wait for the frame";
+	Zeph::Effect* fullScreen = Zeph::Engine::GetInstance()->GetRenderer().GetFullScreenHelper().GetEffect();
+	ASSERT_NE(fullScreen, nullptr);
+	const char* names[] = {"SSAO_scale", "SSAO_sample_rad", "SSAO_bias", "SSAO_Intensity"};
+	for (int index = 0; index < 4; ++index)
+	{
+		EXPECT_EQ(fullScreen->GetEffect()->GetVariableByName(names[index])->GetFloats()[0],
+		          static_cast<float>(index + 1))
+		    << names[index];
+	}
 }

@@ -105,6 +105,29 @@ TEST_F(AmbientBakeTest, GridCountsProgressAndWhatZeroBouncesLeave)
 	EXPECT_EQ(volume.myBlocks[6][0] >> 24, 255u);
 }
 
+TEST_F(AmbientBakeTest, AProbeOnARoomsWallPlaneIsOutsideIt)
+{
+	if (!Start())
+	{
+		return;
+	}
+	// Probes at x = 1, 3, 5: x = 3 lies on the second room's minimum plane and in no
+	// room, so its cell keeps the neutral value; the others are captured (a captured
+	// cell's cC has w = 1, stored as 255, where the neutral value has 127).
+	AddRoom({0.0f, 0.0f, 0.0f}, {2.0f, 2.0f, 2.0f});
+	AddRoom({3.0f, 0.0f, 0.0f}, {7.0f, 2.0f, 2.0f});
+	const std::string path = myScratch.File("planes/ambient.sh");
+	Bake(path, 1);
+	Zeph::AmbientVolume volume;
+	std::string problem;
+	ASSERT_EQ(Zeph::ReadAmbientVolume(path, volume, problem), Zeph::AmbientVolumeRead::OK) << problem;
+	ASSERT_EQ(volume.myCounts[0], 4);
+	EXPECT_EQ(volume.myBlocks[6][0] >> 24, 255u) << "x = 1, inside the first room";
+	EXPECT_EQ(volume.myBlocks[6][1], Zeph::ourNeutralSHTexel) << "x = 3, on the second room's wall";
+	EXPECT_EQ(volume.myBlocks[6][2] >> 24, 255u) << "x = 5, inside the second room";
+	EXPECT_EQ(volume.myBlocks[6][3], Zeph::ourNeutralSHTexel) << "x = 7 is never visited";
+}
+
 TEST_F(AmbientBakeTest, RoomLitFromPlusXBrightensSurfacesFacingPlusXAndLoadsBackExactly)
 {
 	if (!Start())
