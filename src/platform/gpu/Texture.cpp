@@ -140,6 +140,17 @@ bool Texture::Init(Context& aContext, const TextureDesc& aDesc)
 		                   myDesc.myArraySize);
 		break;
 	}
+	// A new resource starts zeroed, as a Direct3D texture made without initial data
+	// does: GL leaves fresh storage undefined, and passes that accumulate into a target
+	// they never cleared (the probe capture's G-buffer) must not read garbage.
+	// Block-compressed textures are always uploaded whole, so they are left alone.
+	if (!info.myCompressedFlag)
+	{
+		for (int mip = 0; mip < myDesc.myMipLevels; ++mip)
+		{
+			glClearTexImage(myName, mip, info.myUploadFormat, info.myUploadType, nullptr);
+		}
+	}
 	LUMORA_GL_CHECK(function);
 	LabelObject(GL_TEXTURE, myName, myDesc.myLabel);
 	myDefaultView = CreateShaderResourceView();
