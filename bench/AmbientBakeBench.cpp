@@ -1,6 +1,6 @@
 // The ambient bake of the larger sample level through the editor facade, headless:
 // one iteration is one whole bake (1, 2 or 3 bounces), with the probes read back in
-// batches or one by one. Counters: probes rendered and
+// batches, one cube at a time or one face at a time. Counters: probes rendered and
 // projected per second (a probe is six 32 x 32 deferred faces, one read-back of the
 // cube and its SH projection) and the probe count. Writes the level's ambient.sh in
 // the working directory's data/ (run from the repository root, or a copy of it).
@@ -16,7 +16,8 @@ namespace
 void BM_AmbientBake(benchmark::State& aState)
 {
 	const int bounces = static_cast<int>(aState.range(0));
-	const bool batchedFlag = aState.range(1) != 0;
+	using Readback = Zeph::Renderer::ProbeReadback;
+	const Readback readback = static_cast<Readback>(aState.range(1));
 	if (!Lumora::LumoraWrapper::Create(0, 1280, 720))
 	{
 		aState.SkipWithError("the editor could not start (no OpenGL 4.5 core context?)");
@@ -30,7 +31,7 @@ void BM_AmbientBake(benchmark::State& aState)
 		Lumora::LumoraWrapper::ShutDown();
 		return;
 	}
-	Zeph::Engine::GetInstance()->GetRenderer().SetProbeBatchingFlag(batchedFlag);
+	Zeph::Engine::GetInstance()->GetRenderer().SetProbeReadback(readback);
 	long long probes = 0;
 	for (auto _ : aState)
 	{
@@ -42,12 +43,14 @@ void BM_AmbientBake(benchmark::State& aState)
 	aState.counters["probes"] = static_cast<double>(probes) / static_cast<double>(aState.iterations());
 	Lumora::LumoraWrapper::ShutDown();
 }
-// Arguments: bounces, then 1 for read-backs batched through the atlas, 0 for one per probe.
+// Arguments: bounces, then the read-back: 0 batched through the atlas, 1 one per probe,
+// 2 one per face.
 BENCHMARK(BM_AmbientBake)
-    ->Args({1, 0})
+    ->Args({1, 2})
     ->Args({1, 1})
-    ->Args({2, 1})
-    ->Args({3, 1})
+    ->Args({1, 0})
+    ->Args({2, 0})
+    ->Args({3, 0})
     ->Unit(benchmark::kMillisecond)
     ->UseRealTime()
     ->Iterations(1);

@@ -1,5 +1,7 @@
 #include "model/Model.h"
 
+#include <algorithm>
+#include <cmath>
 #include <cstring>
 
 #include "engine/Effect.h"
@@ -146,6 +148,7 @@ bool Model::InitVertexBuffer()
 		myVertexBuffer->Destroy();
 		myVertexBuffer.reset();
 	}
+	ComputeLocalBounds();
 	Gpu::BufferDesc desc;
 	desc.myKind = Gpu::BufferKind::Vertex;
 	desc.mySize = myVertexData.size();
@@ -208,7 +211,61 @@ bool Model::UpdateVertexBuffer()
 		               "The vertex data no longer fits the vertex buffer");
 		return false;
 	}
+	ComputeLocalBounds();
 	return myVertexBuffer->Update(myVertexData.data(), myVertexData.size());
+}
+
+void Model::ComputeLocalBounds()
+{
+	myLocalBounds = Intersection::Sphere(Vector3<float>(0.0f, 0.0f, 0.0f), -1.0f);
+	// The position is the first element (every vertex type the importer makes starts
+	// with it) or one with an explicit offset; anything else stays unknown.
+	uint32_t offset = Gpu::InputElement::ourAppendAligned;
+	for (int index = 0; index < myInputLayoutDesc.Count(); ++index)
+	{
+		const Gpu::InputElement& element = myInputLayoutDesc[index];
+		if (element.mySemanticName == "POSITION" && element.mySemanticIndex == 0 &&
+		    element.myInputSlot == 0 &&
+		    (element.myFormat == Dds::Format::R32G32B32_FLOAT ||
+		     element.myFormat == Dds::Format::R32G32B32A32_FLOAT))
+		{
+			offset = index == 0 && element.myAlignedByteOffset == Gpu::InputElement::ourAppendAligned
+			             ? 0
+			             : element.myAlignedByteOffset;
+			break;
+		}
+	}
+	const size_t stride = static_cast<size_t>(myVertexStride);
+	const size_t count = static_cast<size_t>(std::max(myVertexCount, 0));
+	if (offset == Gpu::InputElement::ourAppendAligned || stride == 0 || count == 0 ||
+	    offset + 3 * sizeof(float) > stride || count * stride > myVertexData.size())
+	{
+		return;
+	}
+	const auto position = [&](size_t aVertex) {
+		float xyz[3];
+		std::memcpy(xyz, myVertexData.data() + aVertex * stride + offset, sizeof(xyz));
+		return Vector3<float>(xyz[0], xyz[1], xyz[2]);
+	};
+	Vector3<float> minimum = position(0);
+	Vector3<float> maximum = minimum;
+	for (size_t vertex = 1; vertex < count; ++vertex)
+	{
+		const Vector3<float> p = position(vertex);
+		minimum.Set(std::min(minimum.x, p.x), std::min(minimum.y, p.y), std::min(minimum.z, p.z));
+		maximum.Set(std::max(maximum.x, p.x), std::max(maximum.y, p.y), std::max(maximum.z, p.z));
+	}
+	const Vector3<float> centre = (minimum + maximum) * 0.5f;
+	float radiusSquared = 0.0f;
+	for (size_t vertex = 0; vertex < count; ++vertex)
+	{
+		const Vector3<float> d = position(vertex) - centre;
+		radiusSquared = std::max(radiusSquared, d.x * d.x + d.y * d.y + d.z * d.z);
+	}
+	if (std::isfinite(radiusSquared))
+	{
+		myLocalBounds = Intersection::Sphere(centre, std::sqrt(radiusSquared));
+	}
 }
 
 void Model::SetTechniqueByName(const std::string& aName)

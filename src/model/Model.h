@@ -22,6 +22,7 @@
 #include <vector>
 
 #include "core/GrowingArray.h"
+#include "core/Sphere.h"
 #include "model/ModelAnimationData.h"
 #include "model/Surface.h"
 #include "platform/gpu/Buffer.h"
@@ -115,8 +116,13 @@ public:
 	// the model has nothing to draw with.
 	bool SetupBuffers(Gpu::Context& aContext) const;
 
+	// A sphere around the vertex positions in model space, remade whenever the vertex
+	// buffer is made or updated; a negative radius means unknown (never culled).
+	const Intersection::Sphere& GetLocalBounds() const { return myLocalBounds; }
+
 private:
 	void ReleaseBuffers();
+	void ComputeLocalBounds();
 
 	static int ourModelCounter;
 
@@ -147,6 +153,7 @@ private:
 	std::unique_ptr<Gpu::InputLayout> myInputLayout;
 	GrowingArray<Gpu::InputElement> myInputLayoutDesc;
 	bool myDynamicVertexBufferFlag = false;
+	Intersection::Sphere myLocalBounds{Vector3<float>(0.0f, 0.0f, 0.0f), -1.0f};
 	bool myIsShadowCasterFlag = false;
 };
 } // namespace Zeph

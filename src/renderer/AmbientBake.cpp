@@ -243,7 +243,8 @@ void Renderer::GenerateSH(const GrowingArray<Room*>& someRooms, const std::strin
 
 	Gpu::Context& context = engine->GetContext();
 	ProbeAtlas atlas;
-	const bool batchedFlag = myProbeBatchingFlag && atlas.Init(context, cube->GetSize());
+	const bool batchedFlag =
+	    myProbeReadback == ProbeReadback::BATCHED && atlas.Init(context, cube->GetSize());
 	const auto flush = [&] {
 		if (!atlas.Flush(context, blocks))
 		{
@@ -335,8 +336,27 @@ void Renderer::AddScalars(DynamicCubemap& aCube, std::vector<uint32_t>* someBloc
 	float red[Sh::ourCoefficientCount];
 	float green[Sh::ourCoefficientCount];
 	float blue[Sh::ourCoefficientCount];
-	if (aCube.GetTexture() == nullptr ||
-	    !Sh::ProjectCubeMap(Engine::GetInstance()->GetContext(), 3, *aCube.GetTexture(), red, green, blue))
+	const Gpu::Texture* texture = aCube.GetTexture();
+	bool projected = false;
+	if (texture != nullptr && myProbeReadback == ProbeReadback::PER_FACE)
+	{
+		// Each face read back alone, then the cube projected as a whole.
+		std::vector<float> cubeTexels;
+		std::vector<float> faceTexels;
+		projected = true;
+		for (int face = 0; face < 6 && projected; ++face)
+		{
+			projected = Gpu::ReadTexture(*texture, 0, face, 1, faceTexels);
+			cubeTexels.insert(cubeTexels.end(), faceTexels.begin(), faceTexels.end());
+		}
+		projected = projected &&
+		            Sh::ProjectCubeTexels(cubeTexels.data(), texture->GetMipWidth(0), 4, red, green, blue);
+	}
+	else if (texture != nullptr)
+	{
+		projected = Sh::ProjectCubeMap(Engine::GetInstance()->GetContext(), 3, *texture, red, green, blue);
+	}
+	if (!projected)
 	{
 		ReportCritical(1154, "Zeph::Renderer::AddScalars", "FAILED TO REFRESH CUBEMAP");
 		return;

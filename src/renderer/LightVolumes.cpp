@@ -9,11 +9,11 @@
 #include "engine/ShaderFiles.h"
 #include "model/Model.h"
 #include "model/ModelFactory.h"
-#include "renderer/RenderTargetHelper.h"
 #include "platform/fx/Pass.h"
 #include "platform/fx/Technique.h"
 #include "platform/gpu/Context.h"
 #include "renderer/RenderTargetCollector.h"
+#include "renderer/RenderTargetHelper.h"
 
 namespace Zeph
 {
@@ -32,8 +32,9 @@ struct LightVariables
 };
 
 // The light effect and technique with the volume's buffers bound; false when any is missing.
-bool Prepare(EffectType anEffectType, const Model* aVolume, const char* aTechnique, const RenderTargetCollector& aCollector,
-             Effect*& anEffectOut, Fx::Technique*& aTechniqueOut, LightVariables& someVariablesOut)
+bool Prepare(EffectType anEffectType, const Model* aVolume, const char* aTechnique,
+             const RenderTargetCollector& aCollector, Effect*& anEffectOut, Fx::Technique*& aTechniqueOut,
+             LightVariables& someVariablesOut)
 {
 	Engine* engine = Engine::GetInstance();
 	if (engine == nullptr || aVolume == nullptr || aVolume->GetSurfaces().Count() == 0)
@@ -113,21 +114,54 @@ Matrix44<float> SpotLightScale(const SpotLightData& aLight)
 	return scale;
 }
 
-void DrawPointLights(const RenderTargetCollector& aCollector, const VolumeModel& aVolume, const char* aTechnique)
+// What a spot light lights lies within its falloff distance of the apex and inside
+// its cone: bounded around the middle of the axis for narrow cones, by the range
+// around the apex for wide ones.
+bool IsSpotLightCulled(const RenderTargetCollector& aCollector, const SpotLightData& aLight)
+{
+	const Matrix44<float> scale = SpotLightScale(aLight);
+	const float length = aLight.myFalloff;
+	const float baseRadius = scale.myMatrix[0];
+	const float* m = aLight.myOrientation.myMatrix;
+	const Vector3<float> apex = aLight.myOrientation.GetPosition();
+	Vector3<float> axis(m[8], m[9], m[10]);
+	const float axisLength = std::sqrt(axis.x * axis.x + axis.y * axis.y + axis.z * axis.z);
+	if (!(axisLength > 0.0f) || !std::isfinite(baseRadius))
+	{
+		return aCollector.IsCulled(apex, length);
+	}
+	axis = axis * (1.0f / axisLength);
+	const float middleRadius = std::sqrt(0.25f * length * length + baseRadius * baseRadius);
+	if (middleRadius < length)
+	{
+		return aCollector.IsCulled(apex + axis * (0.5f * length), middleRadius * 1.05f);
+	}
+	return aCollector.IsCulled(apex, length);
+}
+
+void DrawPointLights(const RenderTargetCollector& aCollector, const VolumeModel& aVolume,
+                     const char* aTechnique)
 {
 	Effect* effect = nullptr;
 	Fx::Technique* technique = nullptr;
 	LightVariables variables;
 	if (aCollector.GetPointLights().Count() == 0 ||
-	    !Prepare(EFFECT_DEFERRED_POINT_LIGHT, aVolume.myModel, aTechnique, aCollector, effect, technique, variables))
+	    !Prepare(EFFECT_DEFERRED_POINT_LIGHT, aVolume.myModel, aTechnique, aCollector, effect, technique,
+	             variables))
 	{
 		return;
 	}
 	for (const PointLightData& light : aCollector.GetPointLights())
 	{
+		// Nothing beyond the falloff distance is lit.
+		if (aCollector.IsCulled(light.myPosition, light.myFalloff))
+		{
+			continue;
+		}
 		effect->SetWorldMatrix(aVolume.myLocal * PointLightWorld(light));
 		const Vector4<float> position =
-		    Vector4<float>(light.myPosition.x, light.myPosition.y, light.myPosition.z, 1.0f) * aCollector.GetView();
+		    Vector4<float>(light.myPosition.x, light.myPosition.y, light.myPosition.z, 1.0f) *
+		    aCollector.GetView();
 		variables.myPosition->SetFloatVector(&position.x);
 		variables.myColor->SetFloatVector(&light.myColor.x);
 		variables.myFalloff->SetFloat(light.myFalloff);
@@ -135,18 +169,24 @@ void DrawPointLights(const RenderTargetCollector& aCollector, const VolumeModel&
 	}
 }
 
-void DrawSpotLights(const RenderTargetCollector& aCollector, const VolumeModel& aVolume, const char* aTechnique)
+void DrawSpotLights(const RenderTargetCollector& aCollector, const VolumeModel& aVolume,
+                    const char* aTechnique)
 {
 	Effect* effect = nullptr;
 	Fx::Technique* technique = nullptr;
 	LightVariables variables;
 	if (aCollector.GetSpotLights().Count() == 0 ||
-	    !Prepare(EFFECT_DEFERRED_SPOT_LIGHT, aVolume.myModel, aTechnique, aCollector, effect, technique, variables))
+	    !Prepare(EFFECT_DEFERRED_SPOT_LIGHT, aVolume.myModel, aTechnique, aCollector, effect, technique,
+	             variables))
 	{
 		return;
 	}
 	for (const SpotLightData& light : aCollector.GetSpotLights())
 	{
+		if (IsSpotLightCulled(aCollector, light))
+		{
+			continue;
+		}
 		effect->SetWorldMatrix(light.myOrientation);
 		const Matrix44<float> scale = aVolume.myLocal * SpotLightScale(light);
 		variables.myScale->SetMatrix(scale.myMatrix);

@@ -27,6 +27,10 @@ void Renderer::RenderProbeFace(DynamicCubemap& aCube, int aFace, const Vector3<f
 	{
 		aGBuffer.Clear();
 	}
+	// The face and depth the light passes draw into are bound first, so the clears
+	// below happen where the lights will draw.
+	Gpu::RenderTargetView* const output[] = {face};
+	context.SetRenderTargets(output, depth);
 	const float black[4] = {0.0f, 0.0f, 0.0f, 0.0f};
 	context.ClearRenderTargetView(*face, black);
 	context.ClearDepthStencilView(*depth, true, true, 1.0f, 0);
@@ -34,6 +38,9 @@ void Renderer::RenderProbeFace(DynamicCubemap& aCube, int aFace, const Vector3<f
 	myCurrentDepth = depth;
 	aCube.SetPosition(aPosition);
 	myCollector.SetCamera(*camera);
+	// A face sees a sixth of the directions around it: what lies outside is skipped.
+	const bool cullingFlag = myCollector.GetViewCullingFlag();
+	myCollector.SetViewCullingFlag(myProbeCullingFlag);
 	context.SetViewport(aCube.GetViewport());
 
 	aGBuffer.SetDepth(depth);
@@ -54,6 +61,7 @@ void Renderer::RenderProbeFace(DynamicCubemap& aCube, int aFace, const Vector3<f
 	// White stays bound: the next frame's shadow resolve publishes its own visibility,
 	// and without a shadow map the sun is never blocked.
 	RenderAmbient(aGBuffer, aCube.GetSize(), aCube.GetSize());
+	myCollector.SetViewCullingFlag(cullingFlag);
 	context.SetRenderTargets({}, nullptr);
 }
 } // namespace Zeph

@@ -1,5 +1,10 @@
 #include "renderer/RenderTargetCollector.h"
 
+#include <algorithm>
+#include <cmath>
+
+#include "core/Vector4.h"
+
 #include "engine/CameraInstance.h"
 #include "model/Model.h"
 #include "model/VertexTypes.h"
@@ -30,6 +35,7 @@ void RenderTargetCollector::SetCamera(const CameraInstance& aCamera)
 	myView = aCamera.GetView();
 	myProjection = aCamera.GetProjection();
 	myFarPlane = aCamera.GetFarPlane();
+	myFrustum.Init(myView * myProjection);
 }
 
 void RenderTargetCollector::AddAuxiliary(AuxiliaryEffect* anEffect)
@@ -90,13 +96,58 @@ void RenderTargetCollector::RunBatches(RenderTargetHelper& aHelper, BatchListTyp
 	{
 		if (aSkinnedFlag)
 		{
+			// Skinned bounds move with the pose: never culled.
 			aHelper.RenderSkinned(batches[index]);
 		}
-		else
+		else if (const RenderBatch* visible = VisiblePart(batches[index]))
 		{
-			aHelper.Render(batches[index]);
+			aHelper.Render(*visible);
 		}
 	}
+}
+
+const RenderBatch* RenderTargetCollector::VisiblePart(const RenderBatch& aBatch)
+{
+	const Intersection::Sphere& bounds = aBatch.GetModel()->GetLocalBounds();
+	if (!myViewCullingFlag || bounds.myRadius < 0.0f)
+	{
+		return &aBatch;
+	}
+	const auto isCulled = [&](int anInstance) {
+		const Matrix44<float>& world = aBatch.GetWorld(anInstance);
+		const float* m = world.myMatrix;
+		const Vector4<float> centre =
+		    Vector4<float>(bounds.myPosition.x, bounds.myPosition.y, bounds.myPosition.z, 1.0f) * world;
+		// The longest axis scales the radius (worlds may scale unevenly).
+		const float scale = std::sqrt(
+		    std::max({m[0] * m[0] + m[1] * m[1] + m[2] * m[2], m[4] * m[4] + m[5] * m[5] + m[6] * m[6],
+		              m[8] * m[8] + m[9] * m[9] + m[10] * m[10]}));
+		return IsCulled(Vector3<float>(centre.x, centre.y, centre.z), bounds.myRadius * scale);
+	};
+	int culled = 0;
+	for (int instance = 0; instance < aBatch.GetCount(); ++instance)
+	{
+		culled += isCulled(instance) ? 1 : 0;
+	}
+	myCulledInstanceCount += culled;
+	if (culled == 0)
+	{
+		return &aBatch;
+	}
+	if (culled == aBatch.GetCount())
+	{
+		return nullptr;
+	}
+	myVisibleBatch.Reset(aBatch.GetModel(), aBatch.GetSurface());
+	for (int instance = 0; instance < aBatch.GetCount(); ++instance)
+	{
+		if (!isCulled(instance))
+		{
+			myVisibleBatch.Add(aBatch.GetWorld(instance), aBatch.GetPreviousWorld(instance),
+			                   aBatch.GetRoomData(instance));
+		}
+	}
+	return &myVisibleBatch;
 }
 
 void RenderTargetCollector::RenderShadowCastingStatic(RenderTargetHelper& aHelper)

@@ -14,6 +14,11 @@
 // frame and keeps their storage. The camera block survives Reset, which is what
 // keeps last frame's view. Each pass runner calls a helper's Begin, its batch
 // operation for every batch of the list(s), then End.
+//
+// With view culling on, the runners skip static instances whose bounds lie wholly
+// outside the camera's frustum and the light passes skip lights the same way; the
+// probe captures turn it on (six narrow views of a whole level each).
+#include "core/Frustum.h"
 #include "core/GrowingArray.h"
 #include "core/Matrix44.h"
 #include "engine/RoomData.h"
@@ -73,6 +78,16 @@ public:
 	const Matrix44<float>& GetProjection() const { return myProjection; }
 	const Matrix44<float>& GetInverseProjection() const { return myInverseProjection; }
 
+	void SetViewCullingFlag(bool aFlag) { myViewCullingFlag = aFlag; }
+	bool GetViewCullingFlag() const { return myViewCullingFlag; }
+	// True when view culling is on and the sphere lies wholly outside the camera's view.
+	bool IsCulled(const Vector3<float>& aCentre, float aRadius) const
+	{
+		return myViewCullingFlag && aRadius >= 0.0f && myFrustum.IsSphereOutside(aCentre, aRadius);
+	}
+	// Static instances the runners have culled, in all (a statistic; Reset keeps it).
+	int GetCulledInstanceCount() const { return myCulledInstanceCount; }
+
 	void AddPointLight(const PointLightData& aLight) { myPointLights.Add(aLight); }
 	void AddSpotLight(const SpotLightData& aLight) { mySpotLights.Add(aLight); }
 	void AddDecal(const DecalData& aDecal) { myDecals.Add(aDecal); }
@@ -112,6 +127,9 @@ private:
 	               const Matrix44<float>& aWorld, const Matrix44<float>& aPreviousWorld,
 	               const RoomData& aRoomData);
 	void RunBatches(RenderTargetHelper& aHelper, BatchListType aList, bool aSkinnedFlag);
+	// The batch's instances inside the view, or the batch itself when none is culled;
+	// null when all are.
+	const RenderBatch* VisiblePart(const RenderBatch& aBatch);
 
 	float myFarPlane = 0.0f;
 	Matrix44<float> myCameraWorld;
@@ -126,5 +144,9 @@ private:
 	RenderBatchList myBatchLists[BATCH_LIST_COUNT];
 	GrowingArray<AuxiliaryEffect*> myAuxiliaryList;
 	AuxiliaryEntry myAuxiliaryEntry;
+	Intersection::Frustum myFrustum;
+	bool myViewCullingFlag = false;
+	int myCulledInstanceCount = 0;
+	RenderBatch myVisibleBatch;
 };
 } // namespace Zeph

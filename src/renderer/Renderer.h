@@ -151,9 +151,19 @@ public:
 	// into its mips, saved to "data/Cubemaps/" + aLevel + "/" + room id + ".dds".
 	void GenerateReflections(const GrowingArray<Room*>& someRooms, const std::string& aLevel);
 	int GetBakingProgress() const { return myBakingProgress.load(); }
-	// The ambient bake reads its probes back in batches (true, the default) or one by
-	// one; the volume is the same either way.
-	void SetProbeBatchingFlag(bool aFlag) { myProbeBatchingFlag = aFlag; }
+	// How the ambient bake reads its probes back: many probes' faces gathered in an
+	// atlas and read at once (the default), each probe's cube at once, or each face
+	// alone. The volume is the same either way; the modes are there to be compared.
+	enum class ProbeReadback
+	{
+		BATCHED,
+		PER_PROBE,
+		PER_FACE,
+	};
+	void SetProbeReadback(ProbeReadback aMode) { myProbeReadback = aMode; }
+	// Probe captures skip instances and lights outside each face's view (the default);
+	// off, they draw everything, with the same result.
+	void SetProbeCullingFlag(bool aFlag) { myProbeCullingFlag = aFlag; }
 	// Probe cubemaps the last ambient bake rendered and projected, over all bounces.
 	long long GetBakedProbeCount() const { return myBakedProbeCount; }
 	bool IsSHLoaded() const { return mySHLoadedFlag; }
@@ -227,7 +237,8 @@ private:
 	// Cells visited by the current bake, over every bounce.
 	long long myBakingProgressCounter = 0;
 	long long myBakedProbeCount = 0;
-	bool myProbeBatchingFlag = true;
+	ProbeReadback myProbeReadback = ProbeReadback::BATCHED;
+	bool myProbeCullingFlag = true;
 	bool mySHLoadedFlag = false;
 	std::unique_ptr<ProbeHelper> myProbeHelper;
 	std::unique_ptr<Texture> myHDRTargets[2];

@@ -4,16 +4,26 @@
 #include <algorithm>
 #include <cmath>
 #include <filesystem>
+#include <fstream>
 #include <gtest/gtest.h>
 #include <memory>
+#include <sstream>
 #include <string>
 #include <vector>
 
 #include "FrameFixture.h"
+#include "engine/Effect.h"
 #include "engine/Room.h"
+#include "model/Model.h"
+#include "model/ModelNode.h"
+#include "platform/dds/DdsFile.h"
+#include "platform/dds/Image.h"
+#include "platform/fx/Effect.h"
+#include "platform/fx/Variable.h"
 #include "platform/gpu/Readback.h"
 #include "renderer/AmbientVolumeFile.h"
 #include "renderer/ProbeHelper.h"
+#include "renderer/RenderTargetHelper.h"
 #include "renderer/Renderer.h"
 #include "renderer/ShPacking.h"
 #include "support/TestSupport.h"
@@ -158,12 +168,18 @@ TEST_F(AmbientBakeTest, RoomLitFromPlusXBrightensSurfacesFacingPlusXAndLoadsBack
 		EXPECT_GT(facingPlusX, 2.0f * std::max(facingMinusX, 0.0f) + 0.02f) << "cell " << cell;
 	}
 
-	// Reading the probes back one by one instead of in batches gives the same file.
-	Renderer().SetProbeBatchingFlag(false);
-	const std::string single = myScratch.File("single/ambient.sh");
-	Bake(single, 1);
-	Renderer().SetProbeBatchingFlag(true);
-	EXPECT_EQ(TestSupport::ReadWholeFile(single), TestSupport::ReadWholeFile(path));
+	// Reading the probes back one by one, or each face alone, instead of in batches
+	// gives the same file.
+	using Readback = Zeph::Renderer::ProbeReadback;
+	for (const Readback mode : {Readback::PER_PROBE, Readback::PER_FACE})
+	{
+		Renderer().SetProbeReadback(mode);
+		const std::string single = myScratch.File("single/ambient.sh");
+		Bake(single, 1);
+		EXPECT_EQ(TestSupport::ReadWholeFile(single), TestSupport::ReadWholeFile(path))
+		    << "mode " << static_cast<int>(mode);
+	}
+	Renderer().SetProbeReadback(Readback::BATCHED);
 
 	// The file loaded back gives the GPU exactly the bytes it holds.
 	Renderer().SetSH(path);
@@ -183,6 +199,140 @@ TEST_F(AmbientBakeTest, RoomLitFromPlusXBrightensSurfacesFacingPlusXAndLoadsBack
 				const uint32_t stored = (volume.myBlocks[block][cell] >> (8 * component)) & 0xFF;
 				ASSERT_EQ(static_cast<uint32_t>(std::lround(texels[cell * 4 + component] * 255.0f)), stored)
 				    << "block " << block << " cell " << cell;
+			}
+		}
+	}
+}
+
+TEST_F(AmbientBakeTest, FacesSkipWhatTheyCannotSeeWithoutChangingTheVolume)
+{
+	if (!Start())
+	{
+		return;
+	}
+	// The small room with a crate in one corner, a point light by the +X wall and a
+	// spot light over the opposite corner: each probe face sees only part of them.
+	Place("data/models/room_small.dae", {0.0f, 0.0f, 0.0f});
+	Place("data/models/crate.dae", {1.4f, 0.0f, 1.4f});
+	AddRoom({-2.0f, 0.0f, -2.0f}, {2.0f, 3.0f, 2.0f});
+	Zeph::PointLightData light;
+	light.myPosition = Vector3<float>(1.6f, 1.0f, 0.0f);
+	light.myFalloff = 1.5f;
+	light.myColor = Vector4<float>(10.0f, 2.0f, 2.0f, 1.0f);
+	myPointLights.push_back(light);
+	mySpotLights.push_back(SpotDown({-1.5f, 2.8f, -1.5f}, 3.0f, 0.9f, 0.8f));
+
+	const int culledBefore = Renderer().GetRTC().GetCulledInstanceCount();
+	const std::string culled = myScratch.File("culled/ambient.sh");
+	Bake(culled, 2);
+	EXPECT_GT(Renderer().GetRTC().GetCulledInstanceCount(), culledBefore) << "the crate is behind some faces";
+	EXPECT_FALSE(Renderer().GetRTC().GetViewCullingFlag()) << "the frame draws everything again";
+
+	Renderer().SetProbeCullingFlag(false);
+	const int culledAfter = Renderer().GetRTC().GetCulledInstanceCount();
+	const std::string everything = myScratch.File("everything/ambient.sh");
+	Bake(everything, 2);
+	Renderer().SetProbeCullingFlag(true);
+	EXPECT_EQ(Renderer().GetRTC().GetCulledInstanceCount(), culledAfter);
+	const std::string bytes = TestSupport::ReadWholeFile(culled);
+	ASSERT_FALSE(bytes.empty());
+	EXPECT_TRUE(bytes == TestSupport::ReadWholeFile(everything)) << "culling changed the volume";
+}
+
+namespace
+{
+// A 4 x 4 DDS of one colour.
+void WriteFlatTexture(const std::string& aPath, uint8_t aRed, uint8_t aGreen, uint8_t aBlue)
+{
+	Dds::ImageInfo info;
+	info.myWidth = info.myHeight = 4;
+	info.myFormat = Dds::Format::R8G8B8A8_UNORM;
+	Dds::Image image;
+	std::string error;
+	ASSERT_TRUE(image.Init(info, error)) << error;
+	for (size_t texel = 0; texel < image.Bytes().size(); texel += 4)
+	{
+		image.Bytes()[texel] = aRed;
+		image.Bytes()[texel + 1] = aGreen;
+		image.Bytes()[texel + 2] = aBlue;
+		image.Bytes()[texel + 3] = 255;
+	}
+	ASSERT_TRUE(Dds::SaveToFile(aPath, image, error)) << error;
+}
+} // namespace
+
+TEST_F(AmbientBakeTest, AClosedRoomOfUniformRadianceGivesTheSameAmbientForEveryNormal)
+{
+	if (!Start(0))
+	{
+		return;
+	}
+	// The crate with flat textures (grey albedo, flat normal, full roughness, no
+	// occlusion), mirrored through its centre and scaled to a 4-unit room around the
+	// probe, so its faces look inwards. Glowing and unlit, every wall sends the same
+	// radiance to the probe.
+	std::ifstream in("data/models/crate.dae");
+	ASSERT_TRUE(in.good()) << "run from the repository root";
+	std::stringstream text;
+	text << in.rdbuf();
+	std::string document = text.str();
+	const std::string prefix = "data/textures/wood_";
+	for (size_t at = document.find(prefix); at != std::string::npos; at = document.find(prefix, at))
+	{
+		document.replace(at, prefix.size(), myScratch.File("flat_"));
+	}
+	WriteFlatTexture(myScratch.File("flat_albedo.dds"), 128, 128, 128);
+	WriteFlatTexture(myScratch.File("flat_normal.dds"), 128, 128, 255);
+	WriteFlatTexture(myScratch.File("flat_roughness.dds"), 255, 255, 255);
+	WriteFlatTexture(myScratch.File("flat_ao.dds"), 255, 255, 255);
+	const std::string model = myScratch.File("glowing_box.dae");
+	TestSupport::WriteWholeFile(model, document);
+	Place(model.c_str(), {0.0f, 0.0f, 0.0f});
+	ASSERT_FALSE(HasFatalFailure());
+	Matrix44<float> mirror;
+	for (const int diagonal : {0, 5, 10})
+	{
+		mirror.myMatrix[diagonal] = -4.4f;
+	}
+	mirror.SetPosition(Vector3<float>(0.0f, 3.96f, 0.0f)); // the crate's floor (y = 0) becomes the ceiling
+	myInstances.back()->SetOrientation(mirror);
+	Matrix44<float> local;
+	const Zeph::Model* box = Zeph::RenderTargetHelper::FindFirstModel(
+	    Zeph::Engine::GetInstance()->GetModelFactory().GetModel(model), local);
+	ASSERT_NE(box, nullptr);
+	ASSERT_NE(box->GetEffect(), nullptr);
+	ASSERT_TRUE(box->GetEffect()->GetEffect()->GetVariableByName("EmissiveAmount")->SetFloat(0.25f));
+	// One probe, at (0, 2, 0), the middle of the room.
+	AddRoom({-1.0f, 1.0f, -1.0f}, {1.0f, 3.0f, 1.0f});
+	const std::string path = myScratch.File("uniform/ambient.sh");
+	Bake(path, 1);
+	Zeph::AmbientVolume volume;
+	std::string problem;
+	ASSERT_EQ(Zeph::ReadAmbientVolume(path, volume, problem), Zeph::AmbientVolumeRead::OK) << problem;
+	ASSERT_EQ(volume.myCounts[0] * volume.myCounts[1] * volume.myCounts[2], 1);
+
+	// The stored vectors give irradiance / pi = the walls' radiance for every normal:
+	// albedo 128 (0.216 once decoded from sRGB) x emissive 0.25 x the multiplier 2. Up to
+	// the packing: a zero coefficient is stored as 127 (decoded -1/255), which by itself
+	// moves the sum by -13.1e-3 to +7.8e-3 over all normals; one step of 1/255 more is
+	// left for the capture.
+	const float albedo = std::pow((128.0f / 255.0f + 0.055f) / 1.055f, 2.4f);
+	const float radiance = albedo * 0.25f * 2.0f;
+	for (int x = -1; x <= 1; ++x)
+	{
+		for (int y = -1; y <= 1; ++y)
+		{
+			for (int z = -1; z <= 1; ++z)
+			{
+				if (x == 0 && y == 0 && z == 0)
+				{
+					continue;
+				}
+				const float length = std::sqrt(static_cast<float>(x * x + y * y + z * z));
+				const Vector3<float> normal(x / length, y / length, z / length);
+				const float value = RedIrradiance(volume, 0, normal);
+				EXPECT_GE(value, radiance - 13.1e-3f - 1.0f / 255.0f) << x << " " << y << " " << z;
+				EXPECT_LE(value, radiance + 7.8e-3f + 1.0f / 255.0f) << x << " " << y << " " << z;
 			}
 		}
 	}

@@ -126,22 +126,33 @@ bool Context::SetRenderTargets(std::span<RenderTargetView* const> someColorViews
 
 void Context::ClearRenderTargetView(const RenderTargetView& aView, const float aColor[4])
 {
-	RenderTargetView* const views[] = {const_cast<RenderTargetView*>(&aView)};
-	const GLuint framebuffer = myFramebufferCache.Get(views, nullptr);
+	// A view attached to the bound framebuffer is cleared there: clearing through
+	// another framebuffer would make a software rasterizer end its scene twice.
+	const GLuint bound = myStateCache.GetDrawFramebuffer();
+	const int boundSlot = myFramebufferCache.FindColorSlot(bound, aView.GetUniqueId());
+	GLuint framebuffer = bound;
+	if (boundSlot < 0)
+	{
+		RenderTargetView* const views[] = {const_cast<RenderTargetView*>(&aView)};
+		framebuffer = myFramebufferCache.Get(views, nullptr);
+	}
 	if (framebuffer == 0)
 	{
 		return;
 	}
 	myStateCache.SetColorWriteMask(ColorWrite::All);
 	myStateCache.SetScissorTestFlag(false);
-	glClearNamedFramebufferfv(framebuffer, GL_COLOR, 0, aColor);
+	glClearNamedFramebufferfv(framebuffer, GL_COLOR, std::max(boundSlot, 0), aColor);
 	LUMORA_GL_CHECK("Gpu::Context::ClearRenderTargetView");
 }
 
 void Context::ClearDepthStencilView(const DepthStencilView& aView, bool aDepthFlag, bool aStencilFlag,
                                     float aDepth, int aStencil)
 {
-	const GLuint framebuffer = myFramebufferCache.Get({}, &aView);
+	const GLuint bound = myStateCache.GetDrawFramebuffer();
+	const GLuint framebuffer = myFramebufferCache.HasDepthView(bound, aView.GetUniqueId())
+	                               ? bound
+	                               : myFramebufferCache.Get({}, &aView);
 	if (framebuffer == 0)
 	{
 		return;

@@ -36,6 +36,39 @@ void FramebufferCache::Destroy()
 	myEntries.clear();
 }
 
+const FramebufferCache::Entry* FramebufferCache::FindEntry(GLuint aFramebuffer) const
+{
+	if (aFramebuffer == 0)
+	{
+		return nullptr;
+	}
+	const auto found = std::find_if(myEntries.begin(), myEntries.end(), [aFramebuffer](const Entry& anEntry) {
+		return anEntry.myFramebuffer == aFramebuffer;
+	});
+	return found != myEntries.end() ? &*found : nullptr;
+}
+
+int FramebufferCache::FindColorSlot(GLuint aFramebuffer, uint64_t aViewId) const
+{
+	if (const Entry* entry = FindEntry(aFramebuffer); entry != nullptr && aViewId != 0)
+	{
+		for (int slot = 0; slot < ourMaxColorTargets; ++slot)
+		{
+			if (entry->myKey.myColorIds[static_cast<size_t>(slot)] == aViewId)
+			{
+				return slot;
+			}
+		}
+	}
+	return -1;
+}
+
+bool FramebufferCache::HasDepthView(GLuint aFramebuffer, uint64_t aViewId) const
+{
+	const Entry* entry = FindEntry(aFramebuffer);
+	return entry != nullptr && aViewId != 0 && entry->myKey.myDepthId == aViewId;
+}
+
 GLuint FramebufferCache::Get(std::span<RenderTargetView* const> someColorViews,
                              const DepthStencilView* aDepthView)
 {

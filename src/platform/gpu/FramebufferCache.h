@@ -35,6 +35,10 @@ public:
 	// 0, reported, when the combination is not complete.
 	GLuint Get(std::span<RenderTargetView* const> someColorViews, const DepthStencilView* aDepthView);
 	void ForgetView(uint64_t aUniqueId);
+	// The colour slot of aFramebuffer that holds the view, or -1.
+	int FindColorSlot(GLuint aFramebuffer, uint64_t aViewId) const;
+	// Whether aFramebuffer's depth attachment is the view.
+	bool HasDepthView(GLuint aFramebuffer, uint64_t aViewId) const;
 	size_t GetEntryCount() const { return myEntries.size(); }
 
 private:
@@ -51,6 +55,7 @@ private:
 		GLuint myFramebuffer = 0;
 	};
 
+	const Entry* FindEntry(GLuint aFramebuffer) const;
 	GLuint Create(std::span<RenderTargetView* const> someColorViews, const DepthStencilView* aDepthView);
 	void Delete(GLuint aFramebuffer);
 
