@@ -1,11 +1,12 @@
-// The facade's ambient bake on the small sample level: what it writes, what the
-// editor shows afterwards, and its handshake with a render loop that keeps running
-// and a third thread that polls the progress.
+// The facade's bakes: the ambient bake on the small sample level, what it writes and
+// what the editor shows afterwards; both bakes' handshake with a render loop that
+// keeps running and a third thread that polls the progress.
 #include <algorithm>
 #include <atomic>
 #include <chrono>
 #include <cmath>
 #include <filesystem>
+#include <functional>
 #include <gtest/gtest.h>
 #include <thread>
 #include <vector>
@@ -16,6 +17,7 @@
 #include "renderer/AmbientVolumeFile.h"
 #include "renderer/ProbeHelper.h"
 #include "renderer/Renderer.h"
+#include "support/TestSupport.h"
 
 namespace
 {
@@ -98,11 +100,22 @@ TEST_F(BakeCommandTest, AmbientBakeWritesTheVolumeKeepsTheModeAndTheEditorShowsI
 	Facade().Render();
 }
 
-TEST_F(BakeCommandTest, ABakeHoldsOffTheRenderLoopAndItsProgressNeverGoesBack)
+namespace
 {
-	Facade().ParseLevel(u"sample_small");
+// The progress a third thread saw, with the frames drawn so far.
+struct ProgressSample
+{
+	int myProgress;
+	int myFrames;
+};
+
+// Runs aBake on this (the user-interface) thread while a render loop draws without
+// pause on a second thread and a third polls the progress every millisecond.
+std::vector<ProgressSample> BakeWhileTheLoopRuns(Lumora::LumoraWrapper& aFacade,
+                                                 const std::function<void()>& aBake)
+{
 	std::atomic<int> frames{0};
-	Facade().SetFrameObserver([&](const Lumora::LumoraWrapper&) { frames.fetch_add(1); });
+	aFacade.SetFrameObserver([&](const Lumora::LumoraWrapper&) { frames.fetch_add(1); });
 	std::atomic<bool> stop{false};
 	std::thread renderLoop([&] {
 		Lumora::LumoraWrapper* facade = Lumora::LumoraWrapper::GetInstance();
@@ -112,27 +125,19 @@ TEST_F(BakeCommandTest, ABakeHoldsOffTheRenderLoopAndItsProgressNeverGoesBack)
 			facade->Render();
 		}
 	});
-	// A third thread polls the progress and notes how many frames had been drawn.
-	struct Sample
-	{
-		int myProgress;
-		int myFrames;
-	};
-	std::vector<Sample> samples;
+	std::vector<ProgressSample> samples;
 	std::thread poller([&] {
 		while (!stop.load())
 		{
-			const int progress = Lumora::LumoraWrapper::GetInstance()->GetBakeProgress();
-			samples.push_back({progress, frames.load()});
+			samples.push_back({Lumora::LumoraWrapper::GetInstance()->GetBakeProgress(), frames.load()});
 			std::this_thread::sleep_for(std::chrono::milliseconds(1));
 		}
 	});
-	// Let the loop draw, then bake from this (the user-interface) thread.
 	while (frames.load() < 2)
 	{
 		std::this_thread::sleep_for(std::chrono::milliseconds(1));
 	}
-	Facade().BakeAmbient(u"sample_small", 2, false);
+	aBake();
 	const int framesAfterBake = frames.load();
 	while (frames.load() < framesAfterBake + 2)
 	{
@@ -141,33 +146,85 @@ TEST_F(BakeCommandTest, ABakeHoldsOffTheRenderLoopAndItsProgressNeverGoesBack)
 	stop = true;
 	renderLoop.join();
 	poller.join();
+	aFacade.SetFrameObserver({});
+	return samples;
+}
 
-	ASSERT_FALSE(samples.empty());
-	const int finalProgress = Facade().GetBakeProgress();
-	EXPECT_GT(finalProgress, 0);
-	EXPECT_EQ(samples.back().myProgress, finalProgress);
-	// While the bake runs (from its first progress until it reaches its final value) it
-	// holds the facade: every frame step returns at once, so the frame count stands still.
-	// (The small level's rooms leave some grid cells unvisited, so the final value is
-	// below 100 and stays after the bake.)
+// The progress never goes back, and while the bake runs (from its first progress until
+// it reaches its final value) it holds the facade: every frame step returns at once,
+// so the frame count stands still.
+void ExpectTheBakeHeldTheLoop(const std::vector<ProgressSample>& someSamples, int aFinalProgress)
+{
+	ASSERT_FALSE(someSamples.empty());
+	EXPECT_EQ(someSamples.back().myProgress, aFinalProgress);
 	int framesInBake = -1;
 	int samplesInBake = 0;
-	for (size_t index = 0; index < samples.size(); ++index)
+	for (size_t index = 0; index < someSamples.size(); ++index)
 	{
 		if (index > 0)
 		{
-			ASSERT_LE(samples[index - 1].myProgress, samples[index].myProgress) << "progress went back";
+			ASSERT_LE(someSamples[index - 1].myProgress, someSamples[index].myProgress)
+			    << "progress went back";
 		}
-		if (samples[index].myProgress > 0 && samples[index].myProgress < finalProgress)
+		if (someSamples[index].myProgress > 0 && someSamples[index].myProgress < aFinalProgress)
 		{
 			++samplesInBake;
 			if (framesInBake < 0)
 			{
-				framesInBake = samples[index].myFrames;
+				framesInBake = someSamples[index].myFrames;
 			}
-			EXPECT_EQ(samples[index].myFrames, framesInBake) << "a frame ran during the bake";
+			EXPECT_EQ(someSamples[index].myFrames, framesInBake) << "a frame ran during the bake";
 		}
 	}
 	EXPECT_GT(samplesInBake, 0) << "the poller never saw the bake running";
+}
+} // namespace
+
+TEST_F(BakeCommandTest, AnAmbientBakeHoldsOffTheRenderLoopAndItsProgressNeverGoesBack)
+{
+	Facade().ParseLevel(u"sample_small");
+	const std::vector<ProgressSample> samples =
+	    BakeWhileTheLoopRuns(Facade(), [this] { Facade().BakeAmbient(u"sample_small", 2, false); });
+	// The small level's rooms leave some grid cells unvisited, so the final value is
+	// below 100 and stays after the bake.
+	const int finalProgress = Facade().GetBakeProgress();
+	EXPECT_GT(finalProgress, 0);
+	ExpectTheBakeHeldTheLoop(samples, finalProgress);
+	EXPECT_FALSE(Facade().IsBusy());
+}
+
+TEST_F(BakeCommandTest, AReflectionBakeOfThreeRoomsHoldsOffTheRenderLoopAndReportsEachRoom)
+{
+	// The small level with three rooms in a row.
+	namespace fs = std::filesystem;
+	const fs::path level = ScratchPath() / "data/XML/levels/three_rooms";
+	fs::copy(ScratchPath() / "data/XML/levels/sample_small", level, fs::copy_options::recursive);
+	fs::remove(level / "ambient.sh");
+	TestSupport::WriteWholeFile((level / "rooms.xml").string(), R"(<root>
+    <rooms>
+        <room><min x="-3" y="0" z="-4" /><max x="3" y="3" z="4" /><id value="west" /></room>
+        <room><min x="3" y="0" z="-4" /><max x="9" y="3" z="4" /><id value="middle" /></room>
+        <room><min x="9" y="0" z="-4" /><max x="15" y="3" z="4" /><id value="east" /></room>
+    </rooms>
+</root>
+)");
+	Facade().ParseLevel(u"three_rooms");
+	ASSERT_EQ(myFacadeRooms().Count(), 3);
+	const std::vector<ProgressSample> samples =
+	    BakeWhileTheLoopRuns(Facade(), [this] { Facade().BakeSpecular(u"three_rooms"); });
+	EXPECT_EQ(Facade().GetBakeProgress(), 100);
+	ExpectTheBakeHeldTheLoop(samples, 100);
+	for (const ProgressSample& sample : samples)
+	{
+		EXPECT_TRUE(sample.myProgress == 0 || sample.myProgress == 33 || sample.myProgress == 66 ||
+		            sample.myProgress == 100)
+		    << sample.myProgress;
+	}
+	for (const char* room : {"west", "middle", "east"})
+	{
+		EXPECT_TRUE(
+		    fs::is_regular_file(ScratchPath() / "data/Cubemaps/three_rooms" / (std::string(room) + ".dds")))
+		    << room;
+	}
 	EXPECT_FALSE(Facade().IsBusy());
 }

@@ -2,7 +2,8 @@
 // The fixture for tests that drive the editor facade headless. The facade writes
 // "DebugLogger.txt" into the working directory and reads data/ from it, so each test
 // runs in its own scratch directory: data/ there holds links to the repository's data
-// folders, except data/XML, which is a copy (tests may write level files into it).
+// folders, except data/XML, which is a copy (tests may write level files into it), and
+// data/Cubemaps, a folder of links to the shipped files that bakes may write beside.
 // The facade is created at 160 x 90 without a window; where no OpenGL 4.5 context can
 // be made the test is skipped, except under CI=true. The facade's log makes severe and
 // critical reports fatal, so a test that provokes one ends the process: tests assert
@@ -121,6 +122,19 @@ private:
 			if (name == "XML")
 			{
 				fs::copy(entry.path(), data / "XML", fs::copy_options::recursive);
+			}
+			else if (name == "Cubemaps")
+			{
+				// Bakes write their cubemaps here: a folder of its own, with links to the
+				// shipped files.
+				fs::create_directory(data / name);
+				for (const fs::directory_entry& file : fs::directory_iterator(entry.path()))
+				{
+					if (file.is_regular_file())
+					{
+						fs::create_symlink(file.path(), data / name / file.path().filename());
+					}
+				}
 			}
 			else
 			{
