@@ -2,10 +2,13 @@
 // one iteration is one whole bake (1, 2 or 3 bounces), with the probes read back in
 // batches, one cube at a time or one face at a time. Counters: probes rendered and
 // projected per second (a probe is six 32 x 32 deferred faces, one read-back of the
-// cube and its SH projection) and the probe count. Writes the level's ambient.sh in
+// cube and its SH projection), the probe count, and milliseconds per probe spent
+// submitting the captures, reading them back and projecting them. Writes the level's ambient.sh in
 // the working directory's data/ (run from the repository root, or a copy of it).
 
 #include <benchmark/benchmark.h>
+
+#include <algorithm>
 
 #include "editor/LumoraWrapper.h"
 #include "engine/Engine.h"
@@ -33,11 +36,21 @@ void BM_AmbientBake(benchmark::State& aState)
 	}
 	Zeph::Engine::GetInstance()->GetRenderer().SetProbeReadback(readback);
 	long long probes = 0;
+	Zeph::Renderer::BakeTimings timings;
 	for (auto _ : aState)
 	{
 		editor.BakeAmbient(u"sample_large", bounces, false);
-		probes += Zeph::Engine::GetInstance()->GetRenderer().GetBakedProbeCount();
+		const Zeph::Renderer& renderer = Zeph::Engine::GetInstance()->GetRenderer();
+		probes += renderer.GetBakedProbeCount();
+		timings.myRendering += renderer.GetBakeTimings().myRendering;
+		timings.myReadback += renderer.GetBakeTimings().myReadback;
+		timings.myProjection += renderer.GetBakeTimings().myProjection;
 	}
+	// Milliseconds per probe in each part of the bake.
+	const double perProbe = 1000.0 / static_cast<double>(std::max(probes, 1LL));
+	aState.counters["render_ms"] = timings.myRendering * perProbe;
+	aState.counters["readback_ms"] = timings.myReadback * perProbe;
+	aState.counters["project_ms"] = timings.myProjection * perProbe;
 	aState.counters["probes/s"] =
 	    benchmark::Counter(static_cast<double>(probes), benchmark::Counter::kIsRate);
 	aState.counters["probes"] = static_cast<double>(probes) / static_cast<double>(aState.iterations());

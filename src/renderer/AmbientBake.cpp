@@ -4,6 +4,7 @@
 #include "renderer/Renderer.h"
 
 #include <algorithm>
+#include <chrono>
 #include <cmath>
 #include <cstring>
 #include <string>
@@ -28,6 +29,22 @@ namespace Zeph
 namespace
 {
 constexpr float ourProbeSpacing = 2.0f;
+
+// Seconds since the last lap (or since it was made).
+class Stopwatch
+{
+public:
+	double Lap()
+	{
+		const auto now = std::chrono::steady_clock::now();
+		const double seconds = std::chrono::duration<double>(now - myStart).count();
+		myStart = now;
+		return seconds;
+	}
+
+private:
+	std::chrono::steady_clock::time_point myStart = std::chrono::steady_clock::now();
+};
 
 // The SH constants of the irradiance packing, with sqrt(pi) of the single-precision pi.
 struct ShConstants
@@ -111,15 +128,21 @@ public:
 	}
 
 	// One read-back and projection for every cube gathered; their cells' vectors stored.
-	bool Flush(Gpu::Context& aContext, std::vector<uint32_t>* someBlocks)
+	bool Flush(std::vector<uint32_t>* someBlocks, Renderer::BakeTimings& someTimings)
 	{
 		if (myCells.empty())
 		{
 			return true;
 		}
 		std::vector<float> coefficients(myCells.size() * Sh::ourCubeCoefficientCount);
-		const bool projected = Sh::ProjectCubeAtlas(aContext, myTexture, myFaceSize,
-		                                            static_cast<int>(myCells.size()), coefficients.data());
+		Stopwatch watch;
+		const bool read = Gpu::ReadTexture(myTexture, 0, 0, 1, myTexels);
+		someTimings.myReadback += watch.Lap();
+		const bool projected =
+		    read &&
+		    Sh::ProjectCubeAtlas(myTexels.data(), myTexture.GetMipWidth(0), myTexture.GetMipHeight(0), 4,
+		                         myFaceSize, static_cast<int>(myCells.size()), coefficients.data());
+		someTimings.myProjection += watch.Lap();
 		if (projected)
 		{
 			for (size_t index = 0; index < myCells.size(); ++index)
@@ -137,6 +160,7 @@ private:
 	Gpu::Texture myTexture;
 	int myFaceSize = 0;
 	std::vector<size_t> myCells;
+	std::vector<float> myTexels;
 };
 
 bool StrictlyInsideAnyRoom(const GrowingArray<Room*>& someRooms, const Vector3<float>& aPoint)
@@ -222,6 +246,7 @@ void Renderer::GenerateSH(const GrowingArray<Room*>& someRooms, const std::strin
 	myBakingProgressCounter = 0;
 	myBakingProgress = 0;
 	myBakedProbeCount = 0;
+	myBakeTimings = BakeTimings();
 	// Without rooms (or with rooms of no extent) there is no grid: nothing is baked and
 	// no file is written; the volume stays empty.
 	if (counts[0] <= 0 || counts[1] <= 0 || counts[2] <= 0 || counts[0] > AmbientVolume::ourMaxCount ||
@@ -246,7 +271,7 @@ void Renderer::GenerateSH(const GrowingArray<Room*>& someRooms, const std::strin
 	const bool batchedFlag =
 	    myProbeReadback == ProbeReadback::BATCHED && atlas.Init(context, cube->GetSize());
 	const auto flush = [&] {
-		if (!atlas.Flush(context, blocks))
+		if (!atlas.Flush(blocks, myBakeTimings))
 		{
 			ReportCritical(1154, "Zeph::Renderer::AddScalars", "FAILED TO REFRESH CUBEMAP");
 		}
@@ -268,10 +293,12 @@ void Renderer::GenerateSH(const GrowingArray<Room*>& someRooms, const std::strin
 					const size_t cell = static_cast<size_t>((iz * counts[1] + iy) * counts[0] + ix);
 					if (StrictlyInsideAnyRoom(someRooms, probe))
 					{
+						Stopwatch watch;
 						for (int face = 0; face < 6; ++face)
 						{
 							RenderProbeFace(*cube, face, probe, gbuffer, false);
 						}
+						myBakeTimings.myRendering += watch.Lap();
 						if (aDebugFlag)
 						{
 							SaveProbeCapture(*cube, "data/cubemaps/sh debug/" + std::to_string(cell) +
@@ -281,6 +308,7 @@ void Renderer::GenerateSH(const GrowingArray<Room*>& someRooms, const std::strin
 						if (batchedFlag && cube->GetTexture() != nullptr &&
 						    atlas.Add(context, *cube->GetTexture(), cell))
 						{
+							myBakeTimings.myRendering += watch.Lap();
 							if (atlas.IsFull())
 							{
 								flush();
@@ -337,25 +365,27 @@ void Renderer::AddScalars(DynamicCubemap& aCube, std::vector<uint32_t>* someBloc
 	float green[Sh::ourCoefficientCount];
 	float blue[Sh::ourCoefficientCount];
 	const Gpu::Texture* texture = aCube.GetTexture();
-	bool projected = false;
-	if (texture != nullptr && myProbeReadback == ProbeReadback::PER_FACE)
+	std::vector<float> cubeTexels;
+	bool read = texture != nullptr;
+	Stopwatch watch;
+	if (read && myProbeReadback == ProbeReadback::PER_FACE)
 	{
 		// Each face read back alone, then the cube projected as a whole.
-		std::vector<float> cubeTexels;
 		std::vector<float> faceTexels;
-		projected = true;
-		for (int face = 0; face < 6 && projected; ++face)
+		for (int face = 0; face < 6 && read; ++face)
 		{
-			projected = Gpu::ReadTexture(*texture, 0, face, 1, faceTexels);
+			read = Gpu::ReadTexture(*texture, 0, face, 1, faceTexels);
 			cubeTexels.insert(cubeTexels.end(), faceTexels.begin(), faceTexels.end());
 		}
-		projected = projected &&
-		            Sh::ProjectCubeTexels(cubeTexels.data(), texture->GetMipWidth(0), 4, red, green, blue);
 	}
-	else if (texture != nullptr)
+	else if (read)
 	{
-		projected = Sh::ProjectCubeMap(Engine::GetInstance()->GetContext(), 3, *texture, red, green, blue);
+		read = Gpu::ReadTexture(*texture, 0, 0, 6, cubeTexels);
 	}
+	myBakeTimings.myReadback += watch.Lap();
+	const bool projected =
+	    read && Sh::ProjectCubeTexels(cubeTexels.data(), texture->GetMipWidth(0), 4, red, green, blue);
+	myBakeTimings.myProjection += watch.Lap();
 	if (!projected)
 	{
 		ReportCritical(1154, "Zeph::Renderer::AddScalars", "FAILED TO REFRESH CUBEMAP");

@@ -164,6 +164,16 @@ public:
 	// Probe captures skip instances and lights outside each face's view (the default);
 	// off, they draw everything, with the same result.
 	void SetProbeCullingFlag(bool aFlag) { myProbeCullingFlag = aFlag; }
+	// Where the last ambient bake spent its time, in seconds: submitting the probe
+	// captures, reading them back (on a software rasterizer this waits for the
+	// drawing too) and projecting them onto SH.
+	struct BakeTimings
+	{
+		double myRendering = 0.0;
+		double myReadback = 0.0;
+		double myProjection = 0.0;
+	};
+	const BakeTimings& GetBakeTimings() const { return myBakeTimings; }
 	// Probe cubemaps the last ambient bake rendered and projected, over all bounces.
 	long long GetBakedProbeCount() const { return myBakedProbeCount; }
 	bool IsSHLoaded() const { return mySHLoadedFlag; }
@@ -238,6 +248,7 @@ private:
 	long long myBakingProgressCounter = 0;
 	long long myBakedProbeCount = 0;
 	ProbeReadback myProbeReadback = ProbeReadback::BATCHED;
+	BakeTimings myBakeTimings;
 	bool myProbeCullingFlag = true;
 	bool mySHLoadedFlag = false;
 	std::unique_ptr<ProbeHelper> myProbeHelper;
