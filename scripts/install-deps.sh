@@ -10,6 +10,8 @@ PACKAGES=(
 	libgcc-12-dev
 	# XML files
 	libtinyxml-dev
+	# the command line tool's argument parsing
+	libcli11-dev
 	# tests and benchmarks
 	googletest libgtest-dev libbenchmark-dev
 	# the libFuzzer build of the file readers (cmake -DLUMORA_FUZZ=ON with clang)

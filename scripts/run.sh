@@ -1,9 +1,10 @@
 #!/usr/bin/env bash
 # The main job: sets up, builds and runs the lumora tool from the repository root.
 # With no arguments it reports the build and the GPU, renders a frame of the demo scene
-# through the engine headless to out/demo-frame.png, and loads the larger sample level
-# through the editor facade, bakes its ambient light (2 bounces) and renders it to
-# out/level-frame.png.
+# through the engine headless to out/demo-frame.png, bakes the larger sample level's
+# lighting (the ambient volume with 2 bounces, and every room's reflection cubemap) and
+# renders the level to out/level-frame.png. With arguments it runs lumora with them
+# (lumora --help lists the commands).
 set -euo pipefail
 cd "$(dirname "$0")/.."
 
@@ -13,5 +14,7 @@ if [ $# -gt 0 ]; then
 	exec ./build/tools/lumora/lumora "$@"
 fi
 ./build/tools/lumora/lumora
-./build/tools/lumora/lumora --demo-frame out/demo-frame.png
-./build/tools/lumora/lumora --level-frame sample_large out/level-frame.png --bake-bounces 2
+mkdir -p out
+./build/tools/lumora/lumora demo --out out/demo-frame.png
+./build/tools/lumora/lumora bake sample_large --bounces 2
+./build/tools/lumora/lumora render sample_large --out out/level-frame.png

@@ -29,8 +29,9 @@ LumoraWrapper* LumoraWrapper::ourInstance = nullptr;
 namespace
 {
 constexpr auto ourPollInterval = std::chrono::milliseconds(1);
-// Severe and critical errors end the process.
-constexpr unsigned long ourFatalLevels = 12;
+// Severe and critical errors end the process unless the front end chose otherwise.
+constexpr unsigned long ourDefaultFatalLevels = 12;
+std::bitset<4> ourFatalLevels(ourDefaultFatalLevels);
 
 Zeph::Engine* EngineOrNull()
 {
@@ -40,7 +41,7 @@ Zeph::Engine* EngineOrNull()
 
 bool LumoraWrapper::Create(uint64_t aHwnd, int aWidth, int aHeight)
 {
-	if (!Debug::Create("DebugLogger.txt", std::bitset<4>(ourFatalLevels)))
+	if (!Debug::Create("DebugLogger.txt", ourFatalLevels))
 	{
 		return false;
 	}
@@ -68,6 +69,11 @@ bool LumoraWrapper::Create(uint64_t aHwnd, int aWidth, int aHeight)
 	// The creating thread lets the context go: the first frame step or claim takes it.
 	Zeph::Engine::GetInstance()->ReleaseContext();
 	return true;
+}
+
+void LumoraWrapper::SetFatalReportLevels(std::bitset<4> someLevels)
+{
+	ourFatalLevels = someLevels;
 }
 
 void LumoraWrapper::ShutDown()
@@ -462,6 +468,16 @@ void LumoraWrapper::YawCamera(float aYaw)
 {
 	Claim();
 	myCameraInstance->Yaw(aYaw);
+	Release();
+}
+
+void LumoraWrapper::PlaceCamera(const Vector3<float>& aPosition, float aYaw, float aPitch)
+{
+	Matrix44<float> orientation =
+	    Matrix44<float>::CreateRotateAroundX(-aPitch) * Matrix44<float>::CreateRotateAroundY(aYaw);
+	orientation.SetPosition(aPosition);
+	Claim();
+	myCameraInstance->SetOrientation(orientation);
 	Release();
 }
 

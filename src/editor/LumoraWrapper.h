@@ -24,6 +24,7 @@
 //
 // Strings from the front end are UTF-16; the engine's strings are UTF-8.
 #include <atomic>
+#include <bitset>
 #include <functional>
 #include <map>
 #include <memory>
@@ -65,6 +66,10 @@ public:
 	static bool Create(uint64_t aHwnd, int aWidth, int aHeight);
 	static LumoraWrapper* GetInstance() { return ourInstance; }
 	static void ShutDown();
+	// The log levels (bit 0 debug .. bit 3 critical) whose reports end the process, for
+	// the next Create: severe and critical by default. A tool that lists a level's
+	// problems turns them all off and listens to the log instead.
+	static void SetFatalReportLevels(std::bitset<4> someLevels);
 	void Update(float someElapsedTime);
 	void Render();
 
@@ -75,6 +80,10 @@ public:
 	void PitchCamera(float aPitch);
 	void YawCamera(float aYaw);
 	void Zoom(float aZoom);
+	// Puts the camera at a position, turned by aYaw about the world's up, then tilted by
+	// aPitch about its own right axis (radians; positive looks down): for tools and
+	// front ends that restore a saved view.
+	void PlaceCamera(const Vector3<float>& aPosition, float aYaw, float aPitch);
 	void Strafe(float aStrafe);
 
 	// Picking and selection.

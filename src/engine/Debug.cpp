@@ -10,6 +10,7 @@
 #include "platform/stacktrace/StackTrace.h"
 
 Debug* Debug::ourInstance = nullptr;
+Debug::ReportListener Debug::ourListener;
 
 namespace
 {
@@ -108,6 +109,11 @@ std::string FrameLine(const StackTrace::Frame& aFrame)
 }
 } // namespace
 
+void Debug::SetReportListener(ReportListener aListener)
+{
+	ourListener = std::move(aListener);
+}
+
 bool Debug::Create(std::string aFileName, std::bitset<4> someAssertLevels)
 {
 	if (ourInstance != nullptr)
@@ -202,6 +208,10 @@ void Debug::Report(AssertLevels aLevel, int aLine, const char* aFunctionName, co
 	std::memset(message, 0, sizeof(message));
 	std::vsnprintf(message, sizeof(message), OrEmpty(aFormat), someArguments);
 	WriteEntry(ourTags[aLevel], aLine, aFunctionName, message);
+	if (ourListener)
+	{
+		ourListener(aLevel, aLine, OrEmpty(aFunctionName), message);
+	}
 	if (myAssertLevels.test(aLevel))
 	{
 		FatalReport(&myFile, aLine, aFunctionName, ourAssertTexts[aLevel]);

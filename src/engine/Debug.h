@@ -11,6 +11,7 @@
 
 #include <bitset>
 #include <cstdarg>
+#include <functional>
 #include <string>
 
 #include "engine/FI_File.h"
@@ -26,9 +27,15 @@ public:
 		CRITICAL_ERROR_MESSAGE = 3,
 	};
 
+	// Sees every report after it is logged and before a fatal one ends the process:
+	// level, line, function and the formatted message. For tools that list problems.
+	using ReportListener = std::function<void(AssertLevels, int, const char*, const char*)>;
+
 	static bool Create(std::string aFileName, std::bitset<4> someAssertLevels);
 	static bool Destroy();
 	static Debug* GetInstance();
+	// Process-wide, kept across Create and Destroy; an empty listener removes it.
+	static void SetReportListener(ReportListener aListener);
 
 	void DebugMessage(int aLine, const char* aFunctionName, const char* aFormat, ...)
 	    __attribute__((format(printf, 4, 5)));
@@ -62,4 +69,5 @@ private:
 	std::bitset<4> myAssertLevels;
 
 	static Debug* ourInstance;
+	static ReportListener ourListener;
 };

@@ -122,6 +122,11 @@ private:
 			if (name == "XML")
 			{
 				fs::copy(entry.path(), data / "XML", fs::copy_options::recursive);
+				// Tests start from unbaked levels, whatever was baked in the checkout.
+				for (const fs::directory_entry& level : fs::directory_iterator(data / "XML/levels"))
+				{
+					fs::remove(level.path() / "ambient.sh");
+				}
 			}
 			else if (name == "Cubemaps")
 			{

@@ -10,8 +10,6 @@
 
 namespace TestSupport
 {
-namespace
-{
 bool ReadPng(const std::string& aPath, int& aWidth, int& aHeight, std::vector<uint8_t>& someRgba)
 {
 	png_image image{};
@@ -31,7 +29,6 @@ bool ReadPng(const std::string& aPath, int& aWidth, int& aHeight, std::vector<ui
 	aHeight = static_cast<int>(image.height);
 	return true;
 }
-} // namespace
 
 std::string CompareWithGolden(const std::string& aName, int aWidth, int aHeight,
                               const std::vector<uint8_t>& someRgba, const GoldenTolerance& aTolerance)

@@ -17,6 +17,9 @@ struct GoldenTolerance
 	double myPixelFraction = 0.001;
 };
 
+// An RGBA PNG's pixels; false when it cannot be read.
+bool ReadPng(const std::string& aPath, int& aWidth, int& aHeight, std::vector<uint8_t>& someRgba);
+
 // Empty when the image matches (or the golden was written on request); otherwise
 // what differs and where the actual and difference images went.
 std::string CompareWithGolden(const std::string& aName, int aWidth, int aHeight,

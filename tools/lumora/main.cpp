@@ -1,20 +1,22 @@
-// lumora: headless jobs on a level. This first version tells what the build holds
-// and whether this machine gives it an OpenGL 4.5 core context.
+// lumora: the library's jobs from the command line, headless: bake a level's lighting,
+// render it to a PNG, check its files, describe a baked or model file. Without a
+// command it tells what the build holds and whether this machine gives it an OpenGL
+// 4.5 core context.
+#include <CLI/CLI.hpp>
 #include <cstdio>
-#include <cstdlib>
-#include <cstring>
+#include <string>
 
+#include "Commands.h"
 #include "DemoFrame.h"
-#include "LevelFrame.h"
+#include "EditorSession.h"
 #include "lumora.h"
 #include "platform/gpu/Device.h"
 
 namespace
 {
-// Starts the headless device once, the way the bakes and renders will, and says
-// what the driver is; a machine without GL is told, not a failure of the tool.
-void PrintGpu()
+void PrintBuildAndGpu()
 {
+	std::printf("Lumora %s\n%s", Lumora::GetVersion(), Lumora::GetBuildInfo().c_str());
 	Gpu::Device device;
 	if (!device.Init(16, 16))
 	{
@@ -26,58 +28,125 @@ void PrintGpu()
 	            device.GetVersionName().c_str(), device.IsSurfaceless() ? "EGL surfaceless" : "EGL pbuffer");
 	device.Destroy();
 }
+
+// "WxH" into two positive sizes.
+std::string ParseSize(const std::string& aText, int& aWidth, int& aHeight)
+{
+	int width = 0;
+	int height = 0;
+	char separator = 0;
+	char rest = 0;
+	if (std::sscanf(aText.c_str(), "%d%c%d%c", &width, &separator, &height, &rest) != 3 ||
+	    (separator != 'x' && separator != 'X') || width < 1 || height < 1 || width > 8192 || height > 8192)
+	{
+		return "--size takes WIDTHxHEIGHT, each 1 to 8192 (as 1280x720), not '" + aText + "'";
+	}
+	aWidth = width;
+	aHeight = height;
+	return {};
+}
 } // namespace
 
 int main(int argc, char** argv)
 {
-	if (argc > 1 && (std::strcmp(argv[1], "--version") == 0 || std::strcmp(argv[1], "-V") == 0))
+	CLI::App app("Lumora: bakes, renders and checks level lighting, headless. Run from the folder that "
+	             "holds data/.",
+	             "lumora");
+	app.set_version_flag("--version,-V", std::string("lumora ") + Lumora::GetVersion());
+
+	LumoraTool::BakeOptions bake;
+	CLI::App* bakeCommand = app.add_subcommand(
+	    "bake", "Bake a level's ambient light (SH volume, ambient.sh) and its rooms' reflection cubemaps");
+	bakeCommand->add_option("LEVEL", bake.myLevel, "Level folder name under data/XML/levels/")->required();
+	bakeCommand->add_option("--bounces", bake.myBounces, "Ambient light bounces (0 writes nothing)")
+	    ->check(CLI::Range(0, 16))
+	    ->capture_default_str();
+	CLI::Option* ambientOnly =
+	    bakeCommand->add_flag("--ambient-only", bake.myAmbientOnlyFlag, "Bake the ambient volume only");
+	CLI::Option* specularOnly = bakeCommand->add_flag("--specular-only", bake.mySpecularOnlyFlag,
+	                                                  "Bake the reflection cubemaps only");
+	ambientOnly->excludes(specularOnly);
+	bakeCommand->add_flag("--debug-captures", bake.myDebugCapturesFlag,
+	                      "Also save every probe's capture to data/cubemaps/sh debug/");
+
+	LumoraTool::RenderOptions render;
+	std::string size = "1280x720";
+	std::vector<float> camera;
+	CLI::App* renderCommand = app.add_subcommand("render", "Render one frame of a level to a PNG");
+	renderCommand->add_option("LEVEL", render.myLevel, "Level folder name under data/XML/levels/")
+	    ->required();
+	renderCommand->add_option("--out,-o", render.myOutput, "The PNG to write")->required();
+	renderCommand->add_option("--size", size, "WIDTHxHEIGHT")->capture_default_str();
+	renderCommand
+	    ->add_option("--camera", camera, "Camera position X,Y,Z (default: walked into the first room)")
+	    ->delimiter(',')
+	    ->expected(3);
+	renderCommand->add_option("--yaw", render.myYaw,
+	                          "Camera turn about the up axis, radians (with --camera)");
+	renderCommand->add_option("--pitch", render.myPitch,
+	                          "Camera tilt, radians, positive looks down (with --camera)");
+	renderCommand->add_option("--mode", render.myMode, "Editor mode: what the overlays show")
+	    ->check(CLI::IsMember({"light", "node", "decal"}))
+	    ->capture_default_str();
+
+	std::string checkLevel;
+	CLI::App* checkCommand = app.add_subcommand(
+	    "check", "Read a level's files and both catalogues; list every problem (exit 1 if any)");
+	checkCommand->add_option("LEVEL", checkLevel, "Level folder name under data/XML/levels/")->required();
+
+	std::string infoPath;
+	CLI::App* infoCommand =
+	    app.add_subcommand("info", "Describe an ambient.sh, a DDS texture or an .al model");
+	infoCommand->add_option("FILE", infoPath, "The file")->required();
+
+	std::string demoOutput;
+	CLI::App* demoCommand = app.add_subcommand("demo", "Render the built-in demo scene (no level) to a PNG");
+	demoCommand->add_option("--out,-o", demoOutput, "The PNG to write")->required();
+
+	app.require_subcommand(0, 1);
+	try
 	{
-		std::printf("lumora %s\n", Lumora::GetVersion());
-		return 0;
+		app.parse(argc, argv);
 	}
-	if (argc > 1 && std::strcmp(argv[1], "--demo-frame") == 0)
+	catch (const CLI::ParseError& error)
 	{
-		if (argc != 3)
+		return app.exit(error);
+	}
+
+	if (*bakeCommand)
+	{
+		return LumoraTool::RunBake(bake);
+	}
+	if (*renderCommand)
+	{
+		if (const std::string problem = ParseSize(size, render.myWidth, render.myHeight); !problem.empty())
 		{
-			std::fprintf(stderr, "usage: lumora --demo-frame OUT.png\n");
+			LumoraTool::PrintError(problem);
 			return 2;
 		}
-		if (!LumoraTool::RenderDemoFrame(argv[2], 640, 360))
+		if (camera.size() == 3)
+		{
+			render.myCamera = Vector3<float>(camera[0], camera[1], camera[2]);
+		}
+		return LumoraTool::RunRender(render);
+	}
+	if (*checkCommand)
+	{
+		return LumoraTool::RunCheck(checkLevel);
+	}
+	if (*infoCommand)
+	{
+		return LumoraTool::RunInfo(infoPath);
+	}
+	if (*demoCommand)
+	{
+		if (!LumoraTool::RenderDemoFrame(demoOutput, 640, 360))
 		{
 			return 1;
 		}
-		std::printf("wrote %s (640x360)\n", argv[2]);
+		std::printf("wrote %s (640x360)\n", demoOutput.c_str());
 		return 0;
 	}
-	if (argc > 1 && std::strcmp(argv[1], "--level-frame") == 0)
-	{
-		int bounces = 0;
-		if (argc == 6 && std::strcmp(argv[4], "--bake-bounces") == 0)
-		{
-			bounces = std::atoi(argv[5]);
-		}
-		if ((argc != 4 && argc != 6) || bounces < 0 ||
-		    (argc == 6 && bounces == 0 && std::strcmp(argv[5], "0") != 0))
-		{
-			std::fprintf(stderr, "usage: lumora --level-frame LEVEL OUT.png [--bake-bounces N]\n");
-			return 2;
-		}
-		if (!LumoraTool::RenderLevelFrame(argv[2], argv[3], 1280, 720, bounces))
-		{
-			return 1;
-		}
-		std::printf("wrote %s (1280x720)\n", argv[3]);
-		return 0;
-	}
-	if (argc > 1)
-	{
-		std::fprintf(
-		    stderr,
-		    "lumora: unknown argument '%s' (this build knows --version, --demo-frame and --level-frame)\n",
-		    argv[1]);
-		return 2;
-	}
-	std::printf("Lumora %s\n%s", Lumora::GetVersion(), Lumora::GetBuildInfo().c_str());
-	PrintGpu();
+	PrintBuildAndGpu();
 	return 0;
 }

@@ -1,0 +1,171 @@
+// The lumora tool end to end, as a user runs it: a copy of data/ in a scratch folder,
+// the small sample level baked there with one bounce, the written files described by
+// lumora info, a frame rendered and compared with a golden image; and bad input
+// answered with one line on standard error and a non-zero exit.
+#include <algorithm>
+#include <array>
+#include <cstdio>
+#include <cstdlib>
+#include <filesystem>
+#include <gtest/gtest.h>
+#include <string>
+#include <sys/wait.h>
+#include <vector>
+
+#include "support/Golden.h"
+#include "support/TestSupport.h"
+
+namespace
+{
+namespace fs = std::filesystem;
+
+struct ToolRun
+{
+	int myStatus = -1;
+	std::string myOutput; // standard output
+	std::string myErrors; // standard error
+};
+
+// Runs the tool in aFolder with the arguments (quoted by the caller where needed).
+ToolRun RunTool(const fs::path& aFolder, const std::string& someArguments)
+{
+	const fs::path errors = aFolder / "stderr.txt";
+	const std::string command = "cd '" + aFolder.string() + "' && '" + std::string(LUMORA_CLI_PATH) + "' " +
+	                            someArguments + " 2>'" + errors.string() + "'";
+	ToolRun run;
+	FILE* pipe = popen(command.c_str(), "r");
+	if (pipe == nullptr)
+	{
+		return run;
+	}
+	std::array<char, 4096> buffer{};
+	size_t count = 0;
+	while ((count = fread(buffer.data(), 1, buffer.size(), pipe)) > 0)
+	{
+		run.myOutput.append(buffer.data(), count);
+	}
+	const int status = pclose(pipe);
+	run.myStatus = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+	run.myErrors = TestSupport::ReadWholeFile(errors.string());
+	return run;
+}
+
+class CommandLineTest : public ::testing::Test
+{
+protected:
+	// data/ copied (without anything baked into it locally) into the scratch folder.
+	void CopyData()
+	{
+		fs::copy(fs::path(LUMORA_TEST_SOURCE_ROOT) / "data", myScratch.Path() / "data",
+		         fs::copy_options::recursive);
+		for (const fs::directory_entry& entry : fs::directory_iterator(myScratch.Path() / "data/Cubemaps"))
+		{
+			if (entry.is_directory())
+			{
+				fs::remove_all(entry.path());
+			}
+		}
+		for (const fs::directory_entry& entry : fs::directory_iterator(myScratch.Path() / "data/XML/levels"))
+		{
+			fs::remove(entry.path() / "ambient.sh");
+		}
+	}
+
+	TestSupport::ScratchDir myScratch;
+};
+} // namespace
+
+TEST_F(CommandLineTest, BakeDescribeAndRenderTheSmallLevel)
+{
+	CopyData();
+	const ToolRun bake = RunTool(myScratch.Path(), "bake sample_small --bounces 1");
+	if (bake.myErrors.find("no OpenGL 4.5") != std::string::npos && std::getenv("CI") == nullptr)
+	{
+		GTEST_SKIP() << bake.myErrors;
+	}
+	ASSERT_EQ(bake.myStatus, 0) << bake.myOutput << bake.myErrors;
+	EXPECT_NE(bake.myOutput.find("ambient: data/XML/levels/sample_small/ambient.sh"), std::string::npos)
+	    << bake.myOutput;
+	EXPECT_NE(bake.myOutput.find("reflections: data/Cubemaps/sample_small/main.dds"), std::string::npos)
+	    << bake.myOutput;
+
+	// The volume: the room's -3..3 x 0..3 x -4..4 gives 3 x 2 x 4 cells; the top layer
+	// (probes at y = 3, on the ceiling) is never captured.
+	const ToolRun ambient = RunTool(myScratch.Path(), "info data/XML/levels/sample_small/ambient.sh");
+	ASSERT_EQ(ambient.myStatus, 0) << ambient.myErrors;
+	EXPECT_NE(ambient.myOutput.find("bounds (-3, 0, -4) to (3, 3, 4)"), std::string::npos)
+	    << ambient.myOutput;
+	EXPECT_NE(ambient.myOutput.find("3 x 2 x 4 cells (24), 12 never captured"), std::string::npos)
+	    << ambient.myOutput;
+	const ToolRun cubemap = RunTool(myScratch.Path(), "info data/Cubemaps/sample_small/main.dds");
+	ASSERT_EQ(cubemap.myStatus, 0) << cubemap.myErrors;
+	EXPECT_NE(cubemap.myOutput.find("cubemap, R16G16B16A16_FLOAT"), std::string::npos) << cubemap.myOutput;
+	EXPECT_NE(cubemap.myOutput.find("256 x 256, 6 faces, 9 mips"), std::string::npos) << cubemap.myOutput;
+	const ToolRun check = RunTool(myScratch.Path(), "check sample_small");
+	EXPECT_EQ(check.myStatus, 0) << check.myOutput << check.myErrors;
+
+	// A fixed camera: the info line prints its position.
+	const ToolRun render =
+	    RunTool(myScratch.Path(),
+	            "render sample_small --out frame.png --size 160x90 --camera 0,1.5,-3.5 --pitch 0.15");
+	ASSERT_EQ(render.myStatus, 0) << render.myOutput << render.myErrors;
+	int width = 0;
+	int height = 0;
+	std::vector<uint8_t> pixels;
+	ASSERT_TRUE(TestSupport::ReadPng((myScratch.Path() / "frame.png").string(), width, height, pixels));
+	ASSERT_EQ(width, 160);
+	ASSERT_EQ(height, 90);
+	const std::string difference =
+	    TestSupport::CompareWithGolden("cli-sample-small-baked", width, height, pixels);
+	EXPECT_TRUE(difference.empty()) << difference;
+}
+
+TEST_F(CommandLineTest, BadInputGetsOneClearLineAndAFailingExit)
+{
+	// No data/ here.
+	const ToolRun noData = RunTool(myScratch.Path(), "render sample_small --out x.png");
+	EXPECT_EQ(noData.myStatus, 1);
+	EXPECT_EQ(noData.myErrors.rfind("lumora: no data/ folder in ", 0), 0u) << noData.myErrors;
+	EXPECT_EQ(std::count(noData.myErrors.begin(), noData.myErrors.end(), '\n'), 1) << noData.myErrors;
+
+	CopyData();
+	const ToolRun unknown = RunTool(myScratch.Path(), "bake no_such_level");
+	EXPECT_EQ(unknown.myStatus, 1);
+	EXPECT_EQ(unknown.myErrors, "lumora: no level 'no_such_level' under data/XML/levels/\n");
+	const ToolRun badSize = RunTool(myScratch.Path(), "render sample_small --out x.png --size 0x5");
+	EXPECT_EQ(badSize.myStatus, 2) << badSize.myErrors;
+	const ToolRun badFile = RunTool(myScratch.Path(), "info data/XML/EntityTypes.xml");
+	EXPECT_EQ(badFile.myStatus, 2) << badFile.myErrors;
+
+	// A light without its falloff value and a cut-off ambient.sh: check lists both, with
+	// the file and the element; render and bake refuse with the first and end cleanly.
+	const fs::path level = myScratch.Path() / "data/XML/levels/sample_small";
+	std::string lights = TestSupport::ReadWholeFile((level / "lights.xml").string());
+	const size_t falloff = lights.find("<falloff value=");
+	ASSERT_NE(falloff, std::string::npos);
+	lights.replace(falloff, lights.find("/>", falloff) - falloff, "<falloff ");
+	TestSupport::WriteWholeFile((level / "lights.xml").string(), lights);
+	TestSupport::WriteWholeFile((level / "ambient.sh").string(), std::string(20, '\1'));
+	const ToolRun check = RunTool(myScratch.Path(), "check sample_small");
+	if (check.myErrors.find("no OpenGL 4.5") != std::string::npos && std::getenv("CI") == nullptr)
+	{
+		GTEST_SKIP() << check.myErrors;
+	}
+	EXPECT_EQ(check.myStatus, 1);
+	EXPECT_NE(check.myOutput.find("2 problems:"), std::string::npos) << check.myOutput;
+	EXPECT_NE(check.myOutput.find("[falloff] in [point-light] in [data/XML/levels/sample_small/lights.xml]"),
+	          std::string::npos)
+	    << check.myOutput;
+	EXPECT_NE(check.myOutput.find("sample_small/ambient.sh is shorter than its 36-byte header"),
+	          std::string::npos)
+	    << check.myOutput;
+	const ToolRun render = RunTool(myScratch.Path(), "render sample_small --out x.png");
+	EXPECT_EQ(render.myStatus, 1);
+	EXPECT_NE(render.myErrors.find("lumora: level 'sample_small' has 2 problem(s)"), std::string::npos)
+	    << render.myErrors;
+	EXPECT_EQ(render.myErrors.find("Call stack"), std::string::npos) << render.myErrors;
+	EXPECT_FALSE(fs::exists(myScratch.Path() / "x.png"));
+	const ToolRun info = RunTool(myScratch.Path(), "info data/XML/levels/sample_small/ambient.sh");
+	EXPECT_EQ(info.myStatus, 1);
+	EXPECT_NE(info.myErrors.find("shorter than its 36-byte header"), std::string::npos) << info.myErrors;
+}

@@ -1,0 +1,225 @@
+// lumora info: what an ambient.sh, a DDS or an .al model holds, read with the
+// library's own readers (no GPU needed).
+#include <algorithm>
+#include <cstdio>
+#include <filesystem>
+#include <fstream>
+#include <iterator>
+#include <string>
+#include <vector>
+
+#include "Commands.h"
+#include "EditorSession.h"
+#include "model/AlFile.h"
+#include "model/Model.h"
+#include "model/ModelNode.h"
+#include "model/VertexTypes.h"
+#include "platform/dds/DdsFile.h"
+#include "platform/dds/Format.h"
+#include "platform/dds/ImageInfo.h"
+#include "renderer/AmbientVolumeFile.h"
+
+namespace LumoraTool
+{
+namespace
+{
+bool EndsWith(const std::string& aText, const std::string& anEnd)
+{
+	return aText.size() >= anEnd.size() &&
+	       aText.compare(aText.size() - anEnd.size(), anEnd.size(), anEnd) == 0;
+}
+
+int DescribeAmbient(const std::string& aPath)
+{
+	Zeph::AmbientVolume volume;
+	std::string problem;
+	if (Zeph::ReadAmbientVolume(aPath, volume, problem) != Zeph::AmbientVolumeRead::OK)
+	{
+		PrintError(problem);
+		return 1;
+	}
+	const Vector3<float>& minimum = volume.myWorldMin;
+	const Vector3<float> maximum = volume.myWorldMin + volume.myWorldSize;
+	std::printf("%s: SH irradiance volume\n", aPath.c_str());
+	std::printf("  bounds (%g, %g, %g) to (%g, %g, %g)\n", minimum.x, minimum.y, minimum.z, maximum.x,
+	            maximum.y, maximum.z);
+	const size_t cells = volume.myBlocks[0].size();
+	size_t neutral = 0;
+	for (size_t cell = 0; cell < cells; ++cell)
+	{
+		bool all = true;
+		for (const std::vector<uint32_t>& block : volume.myBlocks)
+		{
+			all = all && block[cell] == 0x7F7F7F7Fu;
+		}
+		neutral += all ? 1 : 0;
+	}
+	std::printf("  %d x %d x %d cells (%zu), %zu never captured (neutral)\n", volume.myCounts[0],
+	            volume.myCounts[1], volume.myCounts[2], cells, neutral);
+	// Each texel holds four coefficients stored as bytes; decoded as byte / 255 * 2 - 1.
+	static const char* const ourBlockNames[] = {"cAr", "cAg", "cAb", "cBr", "cBg", "cBb", "cC"};
+	for (int block = 0; block < Zeph::AmbientVolume::ourBlockCount; ++block)
+	{
+		std::printf("  %-4s", ourBlockNames[block]);
+		for (int component = 0; component < 4; ++component)
+		{
+			int lowest = 255;
+			int highest = 0;
+			for (const uint32_t texel : volume.myBlocks[block])
+			{
+				const int value = static_cast<int>((texel >> (8 * component)) & 0xFF);
+				lowest = std::min(lowest, value);
+				highest = std::max(highest, value);
+			}
+			std::printf("  %c %+.3f..%+.3f", "xyzw"[component], lowest / 255.0 * 2.0 - 1.0,
+			            highest / 255.0 * 2.0 - 1.0);
+		}
+		std::printf("\n");
+	}
+	return 0;
+}
+
+int DescribeDds(const std::string& aPath)
+{
+	Dds::ImageInfo info;
+	std::string error;
+	if (!Dds::GetImageInfoFromFile(aPath, info, error))
+	{
+		PrintError(aPath + ": " + error);
+		return 1;
+	}
+	const char* kind = info.IsVolume() ? "volume texture" : info.IsCube() ? "cubemap" : "2D texture";
+	std::printf("%s: %s, %s\n", aPath.c_str(), kind, Dds::FormatName(info.myFormat));
+	std::printf("  %u x %u", info.myWidth, info.myHeight);
+	if (info.IsVolume())
+	{
+		std::printf(" x %u", info.myDepth);
+	}
+	if (info.IsCube())
+	{
+		std::printf(", %u face%s", info.myArraySize, info.myArraySize == 1 ? "" : "s");
+	}
+	else if (info.myArraySize > 1)
+	{
+		std::printf(", %u slices", info.myArraySize);
+	}
+	std::printf(", %u mip%s\n", info.myMipLevels, info.myMipLevels == 1 ? "" : "s");
+	return 0;
+}
+
+const char* VertexTypeName(int aType)
+{
+	static const char* const ourNames[] = {"POS_UV",
+	                                       "POS_COL_UV",
+	                                       "POS_NORM_UV",
+	                                       "POS_NORM_UV_TAN",
+	                                       "POS_NORM_UV_TAN_BI",
+	                                       "POS_WEIGHT_BONES_NORM_UV_TAN",
+	                                       "POS_WEIGHT_BONES_NORM_UV_TAN_BI",
+	                                       "POS_WEIGHT_BONES_NORM_UV"};
+	return aType >= 0 && aType < Zeph::VERTEX_TYPE_COUNT ? ourNames[aType] : "unknown";
+}
+
+struct ModelTotals
+{
+	int myModels = 0;
+	long long myVertices = 0;
+	long long myIndices = 0;
+};
+
+void DescribeModel(const Zeph::Model& aModel, int aDepth, ModelTotals& someTotals)
+{
+	const std::string indent(static_cast<size_t>(2 * aDepth + 2), ' ');
+	if (aModel.IsNullObject())
+	{
+		std::printf("%smodel: null object\n", indent.c_str());
+	}
+	else
+	{
+		std::printf("%smodel: %s, %d vertices, %d indices, %d surface%s\n", indent.c_str(),
+		            VertexTypeName(aModel.GetVertexType()), aModel.GetVertexCount(), aModel.GetIndexCount(),
+		            aModel.GetSurfaces().Count(), aModel.GetSurfaces().Count() == 1 ? "" : "s");
+		++someTotals.myModels;
+		someTotals.myVertices += aModel.GetVertexCount();
+		someTotals.myIndices += aModel.GetIndexCount();
+	}
+	for (int child = 0; child < aModel.GetChildModels().Count(); ++child)
+	{
+		DescribeModel(*aModel.GetChildModels()[child], aDepth + 1, someTotals);
+	}
+}
+
+void DescribeNode(const Zeph::ModelNode& aNode, int aDepth, ModelTotals& someTotals)
+{
+	const std::string indent(static_cast<size_t>(2 * aDepth), ' ');
+	std::printf("%snode '%s', %d child%s\n", indent.c_str(), aNode.GetName().c_str(),
+	            aNode.GetChildren().Count(), aNode.GetChildren().Count() == 1 ? "" : "ren");
+	if (aNode.GetModel() != nullptr)
+	{
+		DescribeModel(*aNode.GetModel(), aDepth, someTotals);
+	}
+	for (int child = 0; child < aNode.GetChildren().Count(); ++child)
+	{
+		DescribeNode(*aNode.GetChildren()[child], aDepth + 1, someTotals);
+	}
+}
+
+int DescribeAl(const std::string& aPath)
+{
+	std::ifstream in(aPath, std::ios::binary);
+	if (!in)
+	{
+		PrintError("cannot read " + aPath);
+		return 1;
+	}
+	const std::vector<uint8_t> bytes((std::istreambuf_iterator<char>(in)), std::istreambuf_iterator<char>());
+	std::vector<Zeph::AlTextureBinding> bindings;
+	std::string error;
+	const std::unique_ptr<Zeph::ModelNode> tree = Zeph::AlFile::Parse(bytes, bindings, error);
+	if (!tree)
+	{
+		PrintError(aPath + ": " + error);
+		return 1;
+	}
+	std::printf("%s: model file, %zu bytes\n", aPath.c_str(), bytes.size());
+	ModelTotals totals;
+	DescribeNode(*tree, 1, totals);
+	std::printf("  %d model%s, %lld vertices, %lld indices, %zu texture binding%s\n", totals.myModels,
+	            totals.myModels == 1 ? "" : "s", totals.myVertices, totals.myIndices, bindings.size(),
+	            bindings.size() == 1 ? "" : "s");
+	for (const Zeph::AlTextureBinding& binding : bindings)
+	{
+		std::printf("    %s <- %s%s\n", binding.myVariableName.c_str(), binding.myPath.c_str(),
+		            binding.mySRGBFlag ? " (sRGB)" : "");
+	}
+	return 0;
+}
+} // namespace
+
+int RunInfo(const std::string& aPath)
+{
+	std::error_code ignored;
+	if (!std::filesystem::is_regular_file(aPath, ignored))
+	{
+		PrintError("no file " + aPath);
+		return 1;
+	}
+	std::string lower = aPath;
+	std::transform(lower.begin(), lower.end(), lower.begin(),
+	               [](unsigned char c) { return std::tolower(c); });
+	if (EndsWith(lower, ".sh"))
+	{
+		return DescribeAmbient(aPath);
+	}
+	if (EndsWith(lower, ".dds"))
+	{
+		return DescribeDds(aPath);
+	}
+	if (EndsWith(lower, ".al"))
+	{
+		return DescribeAl(aPath);
+	}
+	PrintError("cannot describe " + aPath + " (it reads an ambient.sh, a .dds or an .al model)");
+	return 2;
+}
+} // namespace LumoraTool
