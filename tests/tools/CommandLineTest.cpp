@@ -12,6 +12,9 @@
 #include <sys/wait.h>
 #include <vector>
 
+#include "model/AlFile.h"
+#include "model/ModelNode.h"
+#include "model/ModelTreeCheck.h"
 #include "support/Golden.h"
 #include "support/TestSupport.h"
 
@@ -168,4 +171,30 @@ TEST_F(CommandLineTest, BadInputGetsOneClearLineAndAFailingExit)
 	const ToolRun info = RunTool(myScratch.Path(), "info data/XML/levels/sample_small/ambient.sh");
 	EXPECT_EQ(info.myStatus, 1);
 	EXPECT_NE(info.myErrors.find("shorter than its 36-byte header"), std::string::npos) << info.myErrors;
+}
+
+TEST_F(CommandLineTest, InfoDescribesAModelFileAndNamesTheDamage)
+{
+	// Root (a quad) -> "group" -> "leaf" (a quad with a null-object child model), and "empty".
+	const std::unique_ptr<Zeph::ModelNode> tree(ModelTreeCheck::MakeTree());
+	std::vector<uint8_t> bytes;
+	Zeph::AlFile::Encode(*tree, bytes);
+	const std::string whole(bytes.begin(), bytes.end());
+	TestSupport::WriteWholeFile((myScratch.Path() / "tree.al").string(), whole);
+	const ToolRun info = RunTool(myScratch.Path(), "info tree.al");
+	ASSERT_EQ(info.myStatus, 0) << info.myErrors;
+	for (const char* line :
+	     {"  node 'root', 2 children\n", "    node 'group', 1 child\n", "      node 'leaf', 0 children\n",
+	      "        model: null object\n", "    node 'empty', 0 children\n",
+	      "  model: POS_NORM_UV_TAN_BI, 4 vertices, 6 indices, 2 surfaces\n",
+	      "  2 models, 8 vertices, 12 indices"})
+	{
+		EXPECT_NE(info.myOutput.find(line), std::string::npos) << line << "\n" << info.myOutput;
+	}
+
+	TestSupport::WriteWholeFile((myScratch.Path() / "cut.al").string(), whole.substr(0, whole.size() / 2));
+	const ToolRun cut = RunTool(myScratch.Path(), "info cut.al");
+	EXPECT_EQ(cut.myStatus, 1);
+	EXPECT_EQ(cut.myErrors.rfind("lumora: cut.al: ", 0), 0u) << cut.myErrors;
+	EXPECT_EQ(std::count(cut.myErrors.begin(), cut.myErrors.end(), '\n'), 1) << cut.myErrors;
 }
