@@ -5,6 +5,7 @@
 #include <vector>
 
 #include "Materials.h"
+#include "MipChain.h"
 #include "Noise.h"
 #include "platform/dds/Format.h"
 
@@ -21,13 +22,6 @@ struct DecalTexel
 	double myColor[3] = {0.0, 0.0, 0.0}; // sRGB-encoded, 0..1
 	double myAlpha = 0.0;
 	double myHeight = 0.0; // constant wherever the shape does not reach, so the normal map is flat there
-};
-
-// One mip level, four channels per texel: linear colour and alpha, or a unit normal and height.
-struct Level
-{
-	uint32_t mySize = 0;
-	std::vector<std::array<double, 4>> myTexels;
 };
 
 double Clamp01(double aValue)
@@ -69,21 +63,6 @@ double RoundedBoxDistance(double aU, double aV, double aCenterU, double aCenterV
 	const double dv = std::abs(aV - aCenterV) - (aHalfV - aRadius);
 	const double outside = std::hypot(std::max(du, 0.0), std::max(dv, 0.0));
 	return outside + std::min(std::max(du, dv), 0.0) - aRadius;
-}
-
-double SrgbToLinear(double aValue)
-{
-	return aValue <= 0.04045 ? aValue / 12.92 : std::pow((aValue + 0.055) / 1.055, 2.4);
-}
-
-double LinearToSrgb(double aValue)
-{
-	return aValue <= 0.0031308 ? aValue * 12.92 : 1.055 * std::pow(aValue, 1.0 / 2.4) - 0.055;
-}
-
-uint8_t ToByte(double aValue)
-{
-	return static_cast<uint8_t>(std::lround(Clamp01(aValue) * 255.0));
 }
 
 // A plate of diagonal stripes with a dark frame, its paint scratched down to the metal in places.
@@ -335,10 +314,10 @@ DecalTexel SampleDecal(DecalKind aKind, double aU, double aV)
 	return DecalTexel();
 }
 
-Level SampleLevelZero(DecalKind aKind, MapKind aMap)
+MipLevel SampleLevelZero(DecalKind aKind, MapKind aMap)
 {
 	const uint32_t size = ourDecalMapSize;
-	Level level;
+	MipLevel level;
 	level.mySize = size;
 	level.myTexels.resize(size_t(size) * size);
 	std::vector<DecalTexel> texels(size_t(size) * size);
@@ -382,68 +361,6 @@ Level SampleLevelZero(DecalKind aKind, MapKind aMap)
 	return level;
 }
 
-Level Downsample(const Level& aLevel, MapKind aMap)
-{
-	Level half;
-	half.mySize = std::max(aLevel.mySize / 2, 1u);
-	half.myTexels.resize(size_t(half.mySize) * half.mySize);
-	for (uint32_t y = 0; y < half.mySize; ++y)
-	{
-		for (uint32_t x = 0; x < half.mySize; ++x)
-		{
-			std::array<double, 4> sum = {0.0, 0.0, 0.0, 0.0};
-			std::array<double, 3> weighted = {0.0, 0.0, 0.0};
-			for (uint32_t corner = 0; corner < 4; ++corner)
-			{
-				const uint32_t sourceX = std::min(x * 2 + (corner & 1), aLevel.mySize - 1);
-				const uint32_t sourceY = std::min(y * 2 + (corner >> 1), aLevel.mySize - 1);
-				const std::array<double, 4>& texel =
-				    aLevel.myTexels[size_t(sourceY) * aLevel.mySize + sourceX];
-				for (int channel = 0; channel < 4; ++channel)
-				{
-					sum[channel] += texel[channel] * 0.25;
-				}
-				for (int channel = 0; channel < 3; ++channel)
-				{
-					weighted[channel] += texel[channel] * texel[3] * 0.25;
-				}
-			}
-			if (aMap == MapKind::Normal)
-			{
-				const double length = std::sqrt(sum[0] * sum[0] + sum[1] * sum[1] + sum[2] * sum[2]);
-				for (int channel = 0; channel < 3; ++channel)
-				{
-					sum[channel] = length > 1e-9 ? sum[channel] / length : (channel == 2 ? 1.0 : 0.0);
-				}
-			}
-			else if (sum[3] > 1e-9)
-			{
-				// Colour where the decal covers, so transparent texels do not bleed into its edge.
-				for (int channel = 0; channel < 3; ++channel)
-				{
-					sum[channel] = weighted[channel] / sum[3];
-				}
-			}
-			half.myTexels[size_t(y) * half.mySize + x] = sum;
-		}
-	}
-	return half;
-}
-
-void Store(const Level& aLevel, MapKind aMap, uint8_t* someBytes)
-{
-	for (size_t index = 0; index < aLevel.myTexels.size(); ++index)
-	{
-		const std::array<double, 4>& texel = aLevel.myTexels[index];
-		uint8_t* out = someBytes + index * 4;
-		for (int channel = 0; channel < 3; ++channel)
-		{
-			out[channel] =
-			    ToByte(aMap == MapKind::Normal ? texel[channel] * 0.5 + 0.5 : LinearToSrgb(texel[channel]));
-		}
-		out[3] = ToByte(texel[3]);
-	}
-}
 } // namespace
 
 const char* DecalName(DecalKind aKind)
@@ -478,31 +395,7 @@ bool BakeDecalMap(DecalKind aKind, MapKind aMap, Dds::Image& anImageOut, std::st
 		anErrorOut = std::string("decal ") + DecalName(aKind) + " has no " + MapSuffix(aMap) + " map";
 		return false;
 	}
-	uint32_t mipCount = 1;
-	while ((ourDecalMapSize >> (mipCount - 1)) > 1)
-	{
-		++mipCount;
-	}
-	Dds::ImageInfo info;
-	info.myWidth = ourDecalMapSize;
-	info.myHeight = ourDecalMapSize;
-	info.myDepth = 1;
-	info.myArraySize = 1;
-	info.myMipLevels = mipCount;
-	info.myFormat = aMap == MapKind::Normal ? Dds::Format::R8G8B8A8_UNORM : Dds::Format::R8G8B8A8_UNORM_SRGB;
-	if (!anImageOut.Init(info, anErrorOut))
-	{
-		return false;
-	}
-	Level level = SampleLevelZero(aKind, aMap);
-	for (uint32_t mip = 0; mip < mipCount; ++mip)
-	{
-		if (mip > 0)
-		{
-			level = Downsample(level, aMap);
-		}
-		Store(level, aMap, anImageOut.Data(mip, 0));
-	}
-	return true;
+	// Colour averaged by coverage, so the transparent surround does not darken the edge.
+	return BakeMipChain(SampleLevelZero(aKind, aMap), aMap == MapKind::Normal, true, anImageOut, anErrorOut);
 }
 } // namespace Content
