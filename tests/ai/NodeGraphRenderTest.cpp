@@ -13,41 +13,20 @@
 #include "engine/Camera.h"
 #include "engine/CameraInstance.h"
 #include "engine/DebugLine.h"
-#include "engine/EngineFixture.h"
 #include "engine/Instance.h"
+#include "engine/ViewFixture.h"
 #include "platform/gpu/Readback.h"
 #include "renderer/FrameCapture.h"
 #include "renderer/Renderer.h"
 
 namespace
 {
-constexpr int ourWidth = 160;
-constexpr int ourHeight = 90;
 constexpr int ourRed = 0;
 constexpr int ourGreen = 1;
 
-struct Pixel
-{
-	int myX;
-	int myY;
-};
-
-class NodeGraphRenderTest : public EngineTest
+class NodeGraphRenderTest : public ViewTest
 {
 protected:
-	// The engine and a camera at (0, 0, 5) looking along +z.
-	bool Start()
-	{
-		if (!CreateEngine(ourWidth, ourHeight))
-		{
-			return false;
-		}
-		myLens = std::make_unique<Zeph::Camera>(static_cast<float>(ourWidth) / ourHeight);
-		myCamera = std::make_unique<Zeph::CameraInstance>(myLens.get());
-		Zeph::FrameCapture::SetCamera(*myCamera);
-		return true;
-	}
-
 	// One frame with the graph queued as the editor queues it, read back and saved.
 	void Draw(const std::string& aName)
 	{
@@ -116,15 +95,6 @@ protected:
 	}
 
 	// clip = (p, 1) * View * Projection, then the viewport with row 0 at the top.
-	Pixel Project(const Vector3<float>& aPoint) const
-	{
-		Vector4<float> clip(aPoint);
-		clip = clip * (myCamera->GetView() * myCamera->GetProjection());
-		const float x = (clip.x / clip.w * 0.5f + 0.5f) * ourWidth;
-		const float y = (0.5f - clip.y / clip.w * 0.5f) * ourHeight;
-		return {static_cast<int>(std::floor(x)), static_cast<int>(std::floor(y))};
-	}
-
 	// The graph a - b with both visuals, made as the editor makes them.
 	void BuildGraph(const Vector3<float>& aFirst, const Vector3<float>& aSecond)
 	{
@@ -151,8 +121,6 @@ protected:
 		EngineTest::TearDown();
 	}
 
-	std::unique_ptr<Zeph::Camera> myLens;
-	std::unique_ptr<Zeph::CameraInstance> myCamera;
 	std::vector<uint8_t> myPixels;
 	AI::NGNode myNodes[2];
 	AI::NGEdge myEdge;

@@ -13,9 +13,9 @@
 
 #include "engine/Camera.h"
 #include "engine/CameraInstance.h"
-#include "engine/EngineFixture.h"
 #include "engine/Instance.h"
 #include "engine/Texture.h"
+#include "engine/ViewFixture.h"
 #include "model/ModelFactory.h"
 #include "platform/gpu/Readback.h"
 #include "renderer/FrameCapture.h"
@@ -27,7 +27,7 @@ namespace FrameTesting
 constexpr int ourWidth = 160;
 constexpr int ourHeight = 90;
 
-class FrameTest : public EngineTest
+class FrameTest : public ViewTest
 {
 protected:
 	// The engine with the given shadow quality (1: a 1024 shadow map keeps tests quick).
@@ -40,8 +40,7 @@ protected:
 		Zeph::Engine* engine = Zeph::Engine::GetInstance();
 		engine->GetSetupInfo().myShadowQuality = aShadowQuality;
 		EXPECT_TRUE(Renderer().Init(ourWidth, ourHeight)) << TakeLog();
-		myLens = std::make_unique<Zeph::Camera>(static_cast<float>(ourWidth) / ourHeight);
-		myCamera = std::make_unique<Zeph::CameraInstance>(myLens.get());
+		MakeCamera();
 		return true;
 	}
 
@@ -106,8 +105,8 @@ protected:
 		Zeph::Texture* lit = Renderer().GetLitImage();
 		ASSERT_NE(lit, nullptr);
 		myLit.clear();
-		ASSERT_TRUE(Gpu::ReadRenderTarget(Zeph::Engine::GetInstance()->GetContext(), *lit->GetRenderTargetView(),
-		                                  myLit));
+		ASSERT_TRUE(Gpu::ReadRenderTarget(Zeph::Engine::GetInstance()->GetContext(),
+		                                  *lit->GetRenderTargetView(), myLit));
 	}
 
 	void ExpectGolden(const std::string& aName)
@@ -121,19 +120,6 @@ protected:
 		EXPECT_TRUE(difference.empty()) << difference;
 	}
 
-	struct Pixel
-	{
-		int myX;
-		int myY;
-	};
-	Pixel Project(const Vector3<float>& aPoint) const
-	{
-		Vector4<float> clip(aPoint.x, aPoint.y, aPoint.z, 1.0f);
-		clip = clip * (myCamera->GetView() * myCamera->GetProjection());
-		const float x = (clip.x / clip.w * 0.5f + 0.5f) * ourWidth;
-		const float y = (0.5f - clip.y / clip.w * 0.5f) * ourHeight;
-		return {static_cast<int>(std::floor(x)), static_cast<int>(std::floor(y))};
-	}
 	// Luminance of the lit image at a world point.
 	static float Luminance(const std::vector<float>& someLit, Pixel aPixel)
 	{
@@ -145,8 +131,6 @@ protected:
 		return 0.2126f * rgba[0] + 0.7152f * rgba[1] + 0.0722f * rgba[2];
 	}
 
-	std::unique_ptr<Zeph::Camera> myLens;
-	std::unique_ptr<Zeph::CameraInstance> myCamera;
 	std::vector<std::unique_ptr<Zeph::Instance>> myInstances;
 	std::vector<Zeph::Instance*> myLateInstances;
 	std::vector<Zeph::PointLightData> myPointLights;
@@ -156,7 +140,8 @@ protected:
 	std::vector<float> myLit;
 };
 
-inline Zeph::SpotLightData SpotDown(const Vector3<float>& aPosition, float aFalloff, float anInner, float anOuter)
+inline Zeph::SpotLightData SpotDown(const Vector3<float>& aPosition, float aFalloff, float anInner,
+                                    float anOuter)
 {
 	Zeph::SpotLightData spot;
 	spot.myFalloff = aFalloff;

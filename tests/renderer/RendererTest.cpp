@@ -11,9 +11,9 @@
 #include "engine/Camera.h"
 #include "engine/CameraInstance.h"
 #include "engine/DebugLine.h"
-#include "engine/EngineFixture.h"
 #include "engine/Instance.h"
 #include "engine/Room.h"
+#include "engine/ViewFixture.h"
 #include "model/ModelFactory.h"
 #include "platform/gpu/Readback.h"
 #include "renderer/FrameCapture.h"
@@ -21,31 +21,10 @@
 
 namespace
 {
-constexpr int ourWidth = 160;
-constexpr int ourHeight = 90;
 
-struct Pixel
-{
-	int myX;
-	int myY;
-};
-
-class RendererTest : public EngineTest
+class RendererTest : public ViewTest
 {
 protected:
-	// The engine and a camera at (0, 0, 5) looking along +z, set on the collector.
-	bool Start()
-	{
-		if (!CreateEngine(ourWidth, ourHeight))
-		{
-			return false;
-		}
-		myLens = std::make_unique<Zeph::Camera>(static_cast<float>(ourWidth) / ourHeight);
-		myCamera = std::make_unique<Zeph::CameraInstance>(myLens.get());
-		Zeph::FrameCapture::SetCamera(*myCamera);
-		return true;
-	}
-
 	static Zeph::Renderer& Renderer() { return Zeph::Engine::GetInstance()->GetRenderer(); }
 	static Zeph::ModelFactory& Factory() { return Zeph::Engine::GetInstance()->GetModelFactory(); }
 
@@ -106,17 +85,6 @@ protected:
 
 	// Where the camera puts a world point: clip = (p, 1) * View * Projection, then
 	// the viewport with row 0 at the top.
-	Pixel Project(const Vector3<float>& aPoint) const
-	{
-		Vector4<float> clip(aPoint);
-		clip = clip * (myCamera->GetView() * myCamera->GetProjection());
-		const float x = (clip.x / clip.w * 0.5f + 0.5f) * ourWidth;
-		const float y = (0.5f - clip.y / clip.w * 0.5f) * ourHeight;
-		return {static_cast<int>(std::floor(x)), static_cast<int>(std::floor(y))};
-	}
-
-	std::unique_ptr<Zeph::Camera> myLens;
-	std::unique_ptr<Zeph::CameraInstance> myCamera;
 	std::vector<uint8_t> myPixels;
 };
 
