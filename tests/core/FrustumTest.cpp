@@ -26,38 +26,45 @@ Matrix44<float> Perspective(float aNear, float aFar)
 
 TEST(FrustumTest, SpheresOutsideAPlaneAreCulledAndThoseTouchingTheViewKept)
 {
-	Intersection::Frustum frustum;
-	frustum.Init(Perspective(0.1f, 100.0f)); // the camera at the origin looking along +z
-	EXPECT_FALSE(frustum.IsSphereOutside(V3(0.0f, 0.0f, 10.0f), 1.0f)) << "straight ahead";
-	EXPECT_TRUE(frustum.IsSphereOutside(V3(0.0f, 0.0f, -10.0f), 1.0f)) << "behind";
-	EXPECT_TRUE(frustum.IsSphereOutside(V3(20.0f, 0.0f, 10.0f), 1.0f)) << "right of the 45 degree side";
-	EXPECT_TRUE(frustum.IsSphereOutside(V3(0.0f, -20.0f, 10.0f), 1.0f)) << "below";
-	// 0.71 from the side plane x = z, radius 1: it reaches into the view.
-	EXPECT_FALSE(frustum.IsSphereOutside(V3(11.0f, 0.0f, 10.0f), 1.0f));
-	EXPECT_TRUE(frustum.IsSphereOutside(V3(11.5f, 0.0f, 10.0f), 1.0f));
-	EXPECT_TRUE(frustum.IsSphereOutside(V3(0.0f, 0.0f, 102.0f), 1.0f)) << "beyond the far plane";
-	EXPECT_FALSE(frustum.IsSphereOutside(V3(0.0f, 0.0f, 100.5f), 1.0f)) << "across the far plane";
-	// A sphere around the camera is always seen.
-	EXPECT_FALSE(frustum.IsSphereOutside(V3(0.0f, 0.0f, -0.5f), 1.0f));
-}
-
-TEST(FrustumTest, FollowsTheViewAndCullsNothingForABrokenMatrix)
-{
 	// The camera at x = 5 turned to look along -x (its forward row is (-1, 0, 0)): the
 	// view is the inverse of its world.
-	Matrix44<float> world = Matrix44<float>::CreateRotateAroundY(static_cast<float>(M_PI / 2.0));
-	world.SetPosition(V3(5.0f, 0.0f, 0.0f));
-	Intersection::Frustum frustum;
-	frustum.Init(world.Inverse() * Perspective(0.1f, 100.0f));
-	EXPECT_FALSE(frustum.IsSphereOutside(V3(-5.0f, 0.0f, 0.0f), 0.5f)) << "ahead, along -x";
-	EXPECT_TRUE(frustum.IsSphereOutside(V3(15.0f, 0.0f, 0.0f), 0.5f)) << "behind, along +x";
-	EXPECT_TRUE(frustum.IsSphereOutside(V3(5.0f, 0.0f, 10.0f), 0.5f)) << "to the side";
-
+	Matrix44<float> turned = Matrix44<float>::CreateRotateAroundY(static_cast<float>(M_PI / 2.0));
+	turned.SetPosition(V3(5.0f, 0.0f, 0.0f));
 	Matrix44<float> zero;
 	for (float& value : zero.myMatrix)
 	{
 		value = 0.0f;
 	}
-	frustum.Init(zero);
-	EXPECT_FALSE(frustum.IsSphereOutside(V3(1000.0f, -1000.0f, 5.0f), 0.0f));
+	const struct
+	{
+		const char* myName;
+		Matrix44<float> myViewProjection;
+		V3 myCenter;
+		float myRadius;
+		bool myOutsideFlag;
+	} cases[] = {
+	    // The camera at the origin looking along +z.
+	    {"straight ahead", Perspective(0.1f, 100.0f), V3(0.0f, 0.0f, 10.0f), 1.0f, false},
+	    {"behind", Perspective(0.1f, 100.0f), V3(0.0f, 0.0f, -10.0f), 1.0f, true},
+	    {"right of the 45 degree side", Perspective(0.1f, 100.0f), V3(20.0f, 0.0f, 10.0f), 1.0f, true},
+	    {"below", Perspective(0.1f, 100.0f), V3(0.0f, -20.0f, 10.0f), 1.0f, true},
+	    {"0.71 from the side plane x = z", Perspective(0.1f, 100.0f), V3(11.0f, 0.0f, 10.0f), 1.0f, false},
+	    {"1.06 from the side plane", Perspective(0.1f, 100.0f), V3(11.5f, 0.0f, 10.0f), 1.0f, true},
+	    {"beyond the far plane", Perspective(0.1f, 100.0f), V3(0.0f, 0.0f, 102.0f), 1.0f, true},
+	    {"across the far plane", Perspective(0.1f, 100.0f), V3(0.0f, 0.0f, 100.5f), 1.0f, false},
+	    {"around the camera", Perspective(0.1f, 100.0f), V3(0.0f, 0.0f, -0.5f), 1.0f, false},
+	    {"turned: ahead, along -x", turned.Inverse() * Perspective(0.1f, 100.0f), V3(-5.0f, 0.0f, 0.0f), 0.5f,
+	     false},
+	    {"turned: behind, along +x", turned.Inverse() * Perspective(0.1f, 100.0f), V3(15.0f, 0.0f, 0.0f),
+	     0.5f, true},
+	    {"turned: to the side", turned.Inverse() * Perspective(0.1f, 100.0f), V3(5.0f, 0.0f, 10.0f), 0.5f,
+	     true},
+	    {"a broken matrix culls nothing", zero, V3(1000.0f, -1000.0f, 5.0f), 0.0f, false},
+	};
+	for (const auto& test : cases)
+	{
+		Intersection::Frustum frustum;
+		frustum.Init(test.myViewProjection);
+		EXPECT_EQ(frustum.IsSphereOutside(test.myCenter, test.myRadius), test.myOutsideFlag) << test.myName;
+	}
 }

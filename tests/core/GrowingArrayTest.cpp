@@ -2,7 +2,6 @@
 
 #include <gtest/gtest.h>
 
-#include <numeric>
 #include <string>
 #include <vector>
 
@@ -13,6 +12,25 @@ namespace
 template <typename T> std::vector<T> Contents(const GrowingArray<T>& anArray)
 {
 	return std::vector<T>(anArray.begin(), anArray.end());
+}
+
+// 0, aStep, 2 * aStep, ... (aCount values).
+std::vector<int> Sequence(int aCount, int aStep = 1)
+{
+	std::vector<int> values;
+	for (int i = 0; i < aCount; ++i)
+	{
+		values.push_back(i * aStep);
+	}
+	return values;
+}
+
+void AddAll(GrowingArray<int>& anArray, const std::vector<int>& someValues)
+{
+	for (const int value : someValues)
+	{
+		anArray.Add(value);
+	}
 }
 
 struct DestructionCounter
@@ -40,58 +58,58 @@ struct PoisonOnDestroy
 	int myValue = 0;
 	~PoisonOnDestroy() { myValue = -1; }
 };
+
+std::vector<std::string> ourReports;
 } // namespace
 
 TEST(GrowingArray, GrowsByTheFixedStepAndKeepsOrder)
 {
 	GrowingArray<int> array(2000, 2000, true);
-	for (int i = 0; i <= 2000; ++i)
-	{
-		ASSERT_EQ(array.GetCapacity(), 2000) << "before add " << i;
-		array.Add(i * 3);
-	}
+	AddAll(array, Sequence(2000, 3));
+	EXPECT_EQ(array.GetCapacity(), 2000);
+	array.Add(6000);
 	EXPECT_EQ(array.GetCapacity(), 4000);
-	ASSERT_EQ(array.Count(), 2001);
-	for (int i = 0; i < 2001; ++i)
-	{
-		ASSERT_EQ(array[i], i * 3) << "at index " << i;
-	}
+	EXPECT_EQ(Contents(array), Sequence(2001, 3));
 
 	// The step is the increase size, not the first capacity; a step of zero still
-	// makes room for the one element.
-	std::vector<int> zeroTo35(36);
-	std::iota(zeroTo35.begin(), zeroTo35.end(), 0);
+	// makes room for the one element; ReInit empties and takes the new step.
 	for (const auto& [step, finalCapacity] : {std::pair{10, 45}, std::pair{0, 36}})
 	{
 		GrowingArray<int> small(25, step, true);
-		for (int i = 0; i < 36; ++i)
-		{
-			small.Add(i);
-		}
+		AddAll(small, Sequence(36));
 		EXPECT_EQ(small.GetCapacity(), finalCapacity) << "step " << step;
-		EXPECT_EQ(Contents(small), zeroTo35) << "step " << step;
+		EXPECT_EQ(Contents(small), Sequence(36)) << "step " << step;
+		small.ReInit(12, 3, true);
+		EXPECT_EQ(small.Count(), 0);
+		EXPECT_EQ(small.GetCapacity(), 12);
+		AddAll(small, Sequence(13));
+		EXPECT_EQ(small.GetCapacity(), 15) << "growth uses the new step";
 	}
+
+	// The argument of Add may live in the storage that its growth replaces.
+	GrowingArray<PoisonOnDestroy> own(2, 2, true);
+	own.Add(PoisonOnDestroy{7});
+	own.Add(PoisonOnDestroy{8});
+	own.Add(own[0]);
+	ASSERT_EQ(own.Count(), 3);
+	EXPECT_EQ(own[2].myValue, 7);
 }
 
-TEST(GrowingArray, RemoveCyclicMovesTheLastElementIntoTheHole)
+TEST(GrowingArray, RemovingAndClearing)
 {
+	// RemoveCyclicAtIndex moves the last element into the hole.
 	for (const auto& [index, expected] :
-	     {std::pair{0, std::vector<char>{'C', 'B'}}, std::pair{2, std::vector<char>{'A', 'B'}}})
+	     {std::pair{0, std::vector<int>{2, 1}}, std::pair{2, std::vector<int>{0, 1}}})
 	{
-		GrowingArray<char> array(4, 4, true);
-		for (char c : {'A', 'B', 'C'})
-		{
-			array.Add(c);
-		}
+		GrowingArray<int> array(4, 4, true);
+		AddAll(array, Sequence(3));
 		array.RemoveCyclicAtIndex(index);
 		EXPECT_EQ(Contents(array), expected) << "removing index " << index;
 		array.RemoveLast();
-		EXPECT_EQ(Contents(array), std::vector<char>{expected[0]});
+		EXPECT_EQ(Contents(array), std::vector<int>{expected[0]});
 	}
-}
 
-TEST(GrowingArray, ClearingKeepsTheStorage)
-{
+	// RemoveAll keeps the storage.
 	GrowingArray<std::string> strings(8, 8, true);
 	strings.Add("first");
 	strings.Add("second");
@@ -115,20 +133,6 @@ TEST(GrowingArray, ClearingKeepsTheStorage)
 	          std::vector<DestructionCounter*>(3, nullptr));
 }
 
-TEST(GrowingArray, ReInitStartsEmptyWithTheNewCapacity)
-{
-	GrowingArray<int> array(5, 5, true);
-	array.Add(1);
-	array.ReInit(12, 3, true);
-	EXPECT_EQ(array.Count(), 0);
-	EXPECT_EQ(array.GetCapacity(), 12);
-	for (int i = 0; i < 13; ++i)
-	{
-		array.Add(i);
-	}
-	EXPECT_EQ(array.GetCapacity(), 15) << "growth uses the new step";
-}
-
 TEST(GrowingArray, SafeModeAssignsOnGrowthRawModeCopiesBytes)
 {
 	// Four Adds assign in both modes; safe mode also assigns the three moved elements.
@@ -141,42 +145,20 @@ TEST(GrowingArray, SafeModeAssignsOnGrowthRawModeCopiesBytes)
 			array.Add(AssignmentCounter{i * 10});
 		}
 		EXPECT_EQ(AssignmentCounter::ourAssignmentCount, expectedAssignments) << "safe mode " << safeMode;
-		for (int i = 0; i < 4; ++i)
-		{
-			EXPECT_EQ(array[i].myValue, i * 10) << "safe mode " << safeMode;
-		}
+		EXPECT_EQ((std::vector<int>{array[0].myValue, array[1].myValue, array[2].myValue, array[3].myValue}),
+		          Sequence(4, 10));
 	}
 }
-
-TEST(GrowingArray, AddOfAnOwnElementSurvivesGrowth)
-{
-	GrowingArray<PoisonOnDestroy> array(2, 2, true);
-	array.Add(PoisonOnDestroy{7});
-	array.Add(PoisonOnDestroy{8});
-	array.Add(array[0]); // the argument lives in the storage this growth replaces
-	ASSERT_EQ(array.Count(), 3);
-	EXPECT_EQ(array[2].myValue, 7);
-}
-
-namespace
-{
-std::vector<std::string> ourReports;
-void RecordReport(int, const char* aFunctionName, const char* aMessage)
-{
-	ourReports.push_back(std::string(aFunctionName) + ": " + aMessage);
-}
-} // namespace
 
 TEST(GrowingArray, RefusesToGrowPastTheCounterRange)
 {
 	ourReports.clear();
 	const CoreReport::Handler previous = CoreReport::GetCriticalHandler();
-	CoreReport::SetCriticalHandler(&RecordReport);
+	CoreReport::SetCriticalHandler([](int, const char* aFunctionName, const char* aMessage) {
+		ourReports.push_back(std::string(aFunctionName) + ": " + aMessage);
+	});
 	GrowingArray<int> array(2000, 2000, true);
-	for (int i = 0; i < 65535; ++i)
-	{
-		array.Add(i);
-	}
+	AddAll(array, Sequence(65535));
 	EXPECT_TRUE(ourReports.empty());
 	EXPECT_EQ(array.GetCapacity(), 65535) << "the last step is cut to the counter's range";
 	array.Add(-1);

@@ -63,7 +63,7 @@ M44 Distinct()
 }
 } // namespace
 
-TEST(MathVector, LengthAndNormalize)
+TEST(MathVector, LengthNormalizeAndTranslation)
 {
 	V3 v(3.0f, 4.0f, 0.0f);
 	EXPECT_EQ(v.LengthFast(), 25.0f);
@@ -80,10 +80,8 @@ TEST(MathVector, LengthAndNormalize)
 	withNan.Normalize();
 	EXPECT_EQ(withNan.y, 2.0f);
 	EXPECT_EQ(withNan.z, 3.0f);
-}
 
-TEST(MathVector, FromVector3PicksUpTranslationButDirectionsDoNot)
-{
+	// A point from a Vector3 picks up translation; a direction does not.
 	const V4 moved = V4(V3(1.0f, 2.0f, 3.0f)) * Translation(10.0f, 20.0f, 30.0f);
 	EXPECT_VEC3_NEAR(moved, V3(11.0f, 22.0f, 33.0f), 0.0f);
 	EXPECT_EQ(moved.w, 1.0f);
@@ -177,7 +175,7 @@ TEST(MathMatrix, SetRotationFromForward)
 	}
 }
 
-TEST(MathMatrix, InverseOfSingularOrNanMatrixIsIdentity)
+TEST(MathMatrix, InverseUndoesTransformsAndIsIdentityForSingularOrNan)
 {
 	M44 flattened = Scale(1.0f, 0.0f, 1.0f);
 	flattened.SetPosition(V3(4.0f, 5.0f, 6.0f));
@@ -187,10 +185,7 @@ TEST(MathMatrix, InverseOfSingularOrNanMatrixIsIdentity)
 	{
 		ExpectMatrixNear(matrix.Inverse(), M44(), 0.0f);
 	}
-}
 
-TEST(MathMatrix, InverseUndoesRigidAndScaledTransforms)
-{
 	std::mt19937 generator(20240611u);
 	std::uniform_real_distribution<float> angle(-3.1f, 3.1f);
 	std::uniform_real_distribution<float> offset(-100.0f, 100.0f);
