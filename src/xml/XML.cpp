@@ -9,6 +9,7 @@
 
 #include "engine/Debug.h"
 #include "platform/paths/Paths.h"
+#include "platform/xmlscan/NestingScan.h"
 #include "xml/XMLElement.h"
 
 namespace
@@ -45,6 +46,17 @@ const char* NameOf(const TiXmlNode* aNode)
 {
 	return aNode != nullptr ? aNode->Value() : "";
 }
+
+std::string ReadAll(FILE* aFile)
+{
+	std::string text;
+	char buffer[65536];
+	for (size_t count = 0; (count = std::fread(buffer, 1, sizeof(buffer), aFile)) > 0;)
+	{
+		text.append(buffer, count);
+	}
+	return text;
+}
 } // namespace
 
 XML::XML(std::string aFileName)
@@ -73,9 +85,21 @@ void XML::LoadDocument(std::string aFileName)
 	myElementStack.RemoveAll();
 
 	bool loadedFlag = false;
+	std::string tooDeep;
 	if (FILE* file = std::fopen(Paths::Resolve(aFileName).c_str(), "rb"))
 	{
-		loadedFlag = myDocument->LoadFile(file);
+		// TinyXML parses nested elements by recursion: a file nested thousands deep would
+		// overflow the stack inside the parser, so such a file is refused before parsing.
+		const std::string text = ReadAll(file);
+		const int line = XmlScan::FindTooDeep(text, XmlScan::ourMaxDepth);
+		if (line > 0)
+		{
+			tooDeep = ": " + XmlScan::Describe(line, XmlScan::ourMaxDepth);
+		}
+		else if (std::fseek(file, 0, SEEK_SET) == 0)
+		{
+			loadedFlag = myDocument->LoadFile(file);
+		}
 		std::fclose(file);
 	}
 	if (!loadedFlag)
@@ -88,7 +112,7 @@ void XML::LoadDocument(std::string aFileName)
 			myDocument->SetError(TiXmlBase::TIXML_ERROR_OPENING_FILE, nullptr, nullptr,
 			                     TIXML_ENCODING_UNKNOWN);
 		}
-		Error("Could not open file [" + aFileName + "]");
+		Error("Could not open file [" + aFileName + "]" + tooDeep);
 	}
 }
 

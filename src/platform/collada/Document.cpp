@@ -6,6 +6,7 @@
 
 #include "platform/collada/Reader.h"
 #include "platform/paths/Paths.h"
+#include "platform/xmlscan/NestingScan.h"
 
 namespace Collada
 {
@@ -65,6 +66,13 @@ bool Document::LoadFromMemory(const void* someBytes, size_t aSize, std::string& 
 	// TinyXML parses a terminated string; a zero byte inside the data ends the text there, which
 	// then fails as an unfinished document.
 	const std::string text(static_cast<const char*>(someBytes), aSize);
+	// TinyXML parses nested elements by recursion; a document nested thousands deep would
+	// overflow the stack inside the parser, so it is refused before parsing.
+	if (const int line = XmlScan::FindTooDeep(text, XmlScan::ourMaxDepth); line > 0)
+	{
+		anErrorOut = aName + ": " + XmlScan::Describe(line, XmlScan::ourMaxDepth);
+		return false;
+	}
 	TiXmlDocument xml;
 	xml.Parse(text.c_str(), nullptr, TIXML_ENCODING_UTF8);
 	if (xml.Error())
