@@ -37,6 +37,8 @@ constexpr size_t ourMinTransformationBytes = 4 + ourMatrixBytes;
 constexpr size_t ourMinNamedRecordBytes = 4 + 3 * 4 + 4 + ourMatrixBytes;
 constexpr size_t ourMinMatrixRecordBytes = 3 * ourMatrixBytes + 4;
 constexpr size_t ourMinCurveKeyBytes = 2 * 8;
+// The most elements a GrowingArray (surfaces, child nodes, child models) holds.
+constexpr int ourMaxArrayCount = std::numeric_limits<unsigned short>::max();
 
 // D3D primitive topologies that the engine draws.
 constexpr int ourTopologyLineList = 2;
@@ -89,11 +91,13 @@ public:
 	}
 
 private:
-	bool Fail(const std::string& aWhat)
+	bool Fail(const std::string& aWhat) { return FailAt(aWhat, myOffset); }
+
+	bool FailAt(const std::string& aWhat, size_t anOffset)
 	{
 		if (myError.empty())
 		{
-			myError = aWhat + " at byte " + std::to_string(myOffset);
+			myError = aWhat + " at byte " + std::to_string(anOffset);
 		}
 		return false;
 	}
@@ -143,6 +147,22 @@ private:
 		if (aCount < 0 || static_cast<size_t>(aCount) > Left() / aMinBytes)
 		{
 			return Fail(std::string(aWhat) + " " + std::to_string(aCount) + " does not fit the file");
+		}
+		return true;
+	}
+
+	// As Count, for records that a GrowingArray keeps: it holds at most 65,535, and would refuse
+	// more with a critical report of its own rather than this reader's message.
+	bool ArrayCount(int& aCount, size_t aMinBytes, const char* aWhat)
+	{
+		if (!Count(aCount, aMinBytes, aWhat))
+		{
+			return false;
+		}
+		if (aCount > ourMaxArrayCount)
+		{
+			return Fail(std::string(aWhat) + " " + std::to_string(aCount) + " exceeds " +
+			            std::to_string(ourMaxArrayCount));
 		}
 		return true;
 	}
@@ -198,7 +218,7 @@ private:
 		std::string name;
 		int childCount = 0;
 		if (!transformation || !Matrix(matrix, "node matrix") || !String(name, "node name") ||
-		    !Count(childCount, ourMinNodeBytes, "child node count"))
+		    !ArrayCount(childCount, ourMinNodeBytes, "child node count"))
 		{
 			return nullptr;
 		}
@@ -314,6 +334,35 @@ private:
 		return curves;
 	}
 
+	// Every index drawn must name a vertex: the GPU would otherwise read past the vertex
+	// buffer. The offset in the report is the offending index's own.
+	bool IndicesInRange(const uint8_t* someIndices, size_t anOffset, int aCount, int anIndexBytes,
+	                    int aVertexCount)
+	{
+		for (int index = 0; index < aCount; ++index)
+		{
+			const uint8_t* at = someIndices + static_cast<size_t>(index) * static_cast<size_t>(anIndexBytes);
+			uint32_t value = 0;
+			if (anIndexBytes == 2)
+			{
+				uint16_t narrow = 0;
+				std::memcpy(&narrow, at, sizeof(narrow));
+				value = narrow;
+			}
+			else
+			{
+				std::memcpy(&value, at, sizeof(value));
+			}
+			if (value >= static_cast<uint32_t>(aVertexCount))
+			{
+				return FailAt("index " + std::to_string(index) + " is " + std::to_string(value) +
+				                  ", past the " + std::to_string(aVertexCount) + " vertices,",
+				              anOffset + static_cast<size_t>(index) * static_cast<size_t>(anIndexBytes));
+			}
+		}
+		return true;
+	}
+
 	// aSize (not negative) bytes in place; null when the file ends before them.
 	const uint8_t* Take(int aSize, const char* aWhat)
 	{
@@ -361,12 +410,18 @@ private:
 		{
 			return nullptr;
 		}
+		if (!nullObject && indexFormat != Model::ourIndexFormatR16 && indexFormat != Model::ourIndexFormatR32)
+		{
+			Fail("unsupported index format " + std::to_string(indexFormat));
+			return nullptr;
+		}
 		const int indexBytes = indexFormat == Model::ourIndexFormatR16 ? 2 : 4;
 		if (!nullObject && static_cast<int64_t>(indexCount) * indexBytes > indexSize)
 		{
 			Fail(std::to_string(indexCount) + " indices do not fit " + std::to_string(indexSize) + " bytes");
 			return nullptr;
 		}
+		const size_t indexOffset = myOffset;
 		const uint8_t* indexData = Take(indexSize, "index data");
 		if (indexData == nullptr)
 		{
@@ -389,10 +444,22 @@ private:
 			     " differ");
 			return nullptr;
 		}
+		if (!nullObject && stride < GetVertexTypeStride(vertexType))
+		{
+			// The layout's elements would be read past each vertex, and past the buffer's end.
+			Fail("vertex stride " + std::to_string(stride) + " is less than the " +
+			     std::to_string(GetVertexTypeStride(vertexType)) + " bytes of vertex type " +
+			     std::to_string(vertexType));
+			return nullptr;
+		}
 		if (!nullObject && static_cast<int64_t>(vertexCount) * stride > vertexSize)
 		{
 			Fail(std::to_string(vertexCount) + " vertices do not fit " + std::to_string(vertexSize) +
 			     " bytes");
+			return nullptr;
+		}
+		if (!nullObject && !IndicesInRange(indexData, indexOffset, indexCount, indexBytes, vertexCount))
+		{
 			return nullptr;
 		}
 		const uint8_t* vertexData = Take(vertexSize, "vertex data");
@@ -417,7 +484,7 @@ private:
 			return nullptr;
 		}
 		int childCount = 0;
-		if (!Count(childCount, ourMinModelBytes, "child model count"))
+		if (!ArrayCount(childCount, ourMinModelBytes, "child model count"))
 		{
 			return nullptr;
 		}
@@ -436,7 +503,7 @@ private:
 	bool ReadSurfaces(Model& aModel, int anIndexCount)
 	{
 		int surfaceCount = 0;
-		if (!Count(surfaceCount, ourMinSurfaceBytes, "surface count"))
+		if (!ArrayCount(surfaceCount, ourMinSurfaceBytes, "surface count"))
 		{
 			return false;
 		}

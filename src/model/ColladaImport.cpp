@@ -6,6 +6,7 @@
 #include <cmath>
 #include <cstdint>
 #include <cstring>
+#include <limits>
 #include <numbers>
 #include <unordered_map>
 #include <utility>
@@ -46,6 +47,9 @@ struct LayoutElement
 	int mySize;
 	const Collada::Source* mySource; // null for the skin's two words
 };
+
+// The most nodes of a scene, and polygon sets (surfaces) of a geometry: what a GrowingArray holds.
+constexpr int ourMaxNodeCount = std::numeric_limits<unsigned short>::max();
 
 // The corner key: the source indices of position, normal, colour, texture
 // coordinate, geometry tangent, texture tangent, geometry binormal and texture
@@ -283,6 +287,15 @@ private:
 		{
 			return true;
 		}
+		// A node's children live in a GrowingArray of at most 65,535; and nodes instanced by
+		// nodes that are themselves instanced several times multiply, so a small document could
+		// otherwise expand into millions of nodes.
+		if (++myNodeCount > ourMaxNodeCount)
+		{
+			myError = "the scene expands to more than " + std::to_string(ourMaxNodeCount) +
+			          " nodes (at node \"" + aNode.myId + "\")";
+			return false;
+		}
 		auto* child = new ModelNode();
 		aParent.AddChild(child);
 		child->SetName(!aNode.myName.empty() ? aNode.myName : aNode.myId);
@@ -460,6 +473,12 @@ private:
 			stride += element.mySize;
 		}
 
+		if (mesh->mySets.size() > static_cast<size_t>(ourMaxNodeCount))
+		{
+			myError = "geometry \"" + aGeometry.myId + "\" has more than " + std::to_string(ourMaxNodeCount) +
+			          " polygon sets";
+			return false;
+		}
 		size_t indexCount = 0;
 		for (const Collada::PolygonSet& set : mesh->mySets)
 		{
@@ -630,6 +649,7 @@ private:
 	std::vector<AlTextureBinding>& myBindings;
 	std::vector<AlTextureBinding> myPendingBindings; // of the model being built
 	std::string myError;
+	int myNodeCount = 0;
 };
 } // namespace
 

@@ -12,6 +12,18 @@
 
 namespace
 {
+// The fields of Bytes::SmallModel that the damaged-file cases change.
+struct ModelFields
+{
+	int myVertexType = 2;
+	int mySecondType = 2;
+	int myIndexCount = 3;
+	int myIndexFormat = 42;
+	int myIndices[3] = {0, 0, 0}; // 12 bytes, read as three 32-bit or six 16-bit indices
+	int myVertexSize = 32;
+	int myStride = 32;
+};
+
 // Builds a file image field by field, as the format lists them.
 class Bytes
 {
@@ -42,12 +54,16 @@ public:
 	}
 	// A model block of vertex type 2 with one vertex, three 32-bit indices, one
 	// surface with one texture, no animation data and no child models.
-	Bytes& SmallModel(int aVertexType = 2, int aSecondType = 2, int anIndexCount = 3, int aVertexSize = 32)
+	Bytes& SmallModel(const ModelFields& someFields = {})
 	{
-		Int(0).Int(42).Int(aVertexType);
-		Int(anIndexCount).Int(12).Int(42).Int(0).Int(0).Int(0);
-		Int(1).Int(aVertexSize).Int(32).Int(aSecondType);
-		for (int index = 0; index < aVertexSize / 4; ++index)
+		Int(0).Int(42).Int(someFields.myVertexType);
+		Int(someFields.myIndexCount).Int(12).Int(someFields.myIndexFormat);
+		for (int index : someFields.myIndices)
+		{
+			Int(index);
+		}
+		Int(1).Int(someFields.myVertexSize).Int(someFields.myStride).Int(someFields.mySecondType);
+		for (int index = 0; index < someFields.myVertexSize / 4; ++index)
 		{
 			Float(static_cast<float>(index));
 		}
@@ -181,19 +197,43 @@ TEST(AlFileTest, DamagedFilesFailWithTheirReason)
 	    {"hierarchy children past the end",
 	     [](Bytes& aFile) { aFile.Int(2).Int(0).Int(1).Int(0x10000000).Matrix(0.0f).String("r").Int(0); },
 	     "transformation child count"},
-	    {"negative vertex data size", [](Bytes& aFile) { aFile.Int(2).Int(1).SmallModel(2, 2, 3, -4); },
+	    {"negative vertex data size",
+	     [](Bytes& aFile) { aFile.Int(2).Int(1).SmallModel({.myVertexSize = -4}); },
 	     "vertex data size -4 does not fit"},
-	    {"indices past the index data", [](Bytes& aFile) { aFile.Int(2).Int(1).SmallModel(2, 2, 4); },
+	    {"indices past the index data",
+	     [](Bytes& aFile) { aFile.Int(2).Int(1).SmallModel({.myIndexCount = 4}); },
 	     "4 indices do not fit 12 bytes"},
-	    {"vertex types differ", [](Bytes& aFile) { aFile.Int(2).Int(1).SmallModel(2, 3); },
+	    {"vertex types differ", [](Bytes& aFile) { aFile.Int(2).Int(1).SmallModel({.mySecondType = 3}); },
 	     "vertex types 2 and 3 differ"},
-	    {"unknown vertex type", [](Bytes& aFile) { aFile.Int(2).Int(1).SmallModel(12, 12); },
+	    {"unknown vertex type",
+	     [](Bytes& aFile) { aFile.Int(2).Int(1).SmallModel({.myVertexType = 12, .mySecondType = 12}); },
 	     "unknown vertex type 12"},
+	    // The index data starts at byte 32; each index must name one of the model's vertices.
+	    {"32-bit index past the vertices",
+	     [](Bytes& aFile) {
+		     aFile.Int(2).Int(1).SmallModel({.myIndices = {0, 0, 1}});
+	     },
+	     "index 2 is 1, past the 1 vertices, at byte 40"},
+	    {"16-bit index past the vertices",
+	     [](Bytes& aFile) {
+		     aFile.Int(2).Int(1).SmallModel({.myIndexFormat = 57, .myIndices = {0x50000, 0, 0}});
+	     },
+	     "index 1 is 5, past the 1 vertices, at byte 34"},
+	    {"unknown index format", [](Bytes& aFile) { aFile.Int(2).Int(1).SmallModel({.myIndexFormat = 7}); },
+	     "unsupported index format 7"},
+	    {"stride under the layout", [](Bytes& aFile) { aFile.Int(2).Int(1).SmallModel({.myStride = 12}); },
+	     "vertex stride 12 is less than the 32 bytes of vertex type 2"},
 	    {"curve keys past the end",
 	     [](Bytes& aFile) {
 		     aFile.Int(2).Int(0).Int(0).Int(0).Float(0).Float(0).Int(0).Int(1).Double(0).Double(0).Int(5000);
 	     },
 	     "curve key count 5000 does not fit"},
+	    {"more children than an array holds",
+	     [](Bytes& aFile) {
+		     aFile.Int(2).Int(0).PlainNodeTail("r", 65536);
+		     aFile.myBytes.resize(aFile.myBytes.size() + 65536 * 80);
+	     },
+	     "child node count 65536 exceeds 65535"},
 	    {"bytes after the root", [](Bytes& aFile) { aFile.Int(2).Int(0).PlainNodeTail("r", 0).Int(0); },
 	     "4 bytes after the root node"},
 	    {"nesting too deep",
