@@ -1,6 +1,7 @@
 #include "model/VertexTypes.h"
 
 #include <array>
+#include <string_view>
 
 namespace Zeph
 {
@@ -47,6 +48,18 @@ int GetVertexTypeStride(int aVertexType)
 		stride += element.mySize;
 	}
 	return stride;
+}
+
+bool HasBones(int aVertexType)
+{
+	for (const VertexElement& element : GetVertexTypeElements(aVertexType))
+	{
+		if (std::string_view(element.mySemanticName) == ourBones.mySemanticName)
+		{
+			return true;
+		}
+	}
+	return false;
 }
 
 void BuildInputLayoutDesc(int aVertexType, GrowingArray<Gpu::InputElement>& someElements)

@@ -40,6 +40,9 @@ struct VertexElement
 std::span<const VertexElement> GetVertexTypeElements(int aVertexType);
 // The sum of the element sizes; 0 for a number that is no vertex type.
 int GetVertexTypeStride(int aVertexType);
+// Whether the layout carries bone indices ("BONES"): the renderer draws such models as
+// skinned ones (types 5, 6 and 7).
+bool HasBones(int aVertexType);
 // Replaces the contents of someElements with the type's layout description (left
 // empty for a number that is no vertex type).
 void BuildInputLayoutDesc(int aVertexType, GrowingArray<Gpu::InputElement>& someElements);

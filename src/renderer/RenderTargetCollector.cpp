@@ -14,10 +14,10 @@ namespace Zeph
 {
 namespace
 {
+// Skinned surfaces are those of models with bones, whichever vertex type carries them.
 bool IsSkinned(const Model& aModel)
 {
-	return aModel.GetVertexType() == VERTEX_TYPE_POS_WEIGHT_BONES_NORM_UV_TAN ||
-	       aModel.GetVertexType() == VERTEX_TYPE_POS_WEIGHT_BONES_NORM_UV_TAN_BI;
+	return HasBones(aModel.GetVertexType());
 }
 } // namespace
 

@@ -17,7 +17,10 @@ namespace Zeph
 {
 namespace
 {
-// Skinned models draw in their bind pose until animation drives them: identity bones.
+// Bone matrices come from the animation layers, which play nothing in the editor: every model
+// with bones (vertex types 5, 6 and 7) draws in its bind pose, with identity bones. An effect
+// without a "Bones" array (the plain position shader of types 5 and 7) draws positions unskinned,
+// which is the same pose.
 void SetBindPose(Effect& anEffect)
 {
 	Fx::Variable* bones = anEffect.GetEffect()->GetVariableByName("Bones");
@@ -104,8 +107,7 @@ void RenderTargetHelper::DrawBatch(const RenderBatch& aBatch, Effect& anEffect, 
 	}
 	engine->GetRenderer().GetMaterialDefaults().Apply(anEffect);
 	surface->ActivateTextures();
-	if (model->GetVertexType() == VERTEX_TYPE_POS_WEIGHT_BONES_NORM_UV_TAN ||
-	    model->GetVertexType() == VERTEX_TYPE_POS_WEIGHT_BONES_NORM_UV_TAN_BI)
+	if (HasBones(model->GetVertexType()))
 	{
 		SetBindPose(anEffect);
 	}

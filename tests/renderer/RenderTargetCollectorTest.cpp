@@ -3,6 +3,7 @@
 // storage kept over Reset, the camera block.
 #include <gtest/gtest.h>
 #include <string>
+#include <vector>
 
 #include "engine/Camera.h"
 #include "engine/CameraInstance.h"
@@ -87,19 +88,24 @@ TEST(RenderTargetCollectorTest, CategoriesAndSkinningPickTheLists)
 	    {Zeph::RENDER_CATEGORY_FORWARD, true, {0, 0, 0, 0, 0, 0, 0}},
 	    {Zeph::RENDER_CATEGORY_SHADOW_CASTING_OUTLINE, true, {0, 1, 0, 0, 0, 0, 1}},
 	};
+	// Every vertex type with bones (weights and bones, with or without tangents) is skinned.
+	const std::vector<int> staticTypes = {0, 1, 2, 3, 4};
+	const std::vector<int> skinnedTypes = {5, 6, 7};
 	for (const Case& test : cases)
 	{
-		OneSurfaceModel model;
-		model.myModel.SetVertexType(test.mySkinnedFlag ? Zeph::VERTEX_TYPE_POS_WEIGHT_BONES_NORM_UV_TAN_BI
-		                                               : Zeph::VERTEX_TYPE_POS_NORM_UV_TAN_BI);
-		Collector collector;
-		collector.AddInstance(test.myCategory, model.myModel, model.GetSurface(), At(0), At(0), InRoom(-1));
-		for (int list = 0; list < Collector::BATCH_LIST_COUNT; ++list)
+		for (int vertexType : test.mySkinnedFlag ? skinnedTypes : staticTypes)
 		{
-			EXPECT_EQ(collector.GetBatches(static_cast<Collector::BatchListType>(list)).Count(),
-			          test.myCounts[list])
-			    << "category " << test.myCategory << (test.mySkinnedFlag ? " skinned" : " static") << ", list "
-			    << list;
+			OneSurfaceModel model;
+			model.myModel.SetVertexType(vertexType);
+			Collector collector;
+			collector.AddInstance(test.myCategory, model.myModel, model.GetSurface(), At(0), At(0),
+			                      InRoom(-1));
+			for (int list = 0; list < Collector::BATCH_LIST_COUNT; ++list)
+			{
+				EXPECT_EQ(collector.GetBatches(static_cast<Collector::BatchListType>(list)).Count(),
+				          test.myCounts[list])
+				    << "category " << test.myCategory << ", vertex type " << vertexType << ", list " << list;
+			}
 		}
 	}
 }
