@@ -39,6 +39,7 @@
 #include "editor/LumoraMode.h"
 #include "editor/PointLightStruct.h"
 #include "editor/SpotLightStruct.h"
+#include "level/KeptContent.h"
 #include "renderer/DecalData.h"
 #include "renderer/PointLightData.h"
 #include "renderer/SpotLightData.h"
@@ -224,6 +225,9 @@ private:
 	// (end of picking and editing helpers)
 
 	// Private helpers of level loading and saving (src/level/).
+	// The next free path node ID from myNodeIDCounter on (never 0 or less, never one that a
+	// node or kept content holds); the counter moves past it.
+	int TakeNodeID();
 	// (end of level helpers)
 
 	static LumoraWrapper* ourInstance;
@@ -258,6 +262,9 @@ private:
 	std::map<std::string, bool> myEntityShadowCasterBank;
 	std::map<std::string, DecalType> myDecalTypes;
 	GrowingArray<Zeph::DecalData> myDecals{ourArraySize, ourArraySize, true};
+	// What the loaded level's lights, path graph and decals held beyond what the arrays
+	// hold; the per-record lists run beside the arrays (src/level/KeptContent.h).
+	KeptContent myKept;
 	Zeph::Texture* myTexture = nullptr;
 	Zeph::Texture* myNormTexture = nullptr;
 	std::unique_ptr<Zeph::Instance> myDecalBox;

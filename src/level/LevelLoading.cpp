@@ -4,12 +4,20 @@
 // Every value a record requires is read through the cursor, whose report of a missing file,
 // element or attribute ends the editor under the facade's log. What a level may lack without
 // harm (a whole section, an edge's node, a decal's type) is passed over, with a message where
-// the designer lost something that the file held.
+// the scene lacks something that the file holds. Nothing of the three files that the editor
+// rewrites is lost, though: what the readers do not take in (records left out, comments,
+// unknown elements and attributes) goes to the facade's kept content, which the next save
+// writes back (KeptContent.h).
 #include "editor/LumoraWrapper.h"
 
 #include <algorithm>
+#include <climits>
 #include <cmath>
+#include <map>
+#include <set>
+#include <span>
 #include <string>
+#include <vector>
 
 #include "core/GrowingArray.h"
 #include "core/Matrix33.h"
@@ -28,6 +36,7 @@
 #include "renderer/CubemapContainer.h"
 #include "renderer/Renderer.h"
 #include "xml/XML.h"
+#include "xml/XMLElement.h"
 
 namespace Lumora
 {
@@ -48,6 +57,65 @@ void ReportLeftOut(int aLine, const char* aFunction, const std::string& aMessage
 std::string LevelFolder(const std::string& aLevel)
 {
 	return "data/XML/levels/" + aLevel;
+}
+
+// A value that a reader takes from a record: attribute myName of the record's first child
+// myTag, or of the record itself when myTag is empty. An empty name is the first attribute,
+// whatever it is called (a single value).
+struct ReadValue
+{
+	const char* myTag;
+	const char* myName;
+};
+
+constexpr ReadValue ourPointLightValues[] = {{"position", "x"}, {"position", "y"}, {"position", "z"},
+                                             {"color", "r"},    {"color", "g"},    {"color", "b"},
+                                             {"color", "a"},    {"falloff", ""}};
+constexpr ReadValue ourSpotLightValues[] = {
+    {"position", "x"},  {"position", "y"},   {"position", "z"},  {"color", "r"},     {"color", "g"},
+    {"color", "b"},     {"color", "a"},      {"falloff", ""},    {"direction", "x"}, {"direction", "y"},
+    {"direction", "z"}, {"angles", "inner"}, {"angles", "outer"}};
+constexpr ReadValue ourNodeValues[] = {{"", "id"}, {"position", "x"}, {"position", "y"}, {"position", "z"}};
+constexpr ReadValue ourEdgeValues[] = {
+    {"connections", "firstID"}, {"connections", "secondID"}, {"distance", ""}};
+constexpr ReadValue ourDecalValues[] = {
+    {"decal-type", ""}, {"position", "x"}, {"position", "y"}, {"position", "z"}, {"norm", "x"},
+    {"norm", "y"},      {"norm", "z"},     {"color", "r"},    {"color", "g"},    {"color", "b"},
+    {"color", "a"},     {"size", ""},      {"depth", ""}};
+
+// What the record under the cursor holds beyond someValues, as kept text: empty when the
+// record holds nothing else. Each child that was read stays, emptied of the values read, as
+// the place where the saver's child goes (XMLElement::AddKept).
+std::string PartsBeyond(const XML& aXML, std::span<const ReadValue> someValues)
+{
+	XMLElement record("record");
+	if (!aXML.CopyCurrentElement(record))
+	{
+		return {};
+	}
+	std::vector<std::string> tags;
+	for (const ReadValue& value : someValues)
+	{
+		record.RemoveValue(value.myTag, value.myName);
+		if (*value.myTag != '\0' && std::find(tags.begin(), tags.end(), value.myTag) == tags.end())
+		{
+			tags.emplace_back(value.myTag);
+		}
+	}
+	return record.HasContentBeyond(tags) ? record.GetText() : std::string();
+}
+
+// The section under the cursor without the records named aRecord that the reader took (flagged
+// in document order), as kept text.
+std::string SectionBeyond(const XML& aXML, const char* aRecord, const std::vector<bool>& someTakenFlags)
+{
+	XMLElement section("section");
+	if (!aXML.CopyCurrentElement(section))
+	{
+		return {};
+	}
+	section.RemoveChildren(aRecord, someTakenFlags, "");
+	return section.GetText();
 }
 
 // Up, right and forward of a spot light from its stored direction. Only the direction is kept
@@ -175,6 +243,26 @@ void LumoraWrapper::ParseEntities(const std::string& aLevel)
 		xml.ExitChild();
 	}
 
+	// Each room's cubemap file is looked at once, through the path resolver: a file that is there
+	// but cannot be a cubemap (a plain 2D DDS, a damaged one) is reported, and its room shows
+	// the fallback, as does a room whose ID cannot name a file.
+	std::vector<std::string> roomFiles;
+	for (int roomIndex = 0; roomIndex < myRooms.Count(); ++roomIndex)
+	{
+		std::string file = Zeph::CubemapContainer::GetRoomFile(aLevel, myRooms[roomIndex]->GetID());
+		std::string resolved;
+		std::string problem;
+		if (!file.empty() && Zeph::CubemapContainer::CheckFile(file, resolved, problem) ==
+		                         Zeph::CubemapContainer::FileState::UNUSABLE)
+		{
+			ReportLeftOut(__LINE__, "Lumora::LumoraWrapper::ParseEntities",
+			              Zeph::CubemapContainer::ourUnusableFileText + file + "] of room " +
+			                  std::to_string(roomIndex) + ": " + problem +
+			                  "; the room shows the fallback cubemap");
+			file.clear();
+		}
+		roomFiles.push_back(file);
+	}
 	for (int entity = 0; entity < myEntities.Count(); ++entity)
 	{
 		bool inRoomFlag = false;
@@ -187,8 +275,7 @@ void LumoraWrapper::ParseEntities(const std::string& aLevel)
 				continue;
 			}
 			Zeph::RoomData roomData;
-			roomData.myCubemap =
-			    cubemaps.GetCubemap(roomIndex, "data/Cubemaps/" + aLevel + "/" + room.GetID() + ".dds");
+			roomData.myCubemap = cubemaps.GetCubemap(roomIndex, roomFiles[roomIndex]);
 			roomData.myRoomIndex = roomIndex;
 			roomData.myCenter = room.GetCenterPosition();
 			roomData.myMax = room.GetMax();
@@ -215,22 +302,34 @@ void LumoraWrapper::ParseLights(const std::string& aPath)
 	myLightGizmos.DeleteAll();
 	myEnvironmentPointLights.RemoveAll();
 	myEnvironmentSpotLights.RemoveAll();
+	myKept.myPointLights.clear();
+	myKept.mySpotLights.clear();
+	myKept.myPointLightParts.clear();
+	myKept.mySpotLightParts.clear();
 
 	XML xml(aPath);
-	// Either section may be missing: it holds no lights.
-	if (xml.GoToElement("point-lights", "", "") && xml.EnterChild("point-light"))
+	// Either section may be missing: it holds no lights. Every light record is taken.
+	std::vector<bool> takenFlags;
+	if (xml.GoToElement("point-lights", "", ""))
 	{
-		do
+		if (xml.EnterChild("point-light"))
 		{
-			Zeph::PointLightData light;
-			light.myPosition = xml.GetVector3Attribute("position");
-			light.myColor = xml.GetVector4Attribute("color");
-			light.myFalloff = xml.GetChildAttribute<float>("falloff", "");
-			myEnvironmentPointLights.Add(light);
-		} while (xml.GoToNextSibling("point-light"));
-		xml.ExitChild();
+			do
+			{
+				Zeph::PointLightData light;
+				light.myPosition = xml.GetVector3Attribute("position");
+				light.myColor = xml.GetVector4Attribute("color");
+				light.myFalloff = xml.GetChildAttribute<float>("falloff", "");
+				myEnvironmentPointLights.Add(light);
+				myKept.myPointLightParts.push_back(PartsBeyond(xml, ourPointLightValues));
+				takenFlags.push_back(true);
+			} while (xml.GoToNextSibling("point-light"));
+			xml.ExitChild();
+		}
+		myKept.myPointLights = SectionBeyond(xml, "point-light", takenFlags);
 	}
 
+	takenFlags.clear();
 	if (xml.GoToElement("spot-lights", "", "") && xml.EnterChild("spot-light"))
 	{
 		do
@@ -243,8 +342,14 @@ void LumoraWrapper::ParseLights(const std::string& aPath)
 			light.myAngles.y = xml.GetChildAttribute<float>("angles", "outer");
 			light.myColor = xml.GetVector4Attribute("color");
 			myEnvironmentSpotLights.Add(light);
+			myKept.mySpotLightParts.push_back(PartsBeyond(xml, ourSpotLightValues));
+			takenFlags.push_back(true);
 		} while (xml.GoToNextSibling("spot-light"));
 		xml.ExitChild();
+	}
+	if (xml.GoToElement("spot-lights", "", ""))
+	{
+		myKept.mySpotLights = SectionBeyond(xml, "spot-light", takenFlags);
 	}
 }
 
@@ -261,11 +366,16 @@ void LumoraWrapper::ParseNodes(const std::string& aPath)
 		myNodes[index].DestroyDebugInstance();
 	}
 	myNodes.RemoveAll();
+	myKept.myNodeGraph.clear();
+	myKept.myNodeParts.clear();
+	myKept.myEdgeParts.clear();
+	myKept.myNodeIDs.clear();
 
 	XML xml(aPath);
 	// Nodes and edges point at each other's elements, so neither array may ever grow (grow =
 	// move): both keep the room they are given here, and what does not fit is refused.
 	myNodes.ReInit(ourArraySize, ourArraySize, true);
+	std::vector<bool> takenNodeFlags;
 	int refusedNodes = 0;
 	if (xml.GoToElement("node-graph", "nodes", "") && xml.EnterChild("node"))
 	{
@@ -273,6 +383,12 @@ void LumoraWrapper::ParseNodes(const std::string& aPath)
 		{
 			if (myNodes.Count() == ourArraySize)
 			{
+				int id = 0;
+				if (xml.TryGetAttribute<int>(id, "id"))
+				{
+					myKept.myNodeIDs.insert(id);
+				}
+				takenNodeFlags.push_back(false);
 				++refusedNodes;
 				continue;
 			}
@@ -281,21 +397,46 @@ void LumoraWrapper::ParseNodes(const std::string& aPath)
 			node.InitDebugInstance();
 			node.SetID(xml.GetAttribute<int>("id"));
 			node.SetPosition(xml.GetVector3Attribute("position"));
+			myKept.myNodeParts.push_back(PartsBeyond(xml, ourNodeValues));
+			takenNodeFlags.push_back(true);
 		} while (xml.GoToNextSibling("node"));
 		xml.ExitChild();
 	}
 	if (refusedNodes > 0)
 	{
 		ReportLeftOut(__LINE__, ourFunction,
-		              "[" + aPath + "] holds more than " + std::to_string(ourArraySize) +
-		                  " path nodes: " + std::to_string(refusedNodes) + " nodes were left out");
+		              "[" + aPath + "] holds more than " + std::to_string(ourArraySize) + " path nodes: " +
+		                  std::to_string(refusedNodes) + " nodes were left out (kept in the file)");
 	}
-	// The last node's ID, not the largest: new nodes continue from where the file ended.
-	myNodeIDCounter = myNodes.Count() > 0 ? myNodes.Last().GetID() + 1 : 1;
+	// The last node's ID, not the largest: new nodes continue from where the file ended
+	// (TakeNodeID passes over the IDs in use).
+	myNodeIDCounter =
+	    myNodes.Count() > 0 && myNodes.Last().GetID() < INT_MAX ? myNodes.Last().GetID() + 1 : 1;
+
+	// An edge is held only where it leaves the graph as the editor keeps it: two distinct nodes,
+	// each found once, each ending at most two edges.
+	std::map<int, int> nodesWithID;
+	for (int index = 0; index < myNodes.Count(); ++index)
+	{
+		++nodesWithID[myNodes[index].GetID()];
+	}
+	const auto nodeWithID = [this](int anID) -> AI::NGNode* {
+		for (int index = 0; index < myNodes.Count(); ++index)
+		{
+			if (myNodes[index].GetID() == anID)
+			{
+				return &myNodes[index];
+			}
+		}
+		return nullptr;
+	};
+	const auto isFull = [](const AI::NGNode& aNode) {
+		return aNode.GetEdgeSlots()[0] != nullptr && aNode.GetEdgeSlots()[1] != nullptr;
+	};
 
 	myEdges.ReInit(ourArraySize, ourArraySize, true);
+	std::vector<bool> takenEdgeFlags;
 	int refusedEdges = 0;
-	// A graph is any set of chains and rings (at most two edges per node); nothing more is checked.
 	if (xml.GoToElement("node-graph", "edges", "") && xml.EnterChild("edge"))
 	{
 		do
@@ -303,34 +444,50 @@ void LumoraWrapper::ParseNodes(const std::string& aPath)
 			const float distance = xml.GetChildAttribute<float>("distance", "");
 			const int firstID = xml.GetChildAttribute<int>("connections", "firstID");
 			const int secondID = xml.GetChildAttribute<int>("connections", "secondID");
+			AI::NGNode* first = nodeWithID(firstID);
+			AI::NGNode* second = nodeWithID(secondID);
+			std::string why;
 			if (myEdges.Count() == ourArraySize)
 			{
 				++refusedEdges;
-				continue;
 			}
-
-			AI::NGNode* first = nullptr;
-			AI::NGNode* second = nullptr;
-			for (int index = 0; index < myNodes.Count(); ++index)
+			else if (firstID == secondID)
 			{
-				AI::NGNode& node = myNodes[index];
-				if (node.GetID() == firstID)
-				{
-					first = &node;
-				}
-				else if (node.GetID() == secondID)
-				{
-					second = &node;
-				}
+				why = "joins a node to itself";
 			}
-			// An edge needs both ends (its length and line are taken from them): an edge to a node
-			// that is not there, or was refused above, is left out.
-			if (first == nullptr || second == nullptr)
+			else if (nodesWithID[firstID] > 1 || nodesWithID[secondID] > 1)
 			{
-				ReportLeftOut(__LINE__, ourFunction,
-				              "Edge between path nodes " + std::to_string(firstID) + " and " +
-				                  std::to_string(secondID) + " in [" + aPath +
-				                  "] names a missing node: left out");
+				const int shared = nodesWithID[firstID] > 1 ? firstID : secondID;
+				why = "names path node " + std::to_string(shared) + ", an ID that " +
+				      std::to_string(nodesWithID[shared]) + " nodes share";
+			}
+			else if (first == nullptr || second == nullptr)
+			{
+				// Its length and line are taken from both ends.
+				why = "names a missing node";
+			}
+			else if (isFull(*first) || isFull(*second))
+			{
+				const int full = isFull(*first) ? firstID : secondID;
+				why = "would be a third edge of path node " + std::to_string(full);
+			}
+			if (myEdges.Count() == ourArraySize || !why.empty())
+			{
+				if (!why.empty())
+				{
+					ReportLeftOut(__LINE__, ourFunction,
+					              "Edge between path nodes " + std::to_string(firstID) + " and " +
+					                  std::to_string(secondID) + " in [" + aPath + "] " + why +
+					                  ": left out (kept in the file)");
+				}
+				for (const int id : {firstID, secondID})
+				{
+					if (id != 0)
+					{
+						myKept.myNodeIDs.insert(id);
+					}
+				}
+				takenEdgeFlags.push_back(false);
 				continue;
 			}
 
@@ -342,23 +499,58 @@ void LumoraWrapper::ParseNodes(const std::string& aPath)
 			edge.Connect(first, second);
 			first->AddEdge(&edge);
 			second->AddEdge(&edge);
+			myKept.myEdgeParts.push_back(PartsBeyond(xml, ourEdgeValues));
+			takenEdgeFlags.push_back(true);
 		} while (xml.GoToNextSibling("edge"));
 		xml.ExitChild();
 	}
 	if (refusedEdges > 0)
 	{
 		ReportLeftOut(__LINE__, ourFunction,
-		              "[" + aPath + "] holds more than " + std::to_string(ourArraySize) +
-		                  " path edges: " + std::to_string(refusedEdges) + " edges were left out");
+		              "[" + aPath + "] holds more than " + std::to_string(ourArraySize) + " path edges: " +
+		                  std::to_string(refusedEdges) + " edges were left out (kept in the file)");
 	}
+
+	if (xml.GoToElement("node-graph", "", ""))
+	{
+		XMLElement graph("node-graph");
+		xml.CopyCurrentElement(graph);
+		graph.RemoveChildren("node", takenNodeFlags, "nodes");
+		graph.RemoveChildren("edge", takenEdgeFlags, "edges");
+		myKept.myNodeGraph = graph.GetText();
+	}
+}
+
+int LumoraWrapper::TakeNodeID()
+{
+	std::set<int> used = myKept.myNodeIDs;
+	for (int index = 0; index < myNodes.Count(); ++index)
+	{
+		used.insert(myNodes[index].GetID());
+	}
+	// 0 stands for "no node" in an edge, so IDs start at 1.
+	int id = myNodeIDCounter > 0 ? myNodeIDCounter : 1;
+	while (used.contains(id))
+	{
+		id = id < INT_MAX ? id + 1 : 1;
+	}
+	myNodeIDCounter = id < INT_MAX ? id + 1 : 1;
+	return id;
 }
 
 void LumoraWrapper::ParseDecals(const std::string& aPath)
 {
 	myDecals.RemoveAll();
+	myKept.myDecals.clear();
+	myKept.myDecalParts.clear();
 
 	XML xml(aPath);
-	if (xml.GoToElement("decals", "", "") && xml.EnterChild("decal"))
+	std::vector<bool> takenFlags;
+	if (!xml.GoToElement("decals", "", ""))
+	{
+		return;
+	}
+	if (xml.EnterChild("decal"))
 	{
 		do
 		{
@@ -371,20 +563,24 @@ void LumoraWrapper::ParseDecals(const std::string& aPath)
 			decal.myDepth = xml.GetChildAttribute<float>("depth", "");
 
 			const auto type = myDecalTypes.find(decal.myTypeId);
-			// A decal without textures would draw nothing and could not be given a type's textures
-			// back on save: it is left out, and the log says which.
+			// A decal without textures would draw nothing: it is left out of the scene, and the
+			// log says which. The file keeps it, for a catalogue that knows its type.
 			if (type == myDecalTypes.end())
 			{
 				ReportLeftOut(__LINE__, "Lumora::LumoraWrapper::ParseDecals",
 				              "Unknown decal-type [" + decal.myTypeId + "] in [" + aPath +
-				                  "]: decal left out");
+				                  "]: decal left out (kept in the file)");
+				takenFlags.push_back(false);
 				continue;
 			}
 			decal.myTexture = type->second.myTexture;
 			decal.myNormalTexture = type->second.myNormalTexture;
 			myDecals.Add(decal);
+			myKept.myDecalParts.push_back(PartsBeyond(xml, ourDecalValues));
+			takenFlags.push_back(true);
 		} while (xml.GoToNextSibling("decal"));
 		xml.ExitChild();
 	}
+	myKept.myDecals = SectionBeyond(xml, "decal", takenFlags);
 }
 } // namespace Lumora

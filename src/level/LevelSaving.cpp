@@ -1,7 +1,9 @@
 // Writing back what the designer edits: lights with the path graph, and decals. Each saver
-// loads the level's file, empties the sections it owns, appends one record per object and
-// writes the whole document back (through a temporary renamed over the file), so comments and
-// sections that belong to others stay as they were.
+// loads the level's file, empties the sections it owns (making any that the file lacks),
+// appends one record per object and writes the whole document back (through a temporary
+// renamed over the file), so comments and sections that belong to others stay as they were.
+// What the loader did not take in from those sections (the facade's kept content) goes back
+// too: unknown attributes and children into their records, the rest after the records.
 #include "editor/LumoraWrapper.h"
 
 #include <cstdio>
@@ -84,6 +86,49 @@ void AddVector4Child(XMLElement& aRecord, const char* aTag, const Vector4<float>
 	child.AddVector4Attributes(aVector);
 	aRecord.InsertElement(child);
 }
+
+// Folds a record's kept content (XMLElement::GetText of it) into the record.
+void AddKeptText(XMLElement& aRecord, const std::string& aText)
+{
+	XMLElement kept("kept");
+	if (!aText.empty() && kept.SetText(aText))
+	{
+		aRecord.AddKept(kept);
+	}
+}
+
+// Appends what a section kept at the cursor, after the records: as it stood, never folded into a
+// record (a decal left out is no part of the first decal written).
+void InsertKeptText(XML& anXML, const std::string& aText)
+{
+	XMLElement kept("kept");
+	if (!aText.empty() && kept.SetText(aText))
+	{
+		anXML.InsertChildrenOf(kept, false);
+	}
+}
+
+// The cursor on the section under the root. A file that lacks it (one written by hand with
+// only the spot lights, say) gets it, empty, at the end of the root.
+void GoToSection(XML& anXML, const char* aSection)
+{
+	if (anXML.GoToElement(aSection, "", ""))
+	{
+		return;
+	}
+	const XMLElement section(aSection);
+	// Onto the root element: up from its first child, or by its name when it has no child.
+	if (anXML.GoToElement("", "", ""))
+	{
+		anXML.ExitChild();
+		anXML.InsertElement(section, false);
+	}
+	else
+	{
+		anXML.InsertElementAtRoot(section, false);
+	}
+	anXML.GoToElement(aSection, "", "");
+}
 } // namespace
 
 void LumoraWrapper::SaveLights(const std::u16string& aLevel)
@@ -96,8 +141,9 @@ void LumoraWrapper::SaveLights(const std::u16string& aLevel)
 	CreateIfMissing(path, {"point-lights", "spot-lights"});
 	{
 		XML xml(path);
-		xml.GoToElement("point-lights", "", "");
+		GoToSection(xml, "point-lights");
 		xml.RemoveChildren();
+		XMLElement points("point-lights");
 		for (int index = 0; index < myEnvironmentPointLights.Count(); ++index)
 		{
 			const Zeph::PointLightData& light = myEnvironmentPointLights[index];
@@ -105,11 +151,15 @@ void LumoraWrapper::SaveLights(const std::u16string& aLevel)
 			AddVector3Child(record, "position", light.myPosition);
 			AddVector4Child(record, "color", light.myColor);
 			AddValueChild(record, "falloff", light.myFalloff, "value");
-			xml.InsertElement(record, false);
+			AddKeptText(record, KeptContent::PartsOf(myKept.myPointLightParts, index));
+			points.InsertElement(record);
 		}
+		xml.InsertChildrenOf(points, false);
+		InsertKeptText(xml, myKept.myPointLights);
 
-		xml.GoToElement("spot-lights", "", "");
+		GoToSection(xml, "spot-lights");
 		xml.RemoveChildren();
+		XMLElement spots("spot-lights");
 		for (int index = 0; index < myEnvironmentSpotLights.Count(); ++index)
 		{
 			const Zeph::SpotLightData& light = myEnvironmentSpotLights[index];
@@ -122,8 +172,11 @@ void LumoraWrapper::SaveLights(const std::u16string& aLevel)
 			angles.AddAttribute("inner", light.myAngles.x);
 			angles.AddAttribute("outer", light.myAngles.y);
 			record.InsertElement(angles);
-			xml.InsertElement(record, false);
+			AddKeptText(record, KeptContent::PartsOf(myKept.mySpotLightParts, index));
+			spots.InsertElement(record);
 		}
+		xml.InsertChildrenOf(spots, false);
+		InsertKeptText(xml, myKept.mySpotLights);
 		// The lights are on disk before the path graph's file is opened.
 		xml.SaveFile();
 	}
@@ -137,7 +190,7 @@ void LumoraWrapper::SaveNodes(const std::string& aLevel)
 	const std::string path = LevelFile(aLevel, "nodegraph.xml");
 	CreateIfMissing(path, {"node-graph"});
 	XML xml(path);
-	xml.GoToElement("node-graph", "", "");
+	GoToSection(xml, "node-graph");
 	xml.RemoveChildren();
 
 	XMLElement nodes("nodes");
@@ -148,9 +201,9 @@ void LumoraWrapper::SaveNodes(const std::string& aLevel)
 		XMLElement record("node");
 		record.AddAttribute("id", node.GetID());
 		AddVector3Child(record, "position", node.GetPosition());
+		AddKeptText(record, KeptContent::PartsOf(myKept.myNodeParts, index));
 		nodes.InsertElement(record);
 	}
-	xml.InsertElement(nodes, false);
 
 	XMLElement edges("edges");
 	edges.AddAttribute("number-of-edges", myEdges.Count());
@@ -163,9 +216,17 @@ void LumoraWrapper::SaveNodes(const std::string& aLevel)
 		connections.AddAttribute("secondID", edge.GetSecondConnectionID());
 		record.InsertElement(connections);
 		AddValueChild(record, "distance", edge.GetDistance(), "value");
+		AddKeptText(record, KeptContent::PartsOf(myKept.myEdgeParts, index));
 		edges.InsertElement(record);
 	}
-	xml.InsertElement(edges, false);
+	// The kept graph holds the file's "nodes" and "edges" (their records left out, comments,
+	// unknown attributes), which fold into the two written here, and whatever else stood in
+	// "node-graph".
+	XMLElement graph("node-graph");
+	graph.InsertElement(nodes);
+	graph.InsertElement(edges);
+	AddKeptText(graph, myKept.myNodeGraph);
+	xml.InsertChildrenOf(graph, false);
 	xml.SaveFile();
 }
 
@@ -176,8 +237,9 @@ void LumoraWrapper::SaveDecals(const std::u16string& aLevel)
 	CreateIfMissing(path, {"decals"});
 	{
 		XML xml(path);
-		xml.GoToElement("decals", "", "");
+		GoToSection(xml, "decals");
 		xml.RemoveChildren();
+		XMLElement section("decals");
 		for (int index = 0; index < myDecals.Count(); ++index)
 		{
 			const Zeph::DecalData& decal = myDecals[index];
@@ -188,8 +250,11 @@ void LumoraWrapper::SaveDecals(const std::u16string& aLevel)
 			AddVector4Child(record, "color", decal.myColor);
 			AddValueChild(record, "size", decal.mySize, "value");
 			AddValueChild(record, "depth", decal.myDepth, "value");
-			xml.InsertElement(record, false);
+			AddKeptText(record, KeptContent::PartsOf(myKept.myDecalParts, index));
+			section.InsertElement(record);
 		}
+		xml.InsertChildrenOf(section, false);
+		InsertKeptText(xml, myKept.myDecals);
 		xml.SaveFile();
 	}
 	Release();

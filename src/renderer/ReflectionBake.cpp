@@ -7,6 +7,7 @@
 #include <numbers>
 
 #include "core/Matrix44.h"
+#include "engine/Debug.h"
 #include "engine/Effect.h"
 #include "engine/Engine.h"
 #include "engine/Room.h"
@@ -18,6 +19,7 @@
 #include "platform/gpu/Texture.h"
 #include "platform/gpu/TextureSaver.h"
 #include "renderer/BakeProgress.h"
+#include "renderer/CubemapContainer.h"
 #include "renderer/DynamicCubemap.h"
 #include "renderer/ProbeHelper.h"
 #include "renderer/Renderer.h"
@@ -122,6 +124,19 @@ void Renderer::GenerateReflections(const GrowingArray<Room*>& someRooms, const s
 	for (int index = 0; index < count; ++index)
 	{
 		const Room* room = someRooms[index];
+		// A room ID such as "../cubemap" would write over a file outside the level's folder.
+		const std::string file = CubemapContainer::GetRoomFile(aLevel, room->GetID());
+		if (file.empty())
+		{
+			if (Debug* log = Debug::GetInstance())
+			{
+				log->ErrorMessage(__LINE__, "Zeph::Renderer::GenerateReflections",
+				                  "Room %d has the ID [%s], which cannot name a cubemap file: not baked",
+				                  index, room->GetID().c_str());
+			}
+			myBakingProgress = BakeProgress(index + 1, count);
+			continue;
+		}
 		// The filter of the previous room drew through viewports of its own.
 		context.SetViewport(cube->GetViewport());
 		for (int face = 0; face < DynamicCubemap::ourFaceCount; ++face)
@@ -131,8 +146,7 @@ void Renderer::GenerateReflections(const GrowingArray<Room*>& someRooms, const s
 		PrefilterReflection(*cube);
 		// A file that cannot be written leaves the room with its old cubemap; the save
 		// reports it, the bake goes on.
-		Gpu::SaveTextureToDds(context, *cube->GetTexture(),
-		                      "data/Cubemaps/" + aLevel + "/" + room->GetID() + ".dds");
+		Gpu::SaveTextureToDds(context, *cube->GetTexture(), file);
 		myBakingProgress = BakeProgress(index + 1, count);
 	}
 	myCollector.Reset();

@@ -1,5 +1,6 @@
 #include "xml/XML.h"
 
+#include <cmath>
 #include <cstdio>
 #include <cstring>
 #include <locale>
@@ -45,6 +46,35 @@ const TiXmlAttribute* AttributeNamed(const TiXmlAttribute* aFirstAttribute, cons
 const char* NameOf(const TiXmlNode* aNode)
 {
 	return aNode != nullptr ? aNode->Value() : "";
+}
+
+// Whether stream extraction reads a finite number of type T from the start of the text, as the
+// readers read it (text after the number is let pass: "12abc" reads as 12). "abc", "nan", "inf"
+// and a value out of the type's range ("1e40" as a float) do not.
+template <typename T> bool ReadsAsNumber(const char* aText)
+{
+	std::istringstream stream(aText != nullptr ? aText : "");
+	stream.imbue(std::locale::classic());
+	T value{};
+	stream >> value;
+	if constexpr (std::same_as<T, float>)
+	{
+		return !stream.fail() && std::isfinite(value);
+	}
+	return !stream.fail();
+}
+
+// Not the cursor's critical report: a value that is not a number reads as 0 and the editor goes
+// on, while a tool that lists problems hears of it with the file, element and attribute.
+void ReportNotANumber(const std::string& aMessage)
+{
+	Debug* log = Debug::GetInstance();
+	if (log == nullptr)
+	{
+		std::fprintf(stderr, "XML::ConvertValue: %s\n", aMessage.c_str());
+		return;
+	}
+	log->ErrorMessage(__LINE__, "XML::ConvertValue", "%s", aMessage.c_str());
 }
 
 std::string ReadAll(FILE* aFile)
@@ -241,6 +271,38 @@ void XML::InsertElement(const XMLElement& anElement, const bool& aSaveFlag)
 	{
 		SaveFile();
 	}
+}
+
+void XML::InsertChildrenOf(const XMLElement& anElement, const bool& aSaveFlag)
+{
+	const bool canHoldFlag = myCurrentElement != nullptr && (myCurrentElement->ToElement() != nullptr ||
+	                                                         myCurrentElement->ToDocument() != nullptr);
+	for (const TiXmlNode* child = anElement.myElement->FirstChild(); child != nullptr;
+	     child = child->NextSibling())
+	{
+		if (!canHoldFlag || myCurrentElement->InsertEndChild(*child) == nullptr)
+		{
+			Error("Could not insert element [" + child->ValueStr() + "] in file [" + GetDocumentName() + "]");
+			break;
+		}
+	}
+	if (aSaveFlag)
+	{
+		SaveFile();
+	}
+}
+
+bool XML::CopyCurrentElement(XMLElement& aCopyRef) const
+{
+	const TiXmlElement* element = myCurrentElement != nullptr ? myCurrentElement->ToElement() : nullptr;
+	if (element == nullptr)
+	{
+		return false;
+	}
+	TiXmlElement* copy = element->Clone()->ToElement();
+	delete aCopyRef.myElement;
+	aCopyRef.myElement = copy;
+	return true;
 }
 
 void XML::InsertElementAtRoot(const XMLElement& anElement, const bool& aSaveFlag)
@@ -446,6 +508,15 @@ template <XMLReadableValue T> T XML::GetAttribute(const std::string& aName)
 		Error("Could not find name [" + aName + "] in [" + elementName + "] in [" + GetDocumentName() + "]");
 		return T{};
 	}
+	if constexpr (std::same_as<T, int> || std::same_as<T, float>)
+	{
+		if (!ReadsAsNumber<T>(attribute->Value()))
+		{
+			ReportNotANumber("Not a number [" + std::string(attribute->Value()) + "] in attribute [" +
+			                 attribute->Name() + "] of [" + elementName + "] in [" + GetDocumentName() + "]");
+			return T{};
+		}
+	}
 	return ConvertValue<T>(attribute->Value());
 }
 
@@ -477,6 +548,16 @@ template <XMLReadableValue T> T XML::GetChildAttribute(const std::string& aTag, 
 		Error("Could not find name [" + aName + "] in [" + aTag + "] in [" + elementName + "] in [" +
 		      GetDocumentName() + "]");
 		return T{};
+	}
+	if constexpr (std::same_as<T, int> || std::same_as<T, float>)
+	{
+		if (!ReadsAsNumber<T>(attribute->Value()))
+		{
+			ReportNotANumber("Not a number [" + std::string(attribute->Value()) + "] in attribute [" +
+			                 attribute->Name() + "] of [" + aTag + "] in [" + elementName + "] in [" +
+			                 GetDocumentName() + "]");
+			return T{};
+		}
 	}
 	return ConvertValue<T>(attribute->Value());
 }

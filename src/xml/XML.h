@@ -22,7 +22,9 @@
 // Debug log as a critical error; when the log is configured so that critical errors return,
 // readers yield the type's zero value ("" / 0 / 0.0f / false) and nothing reads through a
 // missing node. Walks (GoToElement, EnterChild, GoToNextSibling) and the Try readers report
-// nothing and answer false.
+// nothing and answer false. A number reader that finds no number ("abc", "nan", "inf", "1e40"
+// as a float) yields 0 and reports it at the error level, naming file, element and attribute:
+// a hand-edited value is a problem to list, not the end of the editor.
 
 #include <concepts>
 #include <string>
@@ -87,6 +89,12 @@ public:
 	void CreateEmptyDocument();
 	// As InsertElement, into the document's first "root" element; the cursor stays where it was.
 	void InsertElementAtRoot(const XMLElement& anElement, const bool& aSaveFlag);
+	// Appends a copy of each child of anElement (comments and text too) at the cursor, as
+	// InsertElement appends one element: how kept content goes back into a section.
+	void InsertChildrenOf(const XMLElement& anElement, const bool& aSaveFlag);
+	// A copy of the element under the cursor with everything it holds; false, with aCopyRef as
+	// it was, when the cursor is on no element.
+	bool CopyCurrentElement(XMLElement& aCopyRef) const;
 	void RemoveCurrentElement();
 	std::string GetElementName();
 	// PushElement saves the cursor (or the previous position when the cursor is null);

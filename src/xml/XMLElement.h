@@ -10,9 +10,19 @@
 // Every insertion copies the element with all it holds at that moment, so build records from the
 // leaves up; changing an XMLElement after inserting it does not reach the copy. The object owns
 // its element and is never linked into a document itself.
+//
+// Kept content. What a reader did not take from a record (attributes and children it does not
+// know, comments) travels to the next save as an element of its own: the reader copies the
+// record (XML::CopyCurrentElement), takes out the values it read with RemoveValue, and keeps
+// the rest as text; the saver builds the record anew and folds the kept rest back in:
+//
+//   XMLElement kept("point-light");
+//   kept.SetText(someKeptText);
+//   record.AddKept(kept);        // unknown attributes and children return beside the new values
 
 #include <concepts>
 #include <string>
+#include <vector>
 
 #include "core/Matrix44.h"
 #include "core/Vector3.h"
@@ -45,6 +55,25 @@ public:
 	void AddVector4Attributes(const Vector4<float>& aVector);
 	// "r-", "u-", "f-", "p-" followed by "x", "y", "z": right, up, forward and position rows.
 	void AddMatrixAttributes(const Matrix44<float>& aMatrix);
+
+	// The element with all it holds as one line of XML, and back: SetText replaces the element
+	// with the one the text holds (false, and nothing changed, when it holds none).
+	std::string GetText() const;
+	bool SetText(const std::string& aText);
+	// Takes out attribute aName of the first child named aTag, or of this element when aTag is
+	// empty; an empty aName takes out the first attribute (how single values are read).
+	void RemoveValue(const std::string& aTag, const std::string& aName);
+	// Takes out the children named aTag whose place among them (0, 1, ...) is flagged, from this
+	// element or, when aParentTag is not empty, from its first child of that name.
+	void RemoveChildren(const std::string& aTag, const std::vector<bool>& someFlags,
+	                    const std::string& aParentTag);
+	// Whether anything is left beyond an empty first child for each of someTags: an attribute, a
+	// comment, a second child of a name, or a child of another name.
+	bool HasContentBeyond(const std::vector<std::string>& someTags) const;
+	// Folds kept content back in: its attributes that this element lacks; then its first child
+	// of each name that this element also has gives that child the attributes it lacks and
+	// appends its children there; every other child (comments too) is appended here.
+	void AddKept(const XMLElement& aKept);
 
 private:
 	friend class XML;

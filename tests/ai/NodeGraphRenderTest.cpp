@@ -94,7 +94,6 @@ protected:
 		return true;
 	}
 
-	// clip = (p, 1) * View * Projection, then the viewport with row 0 at the top.
 	// The graph a - b with both visuals, made as the editor makes them.
 	void BuildGraph(const Vector3<float>& aFirst, const Vector3<float>& aSecond)
 	{

@@ -2,6 +2,7 @@
 // left out with a message, and what a save writes back (and keeps) in the level's files.
 #include <csignal>
 #include <cstdlib>
+#include <cstring>
 #include <filesystem>
 #include <sstream>
 #include <string>
@@ -303,6 +304,11 @@ TEST_F(LevelLoadSaveTest, SmallLevelFillsEveryPartOfTheScene)
 	EXPECT_FLOAT_EQ(decals[1].myDepth, 0.5f);
 	ExpectVector(decals[1].myPosition, -4.0f, 1.0f, 6.0f);
 
+	// Numbering goes on from the last ID but never hands out one in use: 3, then 5.
+	Facade().AddPathNode();
+	Facade().AddPathNode();
+	EXPECT_EQ(nodes[3].GetID(), 3);
+	EXPECT_EQ(nodes[4].GetID(), 5);
 	EXPECT_EQ(ErrorEntryCount(), 0) << LogText();
 	EXPECT_FALSE(Facade().IsBusy());
 }
@@ -345,6 +351,18 @@ TEST_F(LevelLoadSaveTest, NextLevelReplacesTheSceneAndMissingSectionsAreEmpty)
 	// A frame of the emptied scene runs.
 	Facade().Update(16.0f);
 	Facade().Render();
+
+	// Saving makes the sections that the files lack; what they held stays.
+	Facade().AddPointLight();
+	Facade().SaveLights(u"sparse");
+	Facade().SaveDecals(u"sparse");
+	EXPECT_NE(ReadLevelFile("sparse", "lights.xml").find("<spot-lights />\n    <point-lights>"),
+	          std::string::npos);
+	EXPECT_NE(ReadLevelFile("sparse", "decals.xml").find("<decoration />\n    <decals />"),
+	          std::string::npos);
+	Facade().ParseLevel(u"sparse");
+	EXPECT_EQ(Facade().GetPointLights().Count(), 1);
+	EXPECT_EQ(ErrorEntryCount(), 0) << LogText();
 	EXPECT_FALSE(Facade().IsBusy());
 }
 
@@ -373,9 +391,10 @@ TEST_F(LevelLoadSaveTest, SaveRewritesOwnSectionsOnlyAndIsStable)
 	const std::string lights = ReadLevelFile("small", "lights.xml");
 	EXPECT_NE(lights.find("<!-- lights of the small level -->"), std::string::npos) << lights;
 	EXPECT_NE(lights.find("<keep me=\"yes\" />"), std::string::npos) << lights;
-	EXPECT_EQ(lights.find("by hand"), std::string::npos) << lights;
-	EXPECT_EQ(lights.find("<extra"), std::string::npos) << lights;
-	EXPECT_EQ(CountOf(lights, "<point-light>"), 2);
+	// What the readers do not know stays with its record.
+	EXPECT_NE(lights.find("<point-light note=\"by hand\">"), std::string::npos) << lights;
+	EXPECT_NE(lights.find("<extra />\n        </point-light>"), std::string::npos) << lights;
+	EXPECT_EQ(CountOf(lights, "</point-light>"), 2);
 	EXPECT_NE(lights.find("<falloff value=\"4\" />"), std::string::npos) << lights;
 	// Six significant digits.
 	EXPECT_NE(lights.find("<position x=\"-1\" y=\"1234.57\" z=\"0.1\" />"), std::string::npos) << lights;
@@ -466,43 +485,226 @@ TEST_F(LevelLoadSaveTest, SavingANewLevelCreatesItsFiles)
 	EXPECT_EQ(ErrorEntryCount(), 0) << LogText();
 }
 
-TEST_F(LevelLoadSaveTest, EdgesToMissingNodesAndUnknownDecalTypesAreLeftOutWithAMessage)
+// A level edited by hand: records the editor leaves out, misspelt ones, comments, unknown
+// attributes and children. Loading is never fatal; a save after moving one light gives back
+// every other thing the three files held, and what the editor wrote loads again the same way.
+TEST_F(LevelLoadSaveTest, HandEditedFilesLoadSoftlyAndSaveBackWhatTheEditorDidNotRead)
 {
-	WriteSmallLevel("faulty");
-	WriteLevelFile("faulty", "nodegraph.xml", R"(<root><node-graph>
-		<nodes><node id="1"><position x="0" y="0" z="0" /></node>
-		       <node id="2"><position x="0" y="0" z="2" /></node></nodes>
-		<edges><edge><connections firstID="1" secondID="77" /><distance value="1" /></edge>
-		       <edge><connections firstID="1" secondID="2" /><distance value="1" /></edge>
-		       <edge><connections firstID="2" secondID="0" /><distance value="1" /></edge></edges>
-	</node-graph></root>)");
-	WriteLevelFile("faulty", "decals.xml", R"(<root><decals>
+	WriteSmallLevel("hostile");
+	WriteLevelFile("hostile", "lights.xml", R"(<root><point-lights>
+		<!-- kitchen -->
+		<point-light id="lamp-1"><position x="0" y="10" z="5" /><color r="1" g="1" b="1" a="1" note="warm" />
+			<falloff value="2" /><position x="9" y="9" z="9" /><flicker rate="3"><!-- by hand --></flicker>
+		</point-light>
+		<point-ligth><position x="1" y="1" z="1" /></point-ligth>
+		<point-light><position x="4" y="1" z="1" /><color r="1" g="0" b="0" a="1" /><falloff value="3" /></point-light>
+	</point-lights></root>)");
+	WriteLevelFile("hostile", "nodegraph.xml", R"(<root><node-graph><nodes number-of-nodes="9" author="me">
+		<node id="1"><position x="0" y="0" z="0" /></node><node id="2" tag="door"><position x="1" y="0" z="0" /></node>
+		<node id="3"><position x="2" y="0" z="0" /></node><node id="7"><position x="3" y="0" z="0" /></node>
+		<node id="7"><position x="4" y="0" z="0" /></node><node id="41"><position x="5" y="0" z="0" /></node>
+		</nodes><edges><!-- patrol -->
+		<edge><connections firstID="1" secondID="2" /><distance value="1" /></edge>
+		<edge><connections firstID="2" secondID="3" /><distance value="1" /><speed value="2" /></edge>
+		<edge><connections firstID="2" secondID="1" /><distance value="1" /></edge>
+		<edge><connections firstID="3" secondID="3" /><distance value="1" /></edge>
+		<edge><connections firstID="3" secondID="7" /><distance value="1" /></edge>
+		<edge><connections firstID="1" secondID="42" /><distance value="1" /></edge>
+		</edges></node-graph></root>)");
+	WriteLevelFile("hostile", "decals.xml", R"(<root><decals>
 		<decal><decal-type id="marble" /><position x="0" y="0" z="0" /><norm x="0" y="0" z="1" />
 		       <color r="1" g="1" b="1" a="1" /><size value="1" /><depth value="1" /></decal>
 		<decal><decal-type id="wood" /><position x="5" y="0" z="0" /><norm x="0" y="0" z="1" />
-		       <color r="1" g="1" b="1" a="1" /><size value="1" /><depth value="1" /></decal>
+		       <color r="1" g="1" b="1" a="1" /><size value="1" /><depth value="1" /><!-- mine --></decal>
 	</decals></root>)");
-	Facade().ParseLevel(u"faulty");
+	const std::string messages[] = {
+	    "Edge between path nodes 2 and 1 in [data/XML/levels/hostile/nodegraph.xml] would be a third edge of "
+	    "path node 2: left out (kept in the file)",
+	    "Edge between path nodes 3 and 3 in [data/XML/levels/hostile/nodegraph.xml] joins a node to itself",
+	    "Edge between path nodes 3 and 7 in [data/XML/levels/hostile/nodegraph.xml] names path node 7, an ID "
+	    "that 2 nodes share",
+	    "Edge between path nodes 1 and 42 in [data/XML/levels/hostile/nodegraph.xml] names a missing node",
+	    "Unknown decal-type [marble] in [data/XML/levels/hostile/decals.xml]: decal left out (kept in the "
+	    "file)"};
+	// Each load reports each of them once, at the error level.
+	const auto loadAndExpect = [&](int aNodeCount, int anEdgeCount) {
+		const size_t logStart = LogText().size();
+		Facade().ParseLevel(u"hostile");
+		EXPECT_EQ(Facade().GetPointLights().Count(), 2);
+		EXPECT_EQ(Facade().GetNodes().Count(), aNodeCount);
+		EXPECT_EQ(Facade().GetEdges().Count(), anEdgeCount);
+		EXPECT_EQ(Facade().GetDecals().Count(), 1);
+		const std::string log = LogText().substr(logStart);
+		for (const std::string& message : messages)
+		{
+			EXPECT_EQ(CountOf(log, message), 1) << message << "\n" << log;
+		}
+		EXPECT_EQ(CountOf(log, "\"Error Type:\"\"ERROR\""), 5) << log;
+	};
+	loadAndExpect(6, 2);
+	EXPECT_FLOAT_EQ(Facade().GetEdges()[1].GetDistance(), 1.0f);
 
-	ASSERT_EQ(Facade().GetEdges().Count(), 1);
-	EXPECT_EQ(Facade().GetEdges()[0].GetSecondConnectionID(), 2);
-	EXPECT_FLOAT_EQ(Facade().GetEdges()[0].GetDistance(), 2.0f);
-	EXPECT_EQ(Facade().GetNodes()[0].GetEdgeSlots()[1], nullptr);
-	ASSERT_EQ(Facade().GetDecals().Count(), 1);
-	EXPECT_EQ(Facade().GetDecals()[0].myTypeId, "wood");
+	ClickAt(Facade().GetPointLights()[0].myPosition);
+	Facade().MoveSelectedVector(1.0f, 0.0f, 0.0f);
+	// Node 42 is named by a kept edge: the next node (after 41) gets 43.
+	Facade().AddPathNode();
+	EXPECT_EQ(Facade().GetNodes().Last().GetID(), 43);
+	const std::string saved = SavedFiles("hostile");
+	EXPECT_EQ(ReadLevelFile("hostile", "lights.xml"), R"(<root>
+    <point-lights>
+        <point-light id="lamp-1">
+            <position x="1" y="10" z="5" />
+            <color r="1" g="1" b="1" a="1" note="warm" />
+            <falloff value="2" />
+            <position x="9" y="9" z="9" />
+            <flicker rate="3">
+                <!-- by hand -->
+            </flicker>
+        </point-light>
+        <point-light>
+            <position x="4" y="1" z="1" />
+            <color r="1" g="0" b="0" a="1" />
+            <falloff value="3" />
+        </point-light>
+        <!-- kitchen -->
+        <point-ligth>
+            <position x="1" y="1" z="1" />
+        </point-ligth>
+    </point-lights>
+    <spot-lights />
+</root>
+)");
+	const std::string graph = ReadLevelFile("hostile", "nodegraph.xml");
+	for (const char* kept : {"<nodes number-of-nodes=\"7\" author=\"me\">", "<node id=\"2\" tag=\"door\">",
+	                         "<distance value=\"1\" />\n                <speed value=\"2\" />",
+	                         "<!-- patrol -->", "secondID=\"42\""})
+	{
+		EXPECT_NE(graph.find(kept), std::string::npos) << kept << "\n" << graph;
+	}
+	EXPECT_EQ(CountOf(graph, "<edge>"), 7) << graph;
+	const std::string decals = ReadLevelFile("hostile", "decals.xml");
+	EXPECT_NE(decals.find("<decal-type id=\"marble\" />"), std::string::npos) << decals;
+	EXPECT_NE(decals.find("<depth value=\"1\" />\n            <!-- mine -->"), std::string::npos) << decals;
 
+	// The editor's own file loads again, leaving out the same edges, and saves the same.
+	loadAndExpect(7, 3);
+	EXPECT_EQ(SavedFiles("hostile"), saved);
+}
+
+// A value that is no number where a number goes reads as 0, and the log names the file, the
+// element and the attribute; the editor goes on.
+TEST_F(LevelLoadSaveTest, ValuesThatAreNoNumbersReadAsZeroWithAMessage)
+{
+	struct Case
+	{
+		const char* myFile;
+		const char* myGood;
+		const char* myBad;
+		const char* myMessage;
+	};
+	const Case cases[] = {
+	    {"lights.xml", "x=\"1\" y=\"2\"", "x=\"abc\" y=\"2\"",
+	     "[abc] in attribute [x] of [position] in [point-light]"},
+	    {"lights.xml", "g=\"0.5\"", "g=\"nan\"", "[nan] in attribute [g] of [color] in [point-light]"},
+	    {"lights.xml", "falloff value=\"8\"", "falloff value=\"inf\"",
+	     "[inf] in attribute [value] of [falloff] in [spot-light]"},
+	    {"lights.xml", "inner=\"0.9\"", "inner=\"1e40\"",
+	     "[1e40] in attribute [inner] of [angles] in [spot-light]"},
+	    {"nodegraph.xml", "<node id=\"4\">", "<node id=\"4x\">", ""},
+	    {"nodegraph.xml", "<node id=\"2\">", "<node id=\"\">", "[] in attribute [id] of [node]"},
+	    {"rooms.xml", "z=\"10\" />\n\t\t\t<id", "z=\"1e99\" />\n\t\t\t<id",
+	     "[1e99] in attribute [z] of [max] in [room]"},
+	};
+	WriteSmallLevel("numbers");
+	for (const Case& entry : cases)
+	{
+		std::string text = ReadLevelFile("numbers", entry.myFile);
+		ASSERT_NE(text.find(entry.myGood), std::string::npos) << entry.myGood;
+		WriteLevelFile("numbers", entry.myFile,
+		               text.replace(text.find(entry.myGood), std::strlen(entry.myGood), entry.myBad));
+	}
+	Facade().ParseLevel(u"numbers");
 	const std::string log = LogText();
-	EXPECT_EQ(ErrorEntryCount(), 3) << log;
-	EXPECT_NE(log.find("Edge between path nodes 1 and 77 in [data/XML/levels/faulty/nodegraph.xml] names a "
-	                   "missing node: left out"),
+	for (const Case& entry : cases)
+	{
+		if (*entry.myMessage != '\0')
+		{
+			EXPECT_NE(log.find(std::string("\"Not a number ") + entry.myMessage +
+			                   " in [data/XML/levels/numbers/" + entry.myFile + "]"),
+			          std::string::npos)
+			    << entry.myMessage << "\n"
+			    << log;
+		}
+	}
+	// Text after a number is let pass, as stream extraction reads it ("4x" is 4).
+	EXPECT_EQ(Facade().GetNodes()[0].GetID(), 4);
+	EXPECT_EQ(Facade().GetNodes()[2].GetID(), 0);
+	EXPECT_EQ(Facade().GetPointLights()[0].myPosition.x, 0.0f);
+	EXPECT_EQ(Facade().GetSpotLights()[0].myFalloff, 0.0f);
+	EXPECT_EQ(Facade().GetSpotLights()[0].myAngles.x, 0.0f);
+	EXPECT_EQ(Facade().GetRooms()[0]->GetMax().z, 0.0f);
+	EXPECT_EQ(CountOf(log, "\"Not a number "), 6) << log;
+}
+
+// A room's cubemap is found whatever the case of its name, and only a regular file holding a
+// cube is tied to the room: anything else is named in the log and the room shows the fallback.
+TEST_F(LevelLoadSaveTest, RoomCubemapsAreFoundThroughTheResolverAndMustBeCubes)
+{
+	const std::filesystem::path cube =
+	    std::filesystem::path(LUMORA_TEST_SOURCE_ROOT) / "data/Cubemaps/cubemap.dds";
+	const std::filesystem::path flat =
+	    std::filesystem::path(LUMORA_TEST_SOURCE_ROOT) / "data/textures/wood_albedo.dds";
+	struct Case
+	{
+		const char* myLevel;
+		const char* myFile;                    // in data/Cubemaps/<level>/, for the room "hall"
+		const std::filesystem::path* mySource; // null: a folder
+		const char* myProblem;                 // empty: the room's own cubemap
+	};
+	const Case cases[] = {{"cubes0", "HALL.dds", &cube, ""},
+	                      {"cubes1", "hall.dds", &flat, "not a cubemap of 6 faces"},
+	                      {"cubes2", "hall.dds", nullptr, "not a regular file"}};
+	for (const Case& entry : cases)
+	{
+		WriteSmallLevel(entry.myLevel);
+		const std::filesystem::path file =
+		    std::filesystem::path("data/Cubemaps") / entry.myLevel / entry.myFile;
+		std::filesystem::create_directories(entry.mySource == nullptr ? file : file.parent_path());
+		if (entry.mySource != nullptr)
+		{
+			std::filesystem::copy_file(*entry.mySource, file);
+		}
+		const size_t logStart = LogText().size();
+		Facade().ParseLevel(std::u16string(entry.myLevel, entry.myLevel + std::strlen(entry.myLevel)));
+		const auto& entities = Facade().GetEntities();
+		ASSERT_EQ(entities.Count(), 2);
+		// The second entity is in no room: it shows the fallback.
+		EXPECT_EQ(RoomDataOf(*entities[0]).myCubemap == RoomDataOf(*entities[1]).myCubemap,
+		          *entry.myProblem != '\0')
+		    << entry.myLevel;
+		const std::string log = LogText().substr(logStart);
+		const std::string message =
+		    std::string("Room cubemap [data/Cubemaps/") + entry.myLevel + "/hall.dds] of room 0: ";
+		EXPECT_EQ(CountOf(log, message), *entry.myProblem != '\0' ? 1 : 0) << log;
+		EXPECT_NE(log.find(entry.myProblem), std::string::npos) << log;
+	}
+}
+
+// A room ID that is no file name never makes the reflection bake write outside the level's folder.
+TEST_F(LevelLoadSaveTest, ReflectionBakeLeavesOutRoomsWhoseIDIsNoFileName)
+{
+	WriteSmallLevel("unsafe");
+	WriteLevelFile("unsafe", "rooms.xml",
+	               "<root><rooms><room><min x=\"1\" y=\"0\" z=\"0\" /><max x=\"-1\" y=\"2\" "
+	               "z=\"2\" /><id value=\"../cubemap\" /></room></rooms></root>");
+	Facade().ParseLevel(u"unsafe");
+	Facade().BakeSpecular(u"unsafe");
+	// The shared fallback is still the link to the shipped file, and nothing was written.
+	EXPECT_TRUE(std::filesystem::is_symlink("data/Cubemaps/cubemap.dds"));
+	EXPECT_FALSE(std::filesystem::exists("data/Cubemaps/unsafe"));
+	EXPECT_NE(LogText().find("Room 0 has the ID [../cubemap], which cannot name a cubemap file: not baked"),
 	          std::string::npos)
-	    << log;
-	EXPECT_NE(log.find("Edge between path nodes 2 and 0 in"), std::string::npos) << log;
-	EXPECT_NE(log.find("\"Function:\"\"Lumora::LumoraWrapper::ParseNodes\""), std::string::npos) << log;
-	EXPECT_NE(log.find("Unknown decal-type [marble] in [data/XML/levels/faulty/decals.xml]: decal left out"),
-	          std::string::npos)
-	    << log;
-	EXPECT_NE(log.find("\"Function:\"\"Lumora::LumoraWrapper::ParseDecals\""), std::string::npos) << log;
+	    << LogText();
 }
 
 TEST_F(LevelLoadSaveTest, PathGraphStopsAtTheArraySizeAndNeverMoves)

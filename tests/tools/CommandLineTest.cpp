@@ -198,3 +198,77 @@ TEST_F(CommandLineTest, InfoDescribesAModelFileAndNamesTheDamage)
 	EXPECT_EQ(cut.myErrors.rfind("lumora: cut.al: ", 0), 0u) << cut.myErrors;
 	EXPECT_EQ(std::count(cut.myErrors.begin(), cut.myErrors.end(), '\n'), 1) << cut.myErrors;
 }
+
+// A level edited by hand into what a bake must not take: check lists each problem with its
+// file; bake refuses, naming them, unless --force; a plain 2D DDS as a room's cubemap is named
+// in render as in check. A misspelt entity catalogue leaves every level empty: a problem too.
+TEST_F(CommandLineTest, CheckListsHostileLevelsAndBakeRefusesThemUnlessForced)
+{
+	CopyData();
+	const fs::path level = myScratch.Path() / "data/XML/levels/sample_small";
+	const auto edit = [](const fs::path& aFile, const std::string& aGood, const std::string& aBad) {
+		std::string text = TestSupport::ReadWholeFile(aFile.string());
+		ASSERT_NE(text.find(aGood), std::string::npos) << aGood;
+		TestSupport::WriteWholeFile(aFile.string(), text.replace(text.find(aGood), aGood.size(), aBad));
+	};
+	fs::create_directories(myScratch.Path() / "data/Cubemaps/sample_small");
+	fs::copy_file(myScratch.Path() / "data/textures/wood_albedo.dds",
+	              myScratch.Path() / "data/Cubemaps/sample_small/main.dds");
+	const ToolRun render = RunTool(myScratch.Path(), "render sample_small --out x.png --size 32x18");
+	if (render.myErrors.find("no OpenGL 4.5") != std::string::npos && std::getenv("CI") == nullptr)
+	{
+		GTEST_SKIP() << render.myErrors;
+	}
+	const std::string flat =
+	    "Room cubemap [data/Cubemaps/sample_small/main.dds] of room 0: not a cubemap of 6 faces; "
+	    "the room shows the fallback cubemap";
+	EXPECT_NE(render.myErrors.find(flat), std::string::npos) << render.myErrors;
+
+	edit(level / "rooms.xml", "</rooms>",
+	     "<room><min x=\"0\" y=\"1\" z=\"0\" /><max x=\"2\" y=\"1\" z=\"2\" /><id value=\"main\" /></room>"
+	     "<room><min x=\"0\" y=\"3\" z=\"0\" /><max x=\"2\" y=\"1\" z=\"2\" /><id value=\"../cubemap\" "
+	     "/></room></rooms>");
+	edit(level / "entities.xml", "type=\"crate\"", "type=\"crates\"");
+	edit(level / "lights.xml", "<falloff value=\"", "<falloff value=\"abc");
+	const std::string rooms = "data/XML/levels/sample_small/rooms.xml: room ";
+	const std::vector<std::string> problems = {
+	    rooms + "1 ('main') has no extent along y",
+	    rooms + "1 ('main') has the ID of room 0: both would bake into one cubemap file",
+	    rooms + "2 ('../cubemap') is inverted along y (min 3 > max 1)",
+	    rooms + "2 ('../cubemap'): the ID cannot name a cubemap file",
+	    "data/XML/levels/sample_small/entities.xml: entity 1 of type [crates], which "
+	    "data/XML/EntityTypes.xml does "
+	    "not list: it is left out",
+	    "Not a number [abc",
+	};
+	const ToolRun check = RunTool(myScratch.Path(), "check sample_small");
+	EXPECT_EQ(check.myStatus, 1);
+	// The flat cubemap is named for both rooms that it would serve.
+	EXPECT_NE(check.myOutput.find("8 problems:"), std::string::npos) << check.myOutput;
+	for (const std::string& problem : problems)
+	{
+		EXPECT_NE(check.myOutput.find(problem), std::string::npos) << problem << "\n" << check.myOutput;
+	}
+	EXPECT_NE(check.myOutput.find(flat), std::string::npos) << check.myOutput;
+
+	// The damaged cubemap is what a bake replaces; the rest would be baked in.
+	const ToolRun refused = RunTool(myScratch.Path(), "bake sample_small --ambient-only --bounces 0");
+	EXPECT_EQ(refused.myStatus, 1);
+	EXPECT_NE(refused.myErrors.find("lumora: level 'sample_small' has 6 problems; not baked"),
+	          std::string::npos)
+	    << refused.myErrors;
+	for (const std::string& problem : problems)
+	{
+		EXPECT_NE(refused.myErrors.find(problem), std::string::npos) << problem << "\n" << refused.myErrors;
+	}
+	const ToolRun forced = RunTool(myScratch.Path(), "bake sample_small --ambient-only --bounces 0 --force");
+	EXPECT_EQ(forced.myStatus, 0) << forced.myErrors;
+	EXPECT_NE(forced.myOutput.find("6 problems, baked anyway (--force)"), std::string::npos)
+	    << forced.myOutput;
+
+	edit(myScratch.Path() / "data/XML/EntityTypes.xml", "<entities>", "<entitys>");
+	edit(myScratch.Path() / "data/XML/EntityTypes.xml", "</entities>", "</entitys>");
+	const ToolRun empty = RunTool(myScratch.Path(), "check sample_small");
+	EXPECT_NE(empty.myOutput.find("data/XML/EntityTypes.xml: no entity type with a model"), std::string::npos)
+	    << empty.myOutput;
+}

@@ -5,11 +5,13 @@
 
 #include "Commands.h"
 #include "EditorSession.h"
+#include "LevelCheck.h"
 #include "ProgressBar.h"
 #include "editor/StringConversion.h"
 #include "engine/Engine.h"
 #include "engine/Room.h"
 #include "renderer/AmbientVolumeFile.h"
+#include "renderer/CubemapContainer.h"
 #include "renderer/Renderer.h"
 
 namespace LumoraTool
@@ -77,8 +79,14 @@ bool BakeReflections(EditorSession& aSession, const BakeOptions& someOptions)
 	bool allWritten = true;
 	for (int index = 0; index < rooms.Count(); ++index)
 	{
+		// A room whose ID names no file is not baked (the bake said so).
 		const std::string path =
-		    "data/Cubemaps/" + someOptions.myLevel + "/" + rooms[index]->GetID() + ".dds";
+		    Zeph::CubemapContainer::GetRoomFile(someOptions.myLevel, rooms[index]->GetID());
+		if (path.empty())
+		{
+			allWritten = false;
+			continue;
+		}
 		allWritten = allWritten && std::filesystem::is_regular_file(path);
 		std::printf("reflections: %s (%s)\n", path.c_str(), SizeOf(path).c_str());
 	}
@@ -100,9 +108,28 @@ int RunBake(const BakeOptions& someOptions)
 	// reflections as fast). Only when nobody chose otherwise; other drivers ignore it.
 	setenv("LP_NUM_THREADS", "0", 0);
 	EditorSession session;
-	if (!session.Start(someOptions.myLevel, 320, 180) || !session.Load(someOptions.myLevel, true))
+	if (!session.Start(someOptions.myLevel, 320, 180, true))
 	{
 		return 1;
+	}
+	// What check finds wrong would be baked in (a misspelt catalogue entry bakes an empty
+	// level over a good bake); damaged baked files are what the bake replaces.
+	const LevelReport report = CheckLevel(session, someOptions.myLevel);
+	if (!report.myProblems.empty())
+	{
+		const std::string count = std::to_string(report.myProblems.size()) + " problem" +
+		                          (report.myProblems.size() == 1 ? "" : "s");
+		if (!someOptions.myForceFlag)
+		{
+			PrintError("level '" + someOptions.myLevel + "' has " + count +
+			           "; not baked (lumora check lists them, --force bakes anyway):");
+			for (const std::string& problem : report.myProblems)
+			{
+				std::fprintf(stderr, "  %s\n", problem.c_str());
+			}
+			return 1;
+		}
+		std::printf("level %s: %s, baked anyway (--force)\n", someOptions.myLevel.c_str(), count.c_str());
 	}
 	const auto& editor = session.Editor();
 	std::printf("level %s: %d rooms, %d point and %d spot lights\n", someOptions.myLevel.c_str(),

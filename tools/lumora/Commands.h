@@ -15,9 +15,12 @@ struct BakeOptions
 	bool myAmbientOnlyFlag = false;
 	bool mySpecularOnlyFlag = false;
 	bool myDebugCapturesFlag = false;
+	// Bake a level in which check finds problems.
+	bool myForceFlag = false;
 };
 // Loads the level, bakes its ambient volume and/or its room reflections with a
-// progress bar, and prints what was written.
+// progress bar, and prints what was written. A level in which check finds problems
+// (other than in its baked files) is refused, unless forced.
 int RunBake(const BakeOptions& someOptions);
 
 struct RenderOptions

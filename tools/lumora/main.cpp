@@ -68,6 +68,8 @@ int main(int argc, char** argv)
 	ambientOnly->excludes(specularOnly);
 	bakeCommand->add_flag("--debug-captures", bake.myDebugCapturesFlag,
 	                      "Also save every probe's capture to data/cubemaps/sh debug/");
+	bakeCommand->add_flag("--force", bake.myForceFlag,
+	                      "Bake even a level in which check finds problems (they are baked in)");
 
 	LumoraTool::RenderOptions render;
 	std::string size = "1280x720";

@@ -1,0 +1,181 @@
+#include "LevelCheck.h"
+
+#include <filesystem>
+#include <map>
+#include <set>
+#include <sstream>
+#include <system_error>
+
+#include "engine/Room.h"
+#include "platform/paths/Paths.h"
+#include "renderer/CubemapContainer.h"
+#include "xml/XML.h"
+
+namespace LumoraTool
+{
+namespace
+{
+constexpr const char* ourEntityCatalogue = "data/XML/EntityTypes.xml";
+
+// Reports about files that a bake writes: what it is about to replace.
+bool IsAboutBakedOutput(const Problem& aProblem)
+{
+	return aProblem.myFunction == "Zeph::Renderer::SetSH" ||
+	       (aProblem.myFunction == "Lumora::LumoraWrapper::ParseEntities" &&
+	        aProblem.myText.starts_with(Zeph::CubemapContainer::ourUnusableFileText));
+}
+
+// The IDs of every "entity" record of the catalogue, models or not.
+std::set<std::string> CatalogueIDs()
+{
+	std::set<std::string> ids;
+	XML xml(ourEntityCatalogue);
+	if (xml.GoToElement("entities", "", "") && xml.EnterChild("entity"))
+	{
+		do
+		{
+			std::string id;
+			if (xml.TryGetAttribute<std::string>(id, "id"))
+			{
+				ids.insert(id);
+			}
+		} while (xml.GoToNextSibling("entity"));
+	}
+	return ids;
+}
+
+// Entities of types that the editor does not place: a type the catalogue does not list is a
+// problem (a misspelling on either side); one that it lists without a model is shown otherwise
+// by the game, a note.
+void CheckEntityTypes(const std::string& aLevel, const Lumora::LumoraWrapper& anEditor, LevelReport& aReport)
+{
+	const auto& bank = anEditor.GetEntityBank();
+	if (bank.empty())
+	{
+		aReport.myProblems.push_back(std::string(ourEntityCatalogue) +
+		                             ": no entity type with a model (a missing, empty or misspelt "
+		                             "catalogue): every level loads without entities");
+	}
+	const std::set<std::string> listed = CatalogueIDs();
+	const std::string file = "data/XML/levels/" + aLevel + "/entities.xml";
+	XML xml(file);
+	if (!xml.GoToElement("entities", "", "") || !xml.EnterChild("entity"))
+	{
+		return;
+	}
+	int index = 0;
+	do
+	{
+		std::string type;
+		xml.TryGetAttribute<std::string>(type, "type");
+		const std::string which = file + ": entity " + std::to_string(index) + " of type [" + type + "]";
+		if (!listed.contains(type))
+		{
+			aReport.myProblems.push_back(which + ", which " + ourEntityCatalogue +
+			                             " does not list: it is left out");
+		}
+		else if (!bank.contains(type))
+		{
+			aReport.myNotes.push_back(which + " has no model in " + ourEntityCatalogue +
+			                          ": the editor does not show it");
+		}
+		++index;
+	} while (xml.GoToNextSibling("entity"));
+}
+
+std::string Number(float aValue)
+{
+	std::ostringstream text;
+	text << aValue;
+	return text.str();
+}
+
+const char* AxisName(int anAxis)
+{
+	return anAxis == 0 ? "x" : (anAxis == 1 ? "y" : "z");
+}
+
+// Rooms that hold no volume, and IDs that are shared or cannot name a cubemap file. A room's
+// extent along x is put in order on loading (the file's x is mirrored); y and z are not.
+void CheckRooms(const std::string& aLevel, const Lumora::LumoraWrapper& anEditor, LevelReport& aReport)
+{
+	const std::string file = "data/XML/levels/" + aLevel + "/rooms.xml";
+	const auto& rooms = anEditor.GetRooms();
+	std::map<std::string, int> firstWithID;
+	for (int index = 0; index < rooms.Count(); ++index)
+	{
+		const Zeph::Room& room = *rooms[index];
+		const std::string which = file + ": room " + std::to_string(index) + " ('" + room.GetID() + "')";
+		const float min[3] = {room.GetMin().x, room.GetMin().y, room.GetMin().z};
+		const float max[3] = {room.GetMax().x, room.GetMax().y, room.GetMax().z};
+		for (int axis = 0; axis < 3; ++axis)
+		{
+			if (min[axis] == max[axis])
+			{
+				aReport.myProblems.push_back(which + " has no extent along " + AxisName(axis));
+			}
+			else if (min[axis] > max[axis])
+			{
+				aReport.myProblems.push_back(which + " is inverted along " + AxisName(axis) + " (min " +
+				                             Number(min[axis]) + " > max " + Number(max[axis]) + ")");
+			}
+		}
+		if (Zeph::CubemapContainer::GetRoomFile(aLevel, room.GetID()).empty())
+		{
+			aReport.myProblems.push_back(which +
+			                             ": the ID cannot name a cubemap file (empty, '.', '..' or with a "
+			                             "path separator): its reflections are not baked");
+		}
+		const auto [first, newFlag] = firstWithID.emplace(room.GetID(), index);
+		if (!newFlag)
+		{
+			aReport.myProblems.push_back(which + " has the ID of room " + std::to_string(first->second) +
+			                             ": both would bake into one cubemap file");
+		}
+	}
+}
+
+// What is not baked yet. Damaged files were reported by the load (the ambient volume by
+// Renderer::SetSH, each room's cubemap by the entities' loading).
+void NoteUnbakedFiles(const std::string& aLevel, const Lumora::LumoraWrapper& anEditor, LevelReport& aReport)
+{
+	const std::string ambient = "data/XML/levels/" + aLevel + "/ambient.sh";
+	std::error_code ignored;
+	if (!std::filesystem::exists(Paths::Resolve(ambient), ignored))
+	{
+		aReport.myNotes.push_back(ambient + ": not baked yet");
+	}
+	std::string resolved;
+	std::string problem;
+	const auto& rooms = anEditor.GetRooms();
+	for (int index = 0; index < rooms.Count(); ++index)
+	{
+		const std::string cubemap = Zeph::CubemapContainer::GetRoomFile(aLevel, rooms[index]->GetID());
+		if (!cubemap.empty() && Zeph::CubemapContainer::CheckFile(cubemap, resolved, problem) ==
+		                            Zeph::CubemapContainer::FileState::MISSING)
+		{
+			aReport.myNotes.push_back(cubemap + ": not baked yet (room '" + rooms[index]->GetID() +
+			                          "' shows the fallback cubemap)");
+		}
+	}
+}
+} // namespace
+
+LevelReport CheckLevel(EditorSession& aSession, const std::string& aLevel)
+{
+	aSession.LoadAndCount(aLevel);
+	// Taken before the checks below read files of their own: what they meet was reported already.
+	const std::vector<Problem> reported = aSession.GetProblems();
+	LevelReport report;
+	for (const Problem& problem : reported)
+	{
+		(IsAboutBakedOutput(problem) ? report.myBakedProblems : report.myProblems)
+		    .push_back(Describe(problem));
+	}
+	const Lumora::LumoraWrapper& editor = aSession.Editor();
+	CheckEntityTypes(aLevel, editor, report);
+	CheckRooms(aLevel, editor, report);
+	NoteUnbakedFiles(aLevel, editor, report);
+	return report;
+}
+} // namespace LumoraTool
