@@ -10,7 +10,7 @@ cd "$(dirname "$0")/.."
 dir=build
 options=()
 case "${1:-}" in
-	--sanitize) dir=build-asan; options+=(-DLUMORA_SANITIZE=ON -DLUMORA_BUILD_BENCH=OFF) ;;
+	--sanitize) dir=build-asan; options+=(-DLUMORA_SANITIZE=ON -DLUMORA_ASSERTIONS=ON -DLUMORA_BUILD_BENCH=OFF) ;;
 	--tsan) dir=build-tsan; options+=(-DLUMORA_TSAN=ON -DLUMORA_BUILD_BENCH=OFF) ;;
 	"") ;;
 	*) echo "usage: $0 [--sanitize|--tsan]" >&2; exit 2 ;;

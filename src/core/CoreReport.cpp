@@ -9,6 +9,7 @@
 namespace
 {
 std::atomic<CoreReport::Handler> ourHandler{nullptr};
+std::atomic<CoreReport::Handler> ourErrorHandler{nullptr};
 }
 
 namespace CoreReport
@@ -16,6 +17,10 @@ namespace CoreReport
 void SetCriticalHandler(Handler aHandler) { ourHandler.store(aHandler); }
 
 Handler GetCriticalHandler() { return ourHandler.load(); }
+
+void SetErrorHandler(Handler aHandler) { ourErrorHandler.store(aHandler); }
+
+Handler GetErrorHandler() { return ourErrorHandler.load(); }
 
 void Critical(int aLine, const char* aFunctionName, const char* aMessage)
 {
@@ -25,6 +30,16 @@ void Critical(int aLine, const char* aFunctionName, const char* aMessage)
 		return;
 	}
 	std::fprintf(stderr, "CRITICAL ERROR: %s (%d): %s\n", aFunctionName, aLine, aMessage);
+}
+
+void Error(int aLine, const char* aFunctionName, const char* aMessage)
+{
+	if (Handler handler = ourErrorHandler.load())
+	{
+		handler(aLine, aFunctionName, aMessage);
+		return;
+	}
+	std::fprintf(stderr, "ERROR: %s (%d): %s\n", aFunctionName, aLine, aMessage);
 }
 }
 

@@ -128,6 +128,7 @@ bool Debug::Create(std::string aFileName, std::bitset<4> someAssertLevels)
 		return false;
 	}
 	CoreReport::SetCriticalHandler(&Debug::ForwardCoreReport);
+	CoreReport::SetErrorHandler(&Debug::ForwardCoreError);
 	return true;
 }
 
@@ -146,6 +147,10 @@ bool Debug::Destroy()
 	if (CoreReport::GetCriticalHandler() == &Debug::ForwardCoreReport)
 	{
 		CoreReport::SetCriticalHandler(nullptr);
+	}
+	if (CoreReport::GetErrorHandler() == &Debug::ForwardCoreError)
+	{
+		CoreReport::SetErrorHandler(nullptr);
 	}
 	delete ourInstance;
 	ourInstance = nullptr;
@@ -314,5 +319,13 @@ void Debug::ForwardCoreReport(int aLine, const char* aFunctionName, const char* 
 	if (ourInstance != nullptr)
 	{
 		ourInstance->CriticalErrorMessage(aLine, aFunctionName, "%s", OrEmpty(aMessage));
+	}
+}
+
+void Debug::ForwardCoreError(int aLine, const char* aFunctionName, const char* aMessage)
+{
+	if (ourInstance != nullptr)
+	{
+		ourInstance->ErrorMessage(aLine, aFunctionName, "%s", OrEmpty(aMessage));
 	}
 }

@@ -64,6 +64,8 @@ private:
 	static void WriteCallStack(FI_File* aFile);
 	// Installed as CoreReport's critical handler while the log exists.
 	static void ForwardCoreReport(int aLine, const char* aFunctionName, const char* aMessage);
+	// Installed as CoreReport's error handler: failures below the engine, never fatal.
+	static void ForwardCoreError(int aLine, const char* aFunctionName, const char* aMessage);
 
 	FI_File myFile;
 	std::bitset<4> myAssertLevels;

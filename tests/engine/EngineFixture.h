@@ -19,13 +19,24 @@
 #include "support/GlSupport.h"
 #include "support/TestSupport.h"
 
+// Leaves the test when a start-up helper (CreateEngine, a fixture's Start) returns false:
+// the helper has already skipped the test (no GL) or failed it.
+#define LUMORA_RETURN_UNLESS(aStartedFlag)                                                                   \
+	do                                                                                                       \
+	{                                                                                                        \
+		if (!(aStartedFlag))                                                                                 \
+		{                                                                                                    \
+			return;                                                                                          \
+		}                                                                                                    \
+	} while (false)
+
 class EngineTest : public testing::Test
 {
 protected:
 	void SetUp() override
 	{
 		myLogPath = myScratch.File("DebugLogger.txt");
-		ASSERT_TRUE(Debug::Create(myLogPath, std::bitset<4>(0)));
+		ASSERT_TRUE(Debug::Create(myLogPath, myFatalLevels));
 	}
 
 	void TearDown() override
@@ -78,19 +89,14 @@ protected:
 	static bool DrawQuad(Gpu::Context& aContext, Fx::Pass& aPass, float aLeft, float aBottom, float aRight,
 	                     float aTop, const float aColor[4])
 	{
-		const ColorVertex vertices[6] = {
-		    {{aLeft, aBottom, 0.5f}, {aColor[0], aColor[1], aColor[2], aColor[3]}},
-		    {{aLeft, aTop, 0.5f}, {aColor[0], aColor[1], aColor[2], aColor[3]}},
-		    {{aRight, aTop, 0.5f}, {aColor[0], aColor[1], aColor[2], aColor[3]}},
-		    {{aLeft, aBottom, 0.5f}, {aColor[0], aColor[1], aColor[2], aColor[3]}},
-		    {{aRight, aTop, 0.5f}, {aColor[0], aColor[1], aColor[2], aColor[3]}},
-		    {{aRight, aBottom, 0.5f}, {aColor[0], aColor[1], aColor[2], aColor[3]}},
+		const auto corner = [&](float anX, float aY) {
+			return ColorVertex{{anX, aY, 0.5f}, {aColor[0], aColor[1], aColor[2], aColor[3]}};
 		};
-		Gpu::BufferDesc bufferDesc;
-		bufferDesc.mySize = sizeof(vertices);
-		bufferDesc.myLabel = "test quad";
+		const ColorVertex vertices[6] = {corner(aLeft, aBottom), corner(aLeft, aTop),
+		                                 corner(aRight, aTop),   corner(aLeft, aBottom),
+		                                 corner(aRight, aTop),   corner(aRight, aBottom)};
 		Gpu::Buffer buffer;
-		if (!buffer.Init(bufferDesc, vertices))
+		if (!buffer.Init({.mySize = sizeof(vertices), .myLabel = "test quad"}, vertices))
 		{
 			return false;
 		}
@@ -114,6 +120,10 @@ protected:
 		buffer.Destroy();
 		return result;
 	}
+
+	// A derived fixture sets the facade's own levels (12) in its constructor to prove
+	// that a path does not end the process where the editor runs.
+	std::bitset<4> myFatalLevels{0};
 
 	static constexpr float ourClearColor[4] = {0.1f, 0.2f, 0.3f, 1.0f};
 	static constexpr float ourQuadColor[4] = {0.5f, 0.25f, 1.0f, 1.0f};
@@ -153,10 +163,7 @@ protected:
 	// directory; its path.
 	std::string WriteSolidTexture(const std::string& aName, const uint8_t* aColor = nullptr)
 	{
-		Dds::ImageInfo info;
-		info.myWidth = 4;
-		info.myHeight = 4;
-		info.myFormat = Dds::Format::R8G8B8A8_UNORM;
+		const Dds::ImageInfo info{.myWidth = 4, .myHeight = 4, .myFormat = Dds::Format::R8G8B8A8_UNORM};
 		Dds::Image image;
 		std::string error;
 		EXPECT_TRUE(image.Init(info, error)) << error;

@@ -6,6 +6,7 @@
 
 #include "editor/StringConversion.h"
 #include "platform/gpu/Device.h"
+#include "platform/paths/Paths.h"
 
 namespace LumoraTool
 {
@@ -23,12 +24,27 @@ std::string LevelFolderProblem(const std::string& aLevel)
 		return "no data/ folder in " + fs::current_path(ignored).string() +
 		       " (run from the repository root or a copy of its data/)";
 	}
-	if (!aLevel.empty() && (aLevel.find('/') != std::string::npos || aLevel == ".." ||
-	                        !fs::is_directory("data/XML/levels/" + aLevel, ignored)))
+	if (!aLevel.empty() && (aLevel.find('/') != std::string::npos || aLevel == ".." || aLevel == "." ||
+	                        !fs::is_directory(Paths::Resolve("data/XML/levels/" + aLevel), ignored)))
 	{
 		return "no level '" + aLevel + "' under data/XML/levels/";
 	}
 	return {};
+}
+
+std::string LevelSpelledOnDisk(const std::string& aLevel)
+{
+	if (aLevel.empty() || aLevel.find('/') != std::string::npos || aLevel == "." || aLevel == "..")
+	{
+		return aLevel;
+	}
+	const std::filesystem::path resolved = Paths::Resolve("data/XML/levels/" + aLevel);
+	std::error_code ignored;
+	if (!std::filesystem::is_directory(resolved, ignored))
+	{
+		return aLevel;
+	}
+	return resolved.filename().string();
 }
 
 std::string Describe(const Problem& aProblem)

@@ -32,6 +32,11 @@ void PrintError(const std::string& aMessage);
 // no folder for it under data/XML/levels/.
 std::string LevelFolderProblem(const std::string& aLevel);
 
+// Level names are matched case-insensitively, as every data path is: the name as the
+// level's folder spells it (so outputs such as data/Cubemaps/<level>/ take that
+// spelling), or the name unchanged when no such folder exists.
+std::string LevelSpelledOnDisk(const std::string& aLevel);
+
 class EditorSession
 {
 public:

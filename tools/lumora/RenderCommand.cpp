@@ -3,6 +3,7 @@
 // eye adaptation settles, and the back buffer read back into a PNG.
 #include <cmath>
 #include <cstdio>
+#include <filesystem>
 #include <vector>
 
 #include "Commands.h"
@@ -11,6 +12,7 @@
 #include "engine/CameraInstance.h"
 #include "engine/Engine.h"
 #include "platform/gpu/Readback.h"
+#include "platform/paths/Paths.h"
 
 namespace LumoraTool
 {
@@ -58,6 +60,12 @@ int RunRender(const RenderOptions& someOptions)
 	    !session.Load(someOptions.myLevel))
 	{
 		return 1;
+	}
+	if (std::error_code ignored;
+	    !std::filesystem::exists(Paths::Resolve("data/XML/levels/" + someOptions.myLevel + "/ambient.sh"), ignored))
+	{
+		std::printf("note: level %s has no baked ambient light yet (lumora bake %s makes ambient.sh)\n",
+		            someOptions.myLevel.c_str(), someOptions.myLevel.c_str());
 	}
 	Lumora::LumoraWrapper& editor = session.Editor();
 	editor.SetIsLightMode(ModeNumber(someOptions.myMode));

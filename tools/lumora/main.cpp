@@ -110,11 +110,29 @@ int main(int argc, char** argv)
 	{
 		app.parse(argc, argv);
 	}
+	catch (const CLI::CallForHelp& request)
+	{
+		return app.exit(request);
+	}
+	catch (const CLI::CallForAllHelp& request)
+	{
+		return app.exit(request);
+	}
+	catch (const CLI::CallForVersion& request)
+	{
+		return app.exit(request);
+	}
 	catch (const CLI::ParseError& error)
 	{
-		return app.exit(error);
+		// CLI11 answers with its own exit codes (105 to 114) and a second line of advice;
+		// every bad argument here is one "lumora:" line and status 2, as for the commands.
+		LumoraTool::PrintError(std::string(error.what()) + " (lumora --help lists the commands)");
+		return 2;
 	}
 
+	bake.myLevel = LumoraTool::LevelSpelledOnDisk(bake.myLevel);
+	render.myLevel = LumoraTool::LevelSpelledOnDisk(render.myLevel);
+	checkLevel = LumoraTool::LevelSpelledOnDisk(checkLevel);
 	if (*bakeCommand)
 	{
 		return LumoraTool::RunBake(bake);

@@ -14,7 +14,7 @@ void ReportError(int aLine, const char* aFunctionName, const char* aFormat, ...)
 	va_start(arguments, aFormat);
 	std::vsnprintf(message, sizeof(message), aFormat, arguments);
 	va_end(arguments);
-	CoreReport::Critical(aLine, aFunctionName, message);
+	CoreReport::Error(aLine, aFunctionName, message);
 }
 
 std::string Describe(const char* aFormat, ...)

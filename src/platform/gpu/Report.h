@@ -5,9 +5,10 @@
 //   glTextureStorage2D(...);
 //   LUMORA_GL_CHECK("Gpu::Texture::Init");
 //
-// The platform layer sits below the engine, so reports travel through CoreReport,
-// which the engine's Debug log forwards into its log file (standard error when no
-// log exists). Debug builds read glGetError after the checked calls; release
+// The platform layer sits below the engine, so reports travel through CoreReport's
+// error level, which the engine's Debug log writes as a non-fatal "ERROR" entry
+// (standard error when no log exists). A report never ends the process: the caller
+// returns false or null and the engine decides, in its own words, what it means. Debug builds read glGetError after the checked calls; release
 // builds compile the checks away.
 
 #include <epoxy/gl.h>

@@ -15,8 +15,8 @@ protected:
 	void SetUp() override
 	{
 		ourReports.clear();
-		myPreviousHandler = CoreReport::GetCriticalHandler();
-		CoreReport::SetCriticalHandler([](int, const char* aFunctionName, const char* aMessage) {
+		myPreviousHandler = CoreReport::GetErrorHandler();
+		CoreReport::SetErrorHandler([](int, const char* aFunctionName, const char* aMessage) {
 			ourReports.push_back(std::string(aFunctionName) + ": " + aMessage);
 		});
 		ASSERT_TRUE(myFactory.Init());
@@ -25,7 +25,7 @@ protected:
 	void TearDown() override
 	{
 		myFactory.Destroy();
-		CoreReport::SetCriticalHandler(myPreviousHandler);
+		CoreReport::SetErrorHandler(myPreviousHandler);
 		EXPECT_TRUE(ourReports.empty())
 		    << "Unexpected reports: " << (ourReports.empty() ? "" : ourReports[0]);
 	}
