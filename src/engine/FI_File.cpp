@@ -75,7 +75,12 @@ template <typename T> bool FI_File::WriteNumber(T aValue)
 	{
 		myStream << aValue;
 	}
-	return true;
+	return Written();
+}
+
+bool FI_File::Written() const
+{
+	return !myStream.fail();
 }
 
 FI_File::FI_File() : myFlags(0)
@@ -186,7 +191,7 @@ bool FI_File::NewLine()
 	if ((myFlags & FileFlags::WRITE) != 0)
 	{
 		myStream.put('\n');
-		return true;
+		return Written();
 	}
 	return false;
 }
@@ -292,7 +297,7 @@ bool FI_File::Write(const std::string& aString)
 	if ((myFlags & FileFlags::BINARY) == 0)
 	{
 		myStream << '"' << aString << '"';
-		return true;
+		return Written();
 	}
 	// The length field is 32 bits; a longer string cannot be written faithfully.
 	if (aString.size() > static_cast<std::size_t>(std::numeric_limits<std::int32_t>::max()))
@@ -301,7 +306,7 @@ bool FI_File::Write(const std::string& aString)
 	}
 	WriteRaw(myStream, static_cast<std::int32_t>(aString.size()));
 	myStream.write(aString.data(), static_cast<std::streamsize>(aString.size()));
-	return true;
+	return Written();
 }
 
 bool FI_File::Write(const char* aString)
@@ -324,7 +329,7 @@ bool FI_File::WriteWord(const std::string& aWord)
 		return Write(aWord);
 	}
 	myStream << aWord;
-	return true;
+	return Written();
 }
 
 bool FI_File::Write(int aValue)
@@ -353,7 +358,7 @@ bool FI_File::WriteData(const void* aSource, int aByteCount)
 		return false;
 	}
 	myStream.write(static_cast<const char*>(aSource), aByteCount);
-	return true;
+	return Written();
 }
 
 bool FI_File::Flush()
@@ -363,5 +368,5 @@ bool FI_File::Flush()
 		return false;
 	}
 	myStream.flush();
-	return true;
+	return Written();
 }

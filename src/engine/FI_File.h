@@ -11,7 +11,9 @@
 // stream's default formatting and no separator. Binary mode: numbers as raw
 // little-endian bytes, strings as a 4-byte length and the characters.
 // Paths are resolved case-insensitively (Paths::Resolve); writing creates
-// missing directories.
+// missing directories. Writes, Flush and Close return false once the stream has
+// failed (a full disk, a file size limit), so a writer learns it before it renames a
+// temporary over the file it replaces.
 
 #include <fstream>
 #include <string>
@@ -65,6 +67,10 @@ private:
 	// in binary mode or stream extraction/insertion in text mode.
 	template <typename T> bool ReadNumber(T& aValue);
 	template <typename T> bool WriteNumber(T aValue);
+	// Whether the stream took everything so far. A write the disk refuses (full, a size
+	// limit) fails the stream, often only when its buffer is flushed: writers check the
+	// results of the writes, Flush and Close before they trust the file.
+	bool Written() const;
 
 	int myFlags;
 	std::fstream myStream;

@@ -209,3 +209,30 @@ TEST(FI_FileTest, OpenResolvesCaseCreatesDirectoriesAndAppends)
 	ASSERT_TRUE(file.Close());
 	EXPECT_EQ(ReadWholeFile(written), "") << "plain write truncates";
 }
+
+TEST(FI_FileTest, WritesFlushAndCloseReportADiskThatRefusesThem)
+{
+	// /dev/full refuses every byte, as a full disk does, whoever writes (root included).
+	if (!std::filesystem::exists("/dev/full"))
+	{
+		GTEST_SKIP() << "no /dev/full";
+	}
+	const std::string big(1 << 16, 'x');
+	for (const int flags : {WRITE, WRITE | BINARY})
+	{
+		SCOPED_TRACE(flags);
+		FI_File file;
+		ASSERT_TRUE(file.Open("/dev/full", flags));
+		EXPECT_TRUE(file.Write(1)) << "a small write only fills the stream's buffer";
+		EXPECT_FALSE(file.Flush()) << "the buffer could not be written out";
+		EXPECT_FALSE(file.Write("more") || file.Write(2.5f) || file.WriteWord("w") || file.NewLine())
+		    << "a failed stream takes nothing more";
+		EXPECT_FALSE(file.Close());
+
+		ASSERT_TRUE(file.Open("/dev/full", flags));
+		EXPECT_FALSE(flags & BINARY ? file.WriteData(big.data(), static_cast<int>(big.size()))
+		                            : file.WriteWord(big))
+		    << "a write larger than the buffer fails at once";
+		EXPECT_FALSE(file.Close());
+	}
+}
