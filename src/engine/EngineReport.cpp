@@ -12,7 +12,7 @@ namespace
 // The log cuts an entry at 4,095 characters; the buffer matches it.
 constexpr int ourMessageSize = 4096;
 
-void Forward(bool aCriticalFlag, int aLine, const char* aFunctionName, const char* aFormat,
+void Forward(Debug::AssertLevels aLevel, int aLine, const char* aFunctionName, const char* aFormat,
              std::va_list someArguments)
 {
 	char message[ourMessageSize];
@@ -24,13 +24,17 @@ void Forward(bool aCriticalFlag, int aLine, const char* aFunctionName, const cha
 		return;
 	}
 	// The formatted text goes in as an argument: file names may hold '%'.
-	if (aCriticalFlag)
+	switch (aLevel)
 	{
+	case Debug::CRITICAL_ERROR_MESSAGE:
 		log->CriticalErrorMessage(aLine, aFunctionName, "%s", message);
-	}
-	else
-	{
+		break;
+	case Debug::ERROR_MESSAGE:
+		log->ErrorMessage(aLine, aFunctionName, "%s", message);
+		break;
+	default:
 		log->DebugMessage(aLine, aFunctionName, "%s", message);
+		break;
 	}
 }
 } // namespace
@@ -39,7 +43,15 @@ void ReportCritical(int aLine, const char* aFunctionName, const char* aFormat, .
 {
 	std::va_list arguments;
 	va_start(arguments, aFormat);
-	Forward(true, aLine, aFunctionName, aFormat, arguments);
+	Forward(Debug::CRITICAL_ERROR_MESSAGE, aLine, aFunctionName, aFormat, arguments);
+	va_end(arguments);
+}
+
+void ReportError(int aLine, const char* aFunctionName, const char* aFormat, ...)
+{
+	std::va_list arguments;
+	va_start(arguments, aFormat);
+	Forward(Debug::ERROR_MESSAGE, aLine, aFunctionName, aFormat, arguments);
 	va_end(arguments);
 }
 
@@ -47,7 +59,7 @@ void ReportDebug(int aLine, const char* aFunctionName, const char* aFormat, ...)
 {
 	std::va_list arguments;
 	va_start(arguments, aFormat);
-	Forward(false, aLine, aFunctionName, aFormat, arguments);
+	Forward(Debug::DEBUG_MESSAGE, aLine, aFunctionName, aFormat, arguments);
 	va_end(arguments);
 }
 } // namespace Zeph

@@ -19,6 +19,7 @@
 #include "platform/gpu/Readback.h"
 #include "platform/gpu/Texture.h"
 #include "platform/sh/ShProjection.h"
+#include "renderer/AmbientGrid.h"
 #include "renderer/AmbientVolumeFile.h"
 #include "renderer/DynamicCubemap.h"
 #include "renderer/ProbeHelper.h"
@@ -28,8 +29,6 @@ namespace Zeph
 {
 namespace
 {
-constexpr float ourProbeSpacing = 2.0f;
-
 // Seconds since the last lap (or since it was made).
 class Stopwatch
 {
@@ -163,20 +162,6 @@ private:
 	std::vector<float> myTexels;
 };
 
-bool StrictlyInsideAnyRoom(const GrowingArray<Room*>& someRooms, const Vector3<float>& aPoint)
-{
-	for (int index = 0; index < someRooms.Count(); ++index)
-	{
-		const Vector3<float>& minimum = someRooms[index]->GetMin();
-		const Vector3<float>& maximum = someRooms[index]->GetMax();
-		if (aPoint.x > minimum.x && aPoint.x < maximum.x && aPoint.y > minimum.y && aPoint.y < maximum.y &&
-		    aPoint.z > minimum.z && aPoint.z < maximum.z)
-		{
-			return true;
-		}
-	}
-	return false;
-}
 } // namespace
 
 void Renderer::SaveProbeCapture(DynamicCubemap& aCube, const std::string& aPath)
@@ -215,11 +200,33 @@ void Renderer::GenerateSH(const GrowingArray<Room*>& someRooms, const std::strin
 	{
 		return;
 	}
+	myBakingProgressCounter = 0;
+	myBakingProgress = 0;
+	myBakedProbeCount = 0;
+	myBakeTimings = BakeTimings();
+	const AmbientGrid grid = AmbientGrid::FromRooms(someRooms);
+	// A grid that cannot be held is refused before anything is touched: the volume shown
+	// and the file on disk stay as they were.
+	if (const std::string problem = grid.GetSizeProblem(); !problem.empty())
+	{
+		ReportError(__LINE__, "Zeph::Renderer::GenerateSH", "%s; %s is left as it was", problem.c_str(),
+		            aPath.c_str());
+		myCollector.Reset();
+		return;
+	}
 	myProbeHelper.reset();
 	myProbeHelper = std::make_unique<ProbeHelper>();
 	myProbeHelper->Init();
 	mySHLoadedFlag = false;
 	PublishSHViews();
+	// Without rooms (or with rooms of no extent) there is no grid: nothing is baked, no
+	// file is written, and the volume is gone, its bounds with it.
+	if (grid.IsEmpty())
+	{
+		SetVolumeBounds(Vector3<float>(0.0f, 0.0f, 0.0f), Vector3<float>(0.0f, 0.0f, 0.0f));
+		myCollector.Reset();
+		return;
+	}
 	DynamicCubemap* cube = myProbeHelper->GetSHCubemap();
 	DeferredRenderTargetHelper gbuffer;
 	if (cube == nullptr || !gbuffer.Init(cube->GetSize(), cube->GetSize()))
@@ -227,37 +234,17 @@ void Renderer::GenerateSH(const GrowingArray<Room*>& someRooms, const std::strin
 		myCollector.Reset();
 		return;
 	}
-
-	Vector3<float> worldMin(2000000.0f, 2000000.0f, 2000000.0f);
-	Vector3<float> worldMax(-2000000.0f, -20000000.0f, -2000000.0f);
-	for (int index = 0; index < someRooms.Count(); ++index)
+	const int* counts = grid.myCounts;
+	const long long cells = grid.GetCellCount();
+	if (aBounces > 0)
 	{
-		const Vector3<float>& minimum = someRooms[index]->GetMin();
-		const Vector3<float>& maximum = someRooms[index]->GetMax();
-		worldMin.Set(std::min(worldMin.x, minimum.x), std::min(worldMin.y, minimum.y),
-		             std::min(worldMin.z, minimum.z));
-		worldMax.Set(std::max(worldMax.x, maximum.x), std::max(worldMax.y, maximum.y),
-		             std::max(worldMax.z, maximum.z));
+		// A large level bakes for hours: say how much there is to do before starting.
+		ReportDebug(__LINE__, "Zeph::Renderer::GenerateSH",
+		            "Baking %lld probes (of %d x %d x %d cells) over %d bounce%s into %s",
+		            grid.CountProbesInside(someRooms), counts[0], counts[1], counts[2], aBounces,
+		            aBounces == 1 ? "" : "s", aPath.c_str());
 	}
-	const Vector3<float> worldSize = worldMax - worldMin;
-	const int counts[3] = {static_cast<int>(std::ceil(worldSize.x / ourProbeSpacing)),
-	                       static_cast<int>(std::ceil(worldSize.y / ourProbeSpacing)),
-	                       static_cast<int>(std::ceil(worldSize.z / ourProbeSpacing))};
-	myBakingProgressCounter = 0;
-	myBakingProgress = 0;
-	myBakedProbeCount = 0;
-	myBakeTimings = BakeTimings();
-	// Without rooms (or with rooms of no extent) there is no grid: nothing is baked and
-	// no file is written; the volume stays empty.
-	if (counts[0] <= 0 || counts[1] <= 0 || counts[2] <= 0 || counts[0] > AmbientVolume::ourMaxCount ||
-	    counts[1] > AmbientVolume::ourMaxCount || counts[2] > AmbientVolume::ourMaxCount)
-	{
-		gbuffer.Destroy();
-		myCollector.Reset();
-		return;
-	}
-	SetVolumeBounds(worldMin, worldSize);
-	const long long cells = static_cast<long long>(counts[0]) * counts[1] * counts[2];
+	SetVolumeBounds(grid.myWorldMin, grid.myWorldSize);
 	std::vector<uint32_t> blocks[ProbeHelper::ourBlockCount];
 	for (std::vector<uint32_t>& block : blocks)
 	{
@@ -280,77 +267,69 @@ void Renderer::GenerateSH(const GrowingArray<Room*>& someRooms, const std::strin
 	for (int bounce = 0; bounce < aBounces; ++bounce)
 	{
 		context.SetViewport(cube->GetViewport());
-		int iz = 0;
-		for (float z = worldMin.z + 1.0f; z < worldMax.z; z += ourProbeSpacing, ++iz)
-		{
-			int iy = 0;
-			for (float y = worldMin.y + 1.0f; y < worldMax.y; y += ourProbeSpacing, ++iy)
+		grid.ForEachProbe([&](const Vector3<float>& aProbe, int anX, int aY, int aZ, size_t aCell) {
+			if (AmbientGrid::StrictlyInsideAnyRoom(someRooms, aProbe))
 			{
-				int ix = 0;
-				for (float x = worldMin.x + 1.0f; x < worldMax.x; x += ourProbeSpacing, ++ix)
+				Stopwatch watch;
+				for (int face = 0; face < 6; ++face)
 				{
-					const Vector3<float> probe(x, y, z);
-					const size_t cell = static_cast<size_t>((iz * counts[1] + iy) * counts[0] + ix);
-					if (StrictlyInsideAnyRoom(someRooms, probe))
+					RenderProbeFace(*cube, face, aProbe, gbuffer, false);
+				}
+				myBakeTimings.myRendering += watch.Lap();
+				if (aDebugFlag)
+				{
+					SaveProbeCapture(*cube, "data/cubemaps/sh debug/" + std::to_string(aCell) + "bounce" +
+					                            std::to_string(bounce) + ".dds");
+				}
+				// Batched where the atlas could be made, else one read-back per probe.
+				if (batchedFlag && cube->GetTexture() != nullptr &&
+				    atlas.Add(context, *cube->GetTexture(), aCell))
+				{
+					myBakeTimings.myRendering += watch.Lap();
+					if (atlas.IsFull())
 					{
-						Stopwatch watch;
-						for (int face = 0; face < 6; ++face)
-						{
-							RenderProbeFace(*cube, face, probe, gbuffer, false);
-						}
-						myBakeTimings.myRendering += watch.Lap();
-						if (aDebugFlag)
-						{
-							SaveProbeCapture(*cube, "data/cubemaps/sh debug/" + std::to_string(cell) +
-							                            "bounce" + std::to_string(bounce) + ".dds");
-						}
-						// Batched where the atlas could be made, else one read-back per probe.
-						if (batchedFlag && cube->GetTexture() != nullptr &&
-						    atlas.Add(context, *cube->GetTexture(), cell))
-						{
-							myBakeTimings.myRendering += watch.Lap();
-							if (atlas.IsFull())
-							{
-								flush();
-							}
-						}
-						else
-						{
-							AddScalars(*cube, blocks, ix, iy, iz, counts[0], counts[1], counts[2]);
-						}
-						++myBakedProbeCount;
+						flush();
 					}
-					else
-					{
-						for (std::vector<uint32_t>& block : blocks)
-						{
-							block[cell] = ourNeutralSHTexel;
-						}
-					}
-					++myBakingProgressCounter;
-					myBakingProgress = std::min(
-					    100, static_cast<int>(static_cast<double>(myBakingProgressCounter) / total * 100.0));
+				}
+				else
+				{
+					AddScalars(*cube, blocks, anX, aY, aZ, counts[0], counts[1], counts[2]);
+				}
+				++myBakedProbeCount;
+			}
+			else
+			{
+				for (std::vector<uint32_t>& block : blocks)
+				{
+					block[aCell] = ourNeutralSHTexel;
 				}
 			}
-		}
+			++myBakingProgressCounter;
+			myBakingProgress =
+			    std::min(100, static_cast<int>(static_cast<double>(myBakingProgressCounter) / total * 100.0));
+		});
 		flush();
 		// Only now does the next bounce see this one: within a bounce every probe is lit
 		// by the previous bounce's volume.
 		UploadSHToGPU(true, blocks, counts[0], counts[1], counts[2]);
-		if (bounce == aBounces - 1)
+	}
+	if (aBounces > 0)
+	{
+		AmbientVolume volume;
+		volume.myWorldSize = grid.myWorldSize;
+		volume.myWorldMin = grid.myWorldMin;
+		std::copy(counts, counts + 3, volume.myCounts);
+		for (int block = 0; block < ProbeHelper::ourBlockCount; ++block)
 		{
-			AmbientVolume volume;
-			volume.myWorldSize = worldSize;
-			volume.myWorldMin = worldMin;
-			std::copy(counts, counts + 3, volume.myCounts);
-			for (int block = 0; block < ProbeHelper::ourBlockCount; ++block)
-			{
-				volume.myBlocks[block] = blocks[block];
-			}
-			if (!WriteAmbientVolume(aPath, volume))
-			{
-				ReportDebug(__LINE__, "Zeph::Renderer::GenerateSH", "Could not write %s", aPath.c_str());
-			}
+			volume.myBlocks[block] = std::move(blocks[block]);
+		}
+		// The volume on the GPU is the new one either way; the file is replaced whole or
+		// not at all.
+		std::string problem;
+		if (!WriteAmbientVolume(aPath, volume, problem))
+		{
+			ReportError(__LINE__, "Zeph::Renderer::GenerateSH", "Could not write the ambient light: %s",
+			            problem.c_str());
 		}
 	}
 	myCollector.Reset();

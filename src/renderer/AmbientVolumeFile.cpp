@@ -20,6 +20,13 @@ bool ReadVector(FI_File& aFile, Vector3<float>& aVector)
 AmbientVolumeRead ReadAmbientVolume(const std::string& aPath, AmbientVolume& aVolumeOut,
                                     std::string& aProblemOut)
 {
+	// An unbaked level has no file: that is its normal state, not an error for the file
+	// stream to announce on standard error.
+	std::error_code ignored;
+	if (!std::filesystem::is_regular_file(Paths::Resolve(aPath), ignored))
+	{
+		return AmbientVolumeRead::CANNOT_OPEN;
+	}
 	FI_File file;
 	if (!file.Open(aPath, FI_File::FileFlags::READ | FI_File::FileFlags::BINARY))
 	{
@@ -68,7 +75,7 @@ AmbientVolumeRead ReadAmbientVolume(const std::string& aPath, AmbientVolume& aVo
 	return AmbientVolumeRead::OK;
 }
 
-bool WriteAmbientVolume(const std::string& aPath, const AmbientVolume& aVolume)
+bool WriteAmbientVolume(const std::string& aPath, const AmbientVolume& aVolume, std::string& aProblemOut)
 {
 	const long long cells =
 	    static_cast<long long>(aVolume.myCounts[0]) * aVolume.myCounts[1] * aVolume.myCounts[2];
@@ -76,35 +83,49 @@ bool WriteAmbientVolume(const std::string& aPath, const AmbientVolume& aVolume)
 	{
 		if (cells <= 0 || static_cast<long long>(block.size()) != cells)
 		{
+			aProblemOut = aPath + ": the volume's blocks do not match its probe counts";
 			return false;
 		}
 	}
 	const std::string target = Paths::PrepareForWrite(aPath);
-	const std::string temporary = Paths::TemporaryFor(target);
+	if (target.empty())
 	{
-		FI_File file;
-		if (!file.Open(temporary, FI_File::FileFlags::WRITE | FI_File::FileFlags::BINARY))
-		{
-			return false;
-		}
-		bool written = file.Write(aVolume.myWorldSize.x) && file.Write(aVolume.myWorldSize.y) &&
-		               file.Write(aVolume.myWorldSize.z) && file.Write(aVolume.myWorldMin.x) &&
-		               file.Write(aVolume.myWorldMin.y) && file.Write(aVolume.myWorldMin.z) &&
-		               file.Write(aVolume.myCounts[0]) && file.Write(aVolume.myCounts[1]) &&
-		               file.Write(aVolume.myCounts[2]);
-		for (const std::vector<uint32_t>& block : aVolume.myBlocks)
-		{
-			written = written && file.WriteData(block.data(), static_cast<int>(cells * 4));
-		}
-		written = written && file.Flush();
-		file.Close();
-		if (!written)
-		{
-			std::error_code ignored;
-			std::filesystem::remove(temporary, ignored);
-			return false;
-		}
+		aProblemOut = aPath + ": its folder cannot be made";
+		return false;
 	}
-	return Paths::ReplaceWith(temporary, target);
+	const std::string temporary = Paths::TemporaryFor(target);
+	if (temporary.empty())
+	{
+		aProblemOut = aPath + ": no temporary file can be made beside it";
+		return false;
+	}
+	FI_File file;
+	bool written = file.Open(temporary, FI_File::FileFlags::WRITE | FI_File::FileFlags::BINARY) &&
+	               file.Write(aVolume.myWorldSize.x) && file.Write(aVolume.myWorldSize.y) &&
+	               file.Write(aVolume.myWorldSize.z) && file.Write(aVolume.myWorldMin.x) &&
+	               file.Write(aVolume.myWorldMin.y) && file.Write(aVolume.myWorldMin.z) &&
+	               file.Write(aVolume.myCounts[0]) && file.Write(aVolume.myCounts[1]) &&
+	               file.Write(aVolume.myCounts[2]);
+	for (const std::vector<uint32_t>& block : aVolume.myBlocks)
+	{
+		written = written && file.WriteData(block.data(), static_cast<int>(cells * 4));
+	}
+	written = written && file.Flush();
+	// A full disk often shows only when the last buffer is written out at Close.
+	written = file.Close() && written;
+	if (!written)
+	{
+		std::error_code ignored;
+		std::filesystem::remove(temporary, ignored);
+		aProblemOut = aPath + ": the disk did not take its " + std::to_string(36 + 28 * cells) +
+		              " bytes (full, or over a size limit); the old file is kept";
+		return false;
+	}
+	if (!Paths::ReplaceWith(temporary, target))
+	{
+		aProblemOut = aPath + ": the new file could not replace the old one, which is kept";
+		return false;
+	}
+	return true;
 }
 } // namespace Zeph

@@ -8,7 +8,7 @@
 //   Zeph::AmbientVolume volume;
 //   std::string problem;
 //   switch (Zeph::ReadAmbientVolume("data/XML/levels/x/ambient.sh", volume, problem)) { ... }
-//   Zeph::WriteAmbientVolume(path, volume);   // to a temporary, renamed over the old file
+//   if (!Zeph::WriteAmbientVolume(path, volume, problem)) { ... }   // the old file is kept
 #include <cstdint>
 #include <string>
 #include <vector>
@@ -40,6 +40,7 @@ enum class AmbientVolumeRead
 AmbientVolumeRead ReadAmbientVolume(const std::string& aPath, AmbientVolume& aVolumeOut,
                                     std::string& aProblemOut);
 // Writes the whole file to a temporary in the same directory and renames it over
-// aPath; false when it cannot be written (the old file then stays as it was).
-bool WriteAmbientVolume(const std::string& aPath, const AmbientVolume& aVolume);
+// aPath; false, with aProblemOut naming the file and the reason, when it cannot be
+// written whole (the old file then stays as it was, byte for byte).
+bool WriteAmbientVolume(const std::string& aPath, const AmbientVolume& aVolume, std::string& aProblemOut);
 } // namespace Zeph

@@ -358,28 +358,26 @@ void Renderer::UpdateScreenCamera(const CameraInstance& aCamera)
 
 void Renderer::SetSH(const std::string& aPath)
 {
+	// The volume shown so far goes first, whatever the file holds: a level whose file is
+	// missing or damaged must not show the previous level's light.
+	myProbeHelper.reset();
+	myProbeHelper = std::make_unique<ProbeHelper>();
+	myProbeHelper->Init();
+	mySHLoadedFlag = false;
+	PublishSHViews();
+	SetVolumeBounds(Vector3<float>(0.0f, 0.0f, 0.0f), Vector3<float>(0.0f, 0.0f, 0.0f));
 	AmbientVolume volume;
 	std::string problem;
 	const AmbientVolumeRead result = ReadAmbientVolume(aPath, volume, problem);
 	if (result == AmbientVolumeRead::DAMAGED)
 	{
-		if (Debug* log = Debug::GetInstance())
-		{
-			log->ErrorMessage(__LINE__, "Zeph::Renderer::SetSH", "Damaged ambient light, not loaded: %s",
-			                  problem.c_str());
-		}
+		ReportError(__LINE__, "Zeph::Renderer::SetSH", "Damaged ambient light, not loaded: %s",
+		            problem.c_str());
 		return;
 	}
-	myProbeHelper.reset();
-	myProbeHelper = std::make_unique<ProbeHelper>();
-	myProbeHelper->Init();
-	mySHLoadedFlag = false;
-	// The old volume's views are gone: nothing may stay bound to them.
-	PublishSHViews();
 	if (result == AmbientVolumeRead::CANNOT_OPEN)
 	{
 		// Unbaked level: no volume, so the ambient pass adds nothing.
-		SetVolumeBounds(Vector3<float>(0.0f, 0.0f, 0.0f), Vector3<float>(0.0f, 0.0f, 0.0f));
 		return;
 	}
 	SetVolumeBounds(volume.myWorldMin, volume.myWorldSize);

@@ -108,10 +108,10 @@ public:
 	void SetHDRandBloomVariables(float anAutoExposure, float aLumMin, float aLumMax, float aBloomThreshold,
 	                             float aBloomFactor, float anEmissiveMultiplier);
 
-	// Loads a level's baked ambient light (ambient.sh) and uploads it. A file that
-	// cannot be opened leaves no volume (the level has not been baked); a damaged file
-	// (counts that do not match its size, or outside 1..2048) is reported and the
-	// volume shown so far stays.
+	// Loads a level's baked ambient light (ambient.sh) and uploads it. The volume shown
+	// so far is dropped first: a file that cannot be opened (the level has not been
+	// baked) leaves no volume, and so does a damaged file (counts that do not match its
+	// size, or outside 1..2048), which is reported at the error level.
 	void SetSH(const std::string& aPath);
 	// The irradiance volume: update false creates the seven 3D textures from the
 	// blocks, true overwrites them; both bind them to the full-screen effect.
@@ -141,6 +141,9 @@ public:
 	// GenerateSH: the SH irradiance volume over the rooms' bounds (a probe every 2
 	// units), aBounces times, each bounce lit by the previous one's volume; the last
 	// bounce is written to aPath (ambient.sh); aDebugFlag saves every probe cubemap.
+	// A grid too large to hold is refused at the error level before anything changes;
+	// a file that cannot be written whole is reported at the error level and the old
+	// one is kept. Neither ends the process.
 	void GenerateSH(const GrowingArray<Room*>& someRooms, const std::string& aPath, int aBounces,
 	                bool aDebugFlag);
 	// Projects the SH probe cubemap onto SH and stores the seven packed vectors of

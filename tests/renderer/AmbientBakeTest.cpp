@@ -1,6 +1,8 @@
 // The ambient bake on a headless engine: the probe grid and its progress, the file it
-// writes, what a loaded file puts on the GPU, the packing of coefficients, and the
-// light it captures (a room lit from +X lights surfaces that face +X).
+// writes, what a loaded file puts on the GPU, the packing of coefficients, the light it
+// captures (a room lit from +X lights surfaces that face +X), and its failures under the
+// editor's fatal log levels: a grid too large refused before any work, a file the disk
+// will not take reported with the old file kept, a bake without rooms leaving no volume.
 #include <algorithm>
 #include <cmath>
 #include <filesystem>
@@ -21,11 +23,13 @@
 #include "platform/fx/Effect.h"
 #include "platform/fx/Variable.h"
 #include "platform/gpu/Readback.h"
+#include "renderer/AmbientGrid.h"
 #include "renderer/AmbientVolumeFile.h"
 #include "renderer/ProbeHelper.h"
 #include "renderer/RenderTargetHelper.h"
 #include "renderer/Renderer.h"
 #include "renderer/ShPacking.h"
+#include "support/FileSizeLimit.h"
 #include "support/TestSupport.h"
 
 using namespace FrameTesting;
@@ -48,9 +52,27 @@ protected:
 		Renderer().GenerateSH(myRoomList, aPath, aBounces, false);
 	}
 
+	// "WorldMin" and "WorldSize" as the ambient pass receives them.
+	std::vector<float> Bounds(const char* aName)
+	{
+		const Fx::Variable* variable =
+		    Renderer().GetFullScreenHelper().GetEffect()->GetEffect()->GetVariableByName(aName);
+		return variable != nullptr
+		           ? std::vector<float>(variable->GetFloats().begin(), variable->GetFloats().begin() + 3)
+		           : std::vector<float>();
+	}
+
 	std::vector<std::unique_ptr<Zeph::Room>> myRooms;
 	GrowingArray<Zeph::Room*> myRoomList{8, 8};
 	TestSupport::ScratchDir myScratch;
+};
+
+// Under the editor's own log levels (severe and critical end the process): what a user
+// can cause must be an error entry and the bake must come back.
+class AmbientBakeFailureTest : public AmbientBakeTest
+{
+protected:
+	AmbientBakeFailureTest() { myFatalLevels = 12; }
 };
 
 // The irradiance / pi a cell's seven texels give for a normal, red channel.
@@ -79,6 +101,58 @@ TEST(ShPackingTest, CoefficientsAreClampedMappedAndTruncated)
 	EXPECT_EQ(Zeph::PackSHVector(0.0f, 0.0f, 0.0f, 0.0f), Zeph::ourNeutralSHTexel);
 	// (0.5 + 1) / 2 * 255 = 191.25 -> 191; (-0.5 + 1) / 2 * 255 = 63.75 -> 63 (not rounded).
 	EXPECT_EQ(Zeph::PackSHVector(0.5f, -0.5f, 0.0f, 0.0f) & 0xFFFFu, 0x3FBFu);
+}
+
+TEST(AmbientGridTest, CountsAndTheGridsThatCannotBeBaked)
+{
+	const struct
+	{
+		const char* myName;
+		Vector3<float> myMin;
+		Vector3<float> myMax;
+		int myCounts[3];
+		std::vector<std::string> myProblemParts; // empty: the grid can be baked
+	} cases[] = {
+	    {"no rooms", {}, {}, {0, 0, 0}, {}},
+	    {"no extent", {1.0f, 0.0f, 0.0f}, {1.0f, 3.0f, 3.0f}, {0, 0, 0}, {}},
+	    {"10 x 4 x 9", {0.0f, 0.0f, 0.0f}, {10.0f, 4.0f, 9.0f}, {5, 2, 5}, {}},
+	    {"a room of 4 km",
+	     {0.0f, 0.0f, 0.0f},
+	     {4000.0f, 4000.0f, 4000.0f},
+	     {2000, 2000, 2000},
+	     {"2000 x 2000 x 2000 = 8000000000 probes", "208.6 GiB", "28 bytes per probe",
+	      "the limit is 1.0 GiB"}},
+	    {"too long for a volume texture",
+	     {0.0f, 0.0f, 0.0f},
+	     {5000.0f, 2.0f, 2.0f},
+	     {2500, 1, 1},
+	     {"2500 x 1 x 1", "at most 2048"}},
+	    {"too far down for float steps",
+	     {0.0f, -1.0e7f, 0.0f},
+	     {2.0f, -1.0e7f + 2.0f, 2.0f},
+	     {1, 1, 1},
+	     {"-1e+07 units", "the limit is"}},
+	};
+	for (const auto& test : cases)
+	{
+		SCOPED_TRACE(test.myName);
+		GrowingArray<Zeph::Room*> rooms(2, 2);
+		Zeph::Room room(test.myMin, test.myMax);
+		if (std::string(test.myName) != "no rooms")
+		{
+			rooms.Add(&room);
+		}
+		const Zeph::AmbientGrid grid = Zeph::AmbientGrid::FromRooms(rooms);
+		EXPECT_EQ(std::vector<int>(grid.myCounts, grid.myCounts + 3),
+		          std::vector<int>(test.myCounts, test.myCounts + 3));
+		EXPECT_EQ(grid.IsEmpty(), test.myCounts[0] == 0);
+		const std::string problem = grid.GetSizeProblem();
+		EXPECT_EQ(problem.empty(), test.myProblemParts.empty()) << problem;
+		for (const std::string& part : test.myProblemParts)
+		{
+			EXPECT_NE(problem.find(part), std::string::npos) << problem;
+		}
+	}
 }
 
 TEST_F(AmbientBakeTest, GridCountsProgressAndWhatZeroBouncesLeave)
@@ -336,4 +410,89 @@ TEST_F(AmbientBakeTest, AClosedRoomOfUniformRadianceGivesTheSameAmbientForEveryN
 			}
 		}
 	}
+}
+
+TEST_F(AmbientBakeFailureTest, AGridTooLargeIsRefusedBeforeAnyWorkAndTheOldBakeStays)
+{
+	LUMORA_RETURN_UNLESS(Start());
+	AddRoom({0.0f, 0.0f, 0.0f}, {4.0f, 2.0f, 2.0f});
+	const std::string path = myScratch.File("level/ambient.sh");
+	Bake(path, 1);
+	const std::string before = TestSupport::ReadWholeFile(path);
+	ASSERT_FALSE(before.empty());
+	const Gpu::ShaderResourceView* shown = Renderer().GetProbeHelper()->GetView(0);
+	TakeLog();
+
+	// A room of 4 km: 8 billion probes, 224 GB of blocks. Refused with the numbers, the
+	// volume shown and the file kept.
+	AddRoom({0.0f, 0.0f, 0.0f}, {4000.0f, 4000.0f, 4000.0f});
+	myPointLights.push_back(Zeph::PointLightData());
+	Bake(path, 1);
+	const std::string log = TakeLog();
+	EXPECT_NE(log.find("ERROR"), std::string::npos) << log;
+	for (const char* part :
+	     {"8000000000 probes", "GiB", "the limit is", "level/ambient.sh is left as it was"})
+	{
+		EXPECT_NE(log.find(part), std::string::npos) << part << "\n" << log;
+	}
+	EXPECT_EQ(Renderer().GetProbeHelper()->GetView(0), shown);
+	EXPECT_EQ(TestSupport::ReadWholeFile(path), before);
+	EXPECT_EQ(Renderer().GetBakingProgress(), 0);
+	EXPECT_EQ(Renderer().GetRTC().GetPointLights().Count(), 0) << "the queued scene is let go";
+}
+
+TEST_F(AmbientBakeFailureTest, AFileTheDiskWillNotTakeIsReportedAndTheOldOneKeptByteForByte)
+{
+	LUMORA_RETURN_UNLESS(Start());
+	// Two small rooms far apart: a grid of 51 x 1 x 51 cells (a 73 KB file) with two
+	// probes to render.
+	AddRoom({0.0f, 0.0f, 0.0f}, {2.0f, 2.0f, 2.0f});
+	AddRoom({100.0f, 0.0f, 100.0f}, {102.0f, 2.0f, 102.0f});
+	const std::string path = myScratch.File("level/ambient.sh");
+	Bake(path, 1);
+	const std::string before = TestSupport::ReadWholeFile(path);
+	ASSERT_EQ(before.size(), 36u + 28u * 51u * 51u);
+	const std::string logBefore = TakeLog();
+	EXPECT_NE(logBefore.find("Baking 2 probes (of 51 x 1 x 51 cells) over 1 bounce into " + path),
+	          std::string::npos)
+	    << "the bake says how much it has to do first\n"
+	    << logBefore;
+
+	Zeph::PointLightData light;
+	light.myPosition = Vector3<float>(1.0f, 1.0f, 1.5f);
+	light.myFalloff = 2.0f;
+	light.myColor = Vector4<float>(9.0f, 9.0f, 9.0f, 1.0f);
+	myPointLights.push_back(light);
+	{
+		// Room for the log, not for the file.
+		TestSupport::FileSizeLimit full(std::filesystem::file_size(myLogPath) + 32768);
+		Bake(path, 1);
+	}
+	const std::string log = TakeLog();
+	EXPECT_NE(log.find("ERROR"), std::string::npos) << log;
+	EXPECT_NE(log.find("Could not write the ambient light: " + path), std::string::npos) << log;
+	EXPECT_TRUE(TestSupport::ReadWholeFile(path) == before) << "the old file was replaced";
+	EXPECT_EQ(std::distance(std::filesystem::directory_iterator(myScratch.Path() / "level"),
+	                        std::filesystem::directory_iterator()),
+	          1)
+	    << "no temporary is left beside it";
+	EXPECT_NE(Renderer().GetProbeHelper()->GetView(0), nullptr) << "the new bake is still shown";
+}
+
+TEST_F(AmbientBakeTest, ABakeWithoutRoomsLeavesNoVolumeAndNoBounds)
+{
+	LUMORA_RETURN_UNLESS(Start());
+	AddRoom({-2.0f, 0.0f, -2.0f}, {8.0f, 4.0f, 7.0f});
+	const std::string path = myScratch.File("level/ambient.sh");
+	Bake(path, 1);
+	EXPECT_EQ(Bounds("WorldMin"), (std::vector<float>{-2.0f, 0.0f, -2.0f}));
+	EXPECT_EQ(Bounds("WorldSize"), (std::vector<float>{10.0f, 4.0f, 9.0f}));
+	const std::string before = TestSupport::ReadWholeFile(path);
+
+	myRoomList.RemoveAll();
+	Bake(path, 1);
+	EXPECT_EQ(Renderer().GetProbeHelper()->GetView(0), nullptr);
+	EXPECT_EQ(Bounds("WorldMin"), (std::vector<float>{0.0f, 0.0f, 0.0f}));
+	EXPECT_EQ(Bounds("WorldSize"), (std::vector<float>{0.0f, 0.0f, 0.0f}));
+	EXPECT_EQ(TestSupport::ReadWholeFile(path), before) << "nothing baked, nothing written";
 }

@@ -1,16 +1,21 @@
 // The baked ambient light's file, ambient.sh: written whole through a temporary and
-// read back unchanged; damaged files are refused with a reason; SetSH keeps the
-// volume shown so far when the file is damaged, drops it when the level has none,
-// and a loaded volume lights the frame.
+// read back unchanged, or not at all (a full disk, a folder that cannot be written) with
+// the old file kept byte for byte; temporaries of killed writers are cleared; damaged
+// files are refused with a reason; SetSH drops the volume shown so far before it loads,
+// so a damaged or missing file leaves none, and a loaded volume lights the frame.
 #include <filesystem>
 #include <fstream>
 #include <gtest/gtest.h>
+#include <optional>
 #include <string>
+#include <sys/wait.h>
+#include <unistd.h>
 #include <vector>
 
 #include "FrameFixture.h"
 #include "renderer/AmbientVolumeFile.h"
 #include "renderer/Renderer.h"
+#include "support/FileSizeLimit.h"
 #include "support/TestSupport.h"
 
 using namespace FrameTesting;
@@ -61,14 +66,14 @@ TEST(AmbientVolumeFileTest, WrittenFileReadsBackUnchangedAndLeavesNoTemporary)
 	TestSupport::ScratchDir scratch;
 	const std::string path = scratch.File("levels/a/ambient.sh");
 	const Zeph::AmbientVolume written = MakeVolume();
-	ASSERT_TRUE(Zeph::WriteAmbientVolume(path, written)) << "the missing directories are made";
+	std::string problem;
+	ASSERT_TRUE(Zeph::WriteAmbientVolume(path, written, problem)) << "the missing directories are made";
 	EXPECT_EQ(std::filesystem::file_size(path), 36u + 28u * 12u);
 	EXPECT_EQ(std::distance(std::filesystem::directory_iterator(scratch.Path() / "levels/a"),
 	                        std::filesystem::directory_iterator()),
 	          1);
 
 	Zeph::AmbientVolume read;
-	std::string problem;
 	ASSERT_EQ(Zeph::ReadAmbientVolume(path, read, problem), Zeph::AmbientVolumeRead::OK) << problem;
 	EXPECT_EQ(read.myWorldSize.z, 4.5f);
 	EXPECT_EQ(read.myWorldMin.x, -3.0f);
@@ -86,16 +91,110 @@ TEST(AmbientVolumeFileTest, WrittenFileReadsBackUnchangedAndLeavesNoTemporary)
 
 	Zeph::AmbientVolume incomplete = MakeVolume();
 	incomplete.myBlocks[6].pop_back();
-	EXPECT_FALSE(Zeph::WriteAmbientVolume(path, incomplete));
+	EXPECT_FALSE(Zeph::WriteAmbientVolume(path, incomplete, problem));
 	ASSERT_EQ(Zeph::ReadAmbientVolume(path, read, problem), Zeph::AmbientVolumeRead::OK)
 	    << "a refused write leaves the old file";
+}
+
+TEST(AmbientVolumeFileTest, AWriteTheDiskRefusesKeepsTheOldFileByteForByteAndSaysWhy)
+{
+	TestSupport::ScratchDir scratch;
+	std::filesystem::create_directories(scratch.Path() / "level");
+	TestSupport::WriteWholeFile(scratch.File("plain"), "a file, not a folder");
+	// Root may write into any folder it can chmod; /sys is one it cannot.
+	const bool rootFlag = ::geteuid() == 0;
+	const std::string locked = rootFlag ? "/sys/ambient.sh" : scratch.File("locked/ambient.sh");
+	if (!rootFlag)
+	{
+		std::filesystem::create_directories(scratch.Path() / "locked");
+		TestSupport::WriteWholeFile(locked, "old bake");
+		std::filesystem::permissions(scratch.Path() / "locked", std::filesystem::perms(0555));
+	}
+	const std::string full = scratch.File("level/ambient.sh");
+	TestSupport::WriteWholeFile(full, "old bake");
+	const struct
+	{
+		const char* myName;
+		std::string myPath;
+		const char* myReason;
+		rlim_t myFileSizeLimit; // 0: none
+	} cases[] = {
+	    {"full disk", full, "did not take", 100},
+	    {"read-only folder", locked, "no temporary file", 0},
+	    {"folder is a file", scratch.File("plain/ambient.sh"), "folder cannot be made", 0},
+	};
+	for (const auto& test : cases)
+	{
+		SCOPED_TRACE(test.myName);
+		const std::string before = TestSupport::ReadWholeFile(test.myPath);
+		std::string problem;
+		bool written = true;
+		{
+			std::optional<TestSupport::FileSizeLimit> limit;
+			if (test.myFileSizeLimit != 0)
+			{
+				limit.emplace(test.myFileSizeLimit);
+			}
+			written = Zeph::WriteAmbientVolume(test.myPath, MakeVolume(), problem);
+		}
+		EXPECT_FALSE(written);
+		EXPECT_NE(problem.find(test.myPath), std::string::npos) << problem;
+		EXPECT_NE(problem.find(test.myReason), std::string::npos) << problem;
+		EXPECT_EQ(TestSupport::ReadWholeFile(test.myPath), before) << "the old file is untouched";
+	}
+	EXPECT_EQ(std::distance(std::filesystem::directory_iterator(scratch.Path() / "level"),
+	                        std::filesystem::directory_iterator()),
+	          1)
+	    << "no temporary is left beside it";
+	if (!rootFlag)
+	{
+		std::filesystem::permissions(scratch.Path() / "locked", std::filesystem::perms(0755));
+	}
+}
+
+TEST(AmbientVolumeFileTest, TheNextWriteRemovesTemporariesThatKilledWritersLeft)
+{
+	TestSupport::ScratchDir scratch;
+	// The process id of a writer that is gone, as a bake killed part-way leaves it.
+	const pid_t child = ::fork();
+	if (child == 0)
+	{
+		::_exit(0);
+	}
+	ASSERT_GT(child, 0);
+	::waitpid(child, nullptr, 0);
+	const std::string dead = std::to_string(child);
+	const std::string alive = std::to_string(::getpid());
+	const struct
+	{
+		std::string myName;
+		bool myRemovedFlag;
+	} cases[] = {
+	    {".ambient.sh." + dead + ".Ab12cD.tmp", true},
+	    {".ambient.sh.Ab12cD.tmp", true},                // named before writers put their process id in it
+	    {".ambient.sh." + alive + ".Ab12cD.tmp", false}, // a write of this process in progress
+	    {".lights.xml." + dead + ".Ab12cD.tmp", false},  // another file's
+	    {".ambient.sh.notes.tmp", false},                // not a temporary's name
+	    {"ambient.sh." + dead + ".Ab12cD.tmp", false},
+	};
+	for (const auto& test : cases)
+	{
+		TestSupport::WriteWholeFile(scratch.File(test.myName), "half");
+	}
+	std::string problem;
+	ASSERT_TRUE(Zeph::WriteAmbientVolume(scratch.File("ambient.sh"), MakeVolume(), problem)) << problem;
+	for (const auto& test : cases)
+	{
+		EXPECT_EQ(std::filesystem::exists(scratch.File(test.myName)), !test.myRemovedFlag) << test.myName;
+	}
 }
 
 TEST(AmbientVolumeFileTest, DamagedFilesAreRefusedWithTheirReason)
 {
 	TestSupport::ScratchDir scratch;
 	const std::string good = scratch.File("good.sh");
-	ASSERT_TRUE(Zeph::WriteAmbientVolume(good, MakeVolume()));
+	std::string written;
+	ASSERT_TRUE(Zeph::WriteAmbientVolume(good, MakeVolume(), written)) << written;
 	const std::string bytes = TestSupport::ReadWholeFile(good);
 	const auto withCounts = [&](int anX, int aY, int aZ) {
 		std::string damaged = bytes;
@@ -134,7 +233,7 @@ TEST(AmbientVolumeFileTest, DamagedFilesAreRefusedWithTheirReason)
 	          Zeph::AmbientVolumeRead::CANNOT_OPEN);
 }
 
-TEST_F(FrameTest, SetShLightsTheFrameKeepsItOverADamagedFileAndDropsItForAnUnbakedLevel)
+TEST_F(FrameTest, SetShLightsTheFrameAndADamagedOrMissingFileLeavesNoVolume)
 {
 	if (!Start())
 	{
@@ -148,27 +247,28 @@ TEST_F(FrameTest, SetShLightsTheFrameKeepsItOverADamagedFileAndDropsItForAnUnbak
 	const float dark = Luminance(myLit, floor);
 
 	const std::string baked = scratch.File("baked/ambient.sh");
-	ASSERT_TRUE(Zeph::WriteAmbientVolume(baked, UniformVolume(0.5f)));
-	Renderer().SetSH(baked);
-	EXPECT_TRUE(Renderer().IsSHLoaded());
-	Render("ambient-loaded");
-	const float lit = Luminance(myLit, floor);
-	EXPECT_GT(lit, 3.0f * dark) << "the volume lights the floor";
-
-	// A damaged file is reported and the volume stays.
+	std::string problem;
+	ASSERT_TRUE(Zeph::WriteAmbientVolume(baked, UniformVolume(0.5f), problem)) << problem;
 	const std::string damaged = scratch.File("damaged/ambient.sh");
 	std::filesystem::create_directories(scratch.Path() / "damaged");
 	std::ofstream(damaged, std::ios::binary) << TestSupport::ReadWholeFile(baked).substr(0, 50);
-	Renderer().SetSH(damaged);
-	const std::string log = TakeLog();
-	EXPECT_NE(log.find("Damaged ambient light, not loaded: " + damaged), std::string::npos) << log;
-	EXPECT_TRUE(Renderer().IsSHLoaded());
-	Render("ambient-kept");
-	EXPECT_NEAR(Luminance(myLit, floor), lit, 1e-4f);
+	// Each time from a lit frame: the previous level's light must not stay.
+	for (const std::string& next : {damaged, scratch.File("unbaked/ambient.sh")})
+	{
+		SCOPED_TRACE(next);
+		Renderer().SetSH(baked);
+		EXPECT_TRUE(Renderer().IsSHLoaded());
+		Render("ambient-loaded");
+		EXPECT_GT(Luminance(myLit, floor), 3.0f * dark) << "the volume lights the floor";
+		TakeLog();
 
-	// A level without the file has no ambient light.
-	Renderer().SetSH(scratch.File("unbaked/ambient.sh"));
-	EXPECT_FALSE(Renderer().IsSHLoaded());
-	Render("ambient-dropped");
-	EXPECT_NEAR(Luminance(myLit, floor), dark, 1e-4f);
+		Renderer().SetSH(next);
+		const std::string log = TakeLog();
+		EXPECT_EQ(log.find("Damaged ambient light, not loaded: " + damaged) != std::string::npos,
+		          next == damaged)
+		    << log;
+		EXPECT_FALSE(Renderer().IsSHLoaded());
+		Render("ambient-dropped");
+		EXPECT_NEAR(Luminance(myLit, floor), dark, 1e-4f);
+	}
 }

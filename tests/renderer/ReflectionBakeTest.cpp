@@ -1,7 +1,10 @@
 // The reflection bake on a headless engine: the files it writes (read back through the DDS
 // reader), where light lands on the cube's faces, the filtered mips measured against the
 // cosine-power lobes integrated on the CPU from mip 0, the progress after each room, and the
-// cube container loading a baked file. The bake writes "data/Cubemaps/<level>/", so each test
+// cube container loading a baked file, and saves that fail (the bake goes on, the old file
+// stays whole; only the platform layer's error entry tells). The log has the editor's own
+// fatal levels, so nothing here may be a severe or critical report. The bake writes
+// "data/Cubemaps/<level>/", so each test
 // runs in a scratch directory whose data/ links the repository's folders, except Cubemaps,
 // which holds copies of the two cube maps the renderer reads. Pictures of the baked cubes go
 // to /tmp/lumora-bake-tests/.
@@ -24,6 +27,7 @@
 #include "renderer/BakeProgress.h"
 #include "renderer/CubemapContainer.h"
 #include "renderer/DynamicCubemap.h"
+#include "support/FileSizeLimit.h"
 
 using namespace FrameTesting;
 
@@ -184,10 +188,10 @@ struct Radiance
 	}
 };
 
-// Progress read by the report hook each time a cube file cannot be saved (which happens in
-// the bake after the rooms before it are done and before its own progress is stored).
+// Progress read by the platform layer's error hook each time a cube file cannot be saved
+// (which happens in the bake after the rooms before it are done and before its own
+// progress is stored); the entry still goes to the log.
 std::vector<int> ourProgressAtFailedSaves;
-std::vector<std::string> ourFailedSaveMessages;
 CoreReport::Handler ourLogHandler = nullptr;
 
 void RecordFailedSave(int aLine, const char* aFunctionName, const char* aMessage)
@@ -195,8 +199,6 @@ void RecordFailedSave(int aLine, const char* aFunctionName, const char* aMessage
 	if (std::string(aFunctionName) == "Gpu::SaveTextureToDds")
 	{
 		ourProgressAtFailedSaves.push_back(Zeph::Engine::GetInstance()->GetRenderer().GetBakingProgress());
-		ourFailedSaveMessages.push_back(aMessage);
-		return;
 	}
 	if (ourLogHandler != nullptr)
 	{
@@ -207,6 +209,8 @@ void RecordFailedSave(int aLine, const char* aFunctionName, const char* aMessage
 class ReflectionBakeTest : public FrameTest
 {
 protected:
+	ReflectionBakeTest() { myFatalLevels = 12; }
+
 	void SetUp() override
 	{
 		FrameTest::SetUp();
@@ -369,7 +373,7 @@ TEST_F(ReflectionBakeTest, NoRoomsWritesNothingAndResetsTheProgress)
 	EXPECT_EQ(Renderer().GetRTC().GetPointLights().Count(), 0) << "the bake empties the collector";
 }
 
-TEST_F(ReflectionBakeTest, ProgressIsStoredAfterEachRoomAndEveryRoomGetsItsFile)
+TEST_F(ReflectionBakeTest, ProgressIsStoredAfterEachRoomAndFailedSavesAreNotTheBakesToReport)
 {
 	if (!Start())
 	{
@@ -380,25 +384,53 @@ TEST_F(ReflectionBakeTest, ProgressIsStoredAfterEachRoomAndEveryRoomGetsItsFile)
 	AddRoom("middle", {0.0f, 0.0f, 0.0f});
 	AddRoom("east", {4.0f, 0.0f, 0.0f});
 
-	// Folders where the files of the second and third rooms should go: their saves fail, each
-	// failure is reported, and the report shows the progress the rooms before it left.
+	// Folders where the files of the second and third rooms should go: their saves fail,
+	// the bake goes on, and the hook shows the progress the rooms before each left.
 	fs::create_directories(CubePath("three", "middle"));
 	fs::create_directories(CubePath("three", "east"));
 	ourProgressAtFailedSaves.clear();
-	ourFailedSaveMessages.clear();
-	ourLogHandler = CoreReport::GetCriticalHandler();
-	CoreReport::SetCriticalHandler(&RecordFailedSave);
+	ourLogHandler = CoreReport::GetErrorHandler();
+	CoreReport::SetErrorHandler(&RecordFailedSave);
 	Bake("three");
-	CoreReport::SetCriticalHandler(ourLogHandler);
+	CoreReport::SetErrorHandler(ourLogHandler);
 	EXPECT_EQ(ourProgressAtFailedSaves, (std::vector<int>{33, 66}));
 	EXPECT_EQ(Renderer().GetBakingProgress(), 100);
-	ASSERT_EQ(ourFailedSaveMessages.size(), 2u);
-	EXPECT_NE(ourFailedSaveMessages[0].find(CubePath("three", "middle")), std::string::npos)
-	    << ourFailedSaveMessages[0];
-	EXPECT_NE(ourFailedSaveMessages[1].find(CubePath("three", "east")), std::string::npos)
-	    << ourFailedSaveMessages[1];
+	// The platform layer's own entries name the files; the bake adds nothing of its own.
+	const std::string log = TakeLog();
+	for (const char* room : {"middle", "east"})
+	{
+		EXPECT_NE(log.find(CubePath("three", room)), std::string::npos) << room << "\n" << log;
+	}
+	EXPECT_EQ(log.find("Zeph::Renderer"), std::string::npos) << log;
+	EXPECT_EQ(log.find("SEVERE"), std::string::npos) << log;
 	CubeFile west;
 	EXPECT_TRUE(Load(CubePath("three", "west"), west));
+}
+
+TEST_F(ReflectionBakeTest, ACubemapTheDiskWillNotTakeLeavesTheOldOneWhole)
+{
+	if (!Start())
+	{
+		return;
+	}
+	LightTheSmallRoom();
+	Bake("kept");
+	const std::string path = CubePath("kept", "small");
+	const std::string before = TestSupport::ReadWholeFile(path);
+	ASSERT_GT(before.size(), 4000000u);
+	TakeLog();
+
+	myPointLights.clear();
+	{
+		// Room for the log, not for a 4 MB cube.
+		TestSupport::FileSizeLimit full(fs::file_size(myLogPath) + 65536);
+		Bake("kept");
+	}
+	EXPECT_EQ(Renderer().GetBakingProgress(), 100);
+	EXPECT_NE(TakeLog().find(path), std::string::npos) << "the save's error entry names the file";
+	EXPECT_TRUE(TestSupport::ReadWholeFile(path) == before) << "the old cubemap was replaced";
+	EXPECT_EQ(std::distance(fs::directory_iterator("data/Cubemaps/kept"), fs::directory_iterator()), 1)
+	    << "no temporary is left beside it";
 }
 
 TEST_F(ReflectionBakeTest, LightLandsOnTheFacesItShouldAndTheMipsFollowTheLobes)

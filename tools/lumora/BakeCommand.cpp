@@ -35,12 +35,21 @@ bool BakeAmbient(EditorSession& aSession, const BakeOptions& someOptions)
 	Lumora::LumoraWrapper& editor = aSession.Editor();
 	const std::string path = "data/XML/levels/" + someOptions.myLevel + "/ambient.sh";
 	const auto start = std::chrono::steady_clock::now();
+	const size_t problemsBefore = aSession.GetProblemCount();
 	{
 		ProgressBar bar("ambient", [&editor] { return editor.GetBakeProgress(); });
 		editor.BakeAmbient(Lumora::ToWide(someOptions.myLevel), someOptions.myBounces,
 		                   someOptions.myDebugCapturesFlag);
 	}
 	const double seconds = SecondsSince(start);
+	// A volume too large to bake, or a file the disk would not take: the old file (if
+	// any) is still there and readable, so its reading below would look like success.
+	if (aSession.GetProblemCount() > problemsBefore)
+	{
+		PrintError("the ambient bake did not write " + path + ": " +
+		           Describe(aSession.GetProblems()[problemsBefore]));
+		return false;
+	}
 	const long long probes = Zeph::Engine::GetInstance()->GetRenderer().GetBakedProbeCount();
 	if (someOptions.myBounces == 0)
 	{

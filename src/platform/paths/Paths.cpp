@@ -1,11 +1,14 @@
 #include "platform/paths/Paths.h"
 
+#include <algorithm>
 #include <atomic>
+#include <cctype>
 #include <cerrno>
 #include <chrono>
 #include <cstdio>
 #include <dirent.h>
 #include <fcntl.h>
+#include <signal.h>
 #include <strings.h>
 #include <sys/stat.h>
 #include <unistd.h>
@@ -76,6 +79,75 @@ std::string FileNameOf(const std::string& aPath)
 {
 	const std::string::size_type slash = aPath.rfind('/');
 	return slash == std::string::npos ? aPath : aPath.substr(slash + 1);
+}
+
+bool IsAlphanumeric(const std::string& aText)
+{
+	return !aText.empty() && std::all_of(aText.begin(), aText.end(), [](char aCharacter) {
+		return std::isalnum(static_cast<unsigned char>(aCharacter)) != 0;
+	});
+}
+
+bool IsDecimal(const std::string& aText)
+{
+	return !aText.empty() && aText.size() < 10 &&
+	       std::all_of(aText.begin(), aText.end(),
+	                   [](char aCharacter) { return aCharacter >= '0' && aCharacter <= '9'; });
+}
+
+// Whether the middle of a temporary's name (between "." + name + "." and ".tmp") was
+// left by a writer that is gone: "<pid>.<6 characters>" whose process no longer runs,
+// or the "<6 characters>" of writers from before the pid was part of the name.
+bool IsLeftBehind(const std::string& aMiddle)
+{
+	const std::string::size_type dot = aMiddle.find('.');
+	if (dot == std::string::npos)
+	{
+		return aMiddle.size() == 6 && IsAlphanumeric(aMiddle);
+	}
+	const std::string pid = aMiddle.substr(0, dot);
+	const std::string unique = aMiddle.substr(dot + 1);
+	if (!IsDecimal(pid) || unique.size() != 6 || !IsAlphanumeric(unique))
+	{
+		return false;
+	}
+	const pid_t process = static_cast<pid_t>(std::stol(pid));
+	return process != ::getpid() && ::kill(process, 0) != 0 && errno == ESRCH;
+}
+
+// A save or bake that was killed leaves its temporary beside the file; the next write
+// of the same file removes those whose writer is gone. Temporaries of running writers
+// (this process included) and every other file stay.
+void RemoveLeftBehindTemporaries(const std::string& aDirectory, const std::string& aName)
+{
+	DIR* directory = ::opendir(aDirectory.c_str());
+	if (directory == nullptr)
+	{
+		return;
+	}
+	const std::string prefix = "." + aName + ".";
+	const std::string suffix = ".tmp";
+	std::vector<std::string> leftBehind;
+	while (const dirent* entry = ::readdir(directory))
+	{
+		const std::string entryName = entry->d_name;
+		if (entryName.size() > prefix.size() + suffix.size() && entryName.starts_with(prefix) &&
+		    entryName.ends_with(suffix) &&
+		    IsLeftBehind(entryName.substr(prefix.size(), entryName.size() - prefix.size() - suffix.size())))
+		{
+			leftBehind.push_back(entryName);
+		}
+	}
+	::closedir(directory);
+	for (const std::string& entryName : leftBehind)
+	{
+		const std::string path = (aDirectory == "/" ? "" : aDirectory) + "/" + entryName;
+		struct stat info;
+		if (::lstat(path.c_str(), &info) == 0 && S_ISREG(info.st_mode))
+		{
+			::unlink(path.c_str());
+		}
+	}
 }
 
 // mkdir -p for the directory part of an already resolved path.
@@ -162,6 +234,8 @@ std::string TemporaryFor(const std::string& aFinalPath)
 	static const char ourAlphabet[] = "abcdefghijklmnopqrstuvwxyzABCDEFGHIJKLMNOPQRSTUVWXYZ0123456789";
 	const std::string directory = DirectoryOf(aFinalPath);
 	const std::string name = FileNameOf(aFinalPath);
+	RemoveLeftBehindTemporaries(directory, name);
+	const std::string pid = std::to_string(::getpid());
 	for (int attempt = 0; attempt < 100; ++attempt)
 	{
 		unsigned long long seed =
@@ -174,7 +248,7 @@ std::string TemporaryFor(const std::string& aFinalPath)
 			seed /= sizeof(ourAlphabet) - 1;
 		}
 		const std::string candidate =
-		    (directory == "/" ? "" : directory) + "/." + name + "." + unique + ".tmp";
+		    (directory == "/" ? "" : directory) + "/." + name + "." + pid + "." + unique + ".tmp";
 		const int descriptor = ::open(candidate.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0666);
 		if (descriptor >= 0)
 		{

@@ -28,10 +28,13 @@ std::string Resolve(const std::string& aPath);
 // path to write to; an empty string when a directory could not be created.
 std::string PrepareForWrite(const std::string& aPath);
 
-// A unique name for a temporary file in the same directory as aFinalPath.
+// A unique name for a temporary file in the same directory as aFinalPath, created
+// empty: "." + file name + "." + process id + "." + 6 characters + ".tmp". Temporaries
+// of the same file left by a writer that was killed (whose process is gone) are
+// removed first.
 std::string TemporaryFor(const std::string& aFinalPath);
 
 // Flushes aTemporary to disk and renames it over aFinalPath. On failure the
 // temporary is removed, aFinalPath is left as it was and false is returned.
 bool ReplaceWith(const std::string& aTemporary, const std::string& aFinalPath);
-}
+} // namespace Paths
