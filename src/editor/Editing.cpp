@@ -51,14 +51,21 @@ void SetColor(Vector4<float>& aColor, float anR, float aG, float aB)
 
 // --- helpers ---------------------------------------------------------------------------
 
-bool LumoraWrapper::ClaimForSelection(const int& aSelection)
+bool LumoraWrapper::ClaimForSelection(const std::atomic<int>& aSelection)
 {
 	WaitUntilFree();
-	if (aSelection == -1)
+	// Read now, not when called: whoever held the facade may have changed the selection.
+	if (aSelection.load() == -1)
 	{
 		return false;
 	}
 	Claim();
+	// Another claimant may have come first and cleared it (a level loaded meanwhile).
+	if (aSelection.load() == -1)
+	{
+		Release();
+		return false;
+	}
 	return true;
 }
 

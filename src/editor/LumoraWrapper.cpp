@@ -78,16 +78,20 @@ void LumoraWrapper::SetFatalReportLevels(std::bitset<4> someLevels)
 
 void LumoraWrapper::ShutDown()
 {
-	// Without a successful Create there is no scene to take down: nothing happens.
-	if (ourInstance == nullptr || !ourInstance->mySceneFlag)
+	if (ourInstance == nullptr)
 	{
 		return;
 	}
+	// After a failed Create there is no scene, but the log, the instance and perhaps a
+	// half-made engine are there: they go too, so that a later Create can succeed.
 	if (Zeph::Engine* engine = EngineOrNull())
 	{
 		engine->MakeContextCurrent();
 	}
-	ourInstance->DestroyScene();
+	if (ourInstance->mySceneFlag)
+	{
+		ourInstance->DestroyScene();
+	}
 	Debug::Destroy();
 	Zeph::Engine::ShutDown();
 	// The instance goes with the scene, so a stale GetInstance cannot reach freed members.
@@ -304,9 +308,12 @@ void LumoraWrapper::Update(float someElapsedTime)
 void LumoraWrapper::UpdateScene(float someElapsedTime)
 {
 	(void)someElapsedTime;
-	if (myMode == DECAL_MODE && myCurrentSelectedDecal != -1 && myDecalBox)
+	// Picking writes the selection from the user-interface thread while frames run, and
+	// resets it to -1 before it looks for a hit: one read, tested and used.
+	const int selectedDecal = myCurrentSelectedDecal.load();
+	if (myMode == DECAL_MODE && selectedDecal >= 0 && selectedDecal < myDecals.Count() && myDecalBox)
 	{
-		const Zeph::DecalData& decal = myDecals[myCurrentSelectedDecal];
+		const Zeph::DecalData& decal = myDecals[selectedDecal];
 		myDecalBox->SetScale(decal.mySize, decal.mySize, decal.myDepth);
 		Matrix44<float> rotation;
 		rotation.SetRotation(decal.myNorm);
@@ -362,7 +369,12 @@ void LumoraWrapper::RenderScene()
 		myEntities[index]->Render();
 	}
 
-	const bool gizmosFlag = myRenderMeshesFlag && myMode == LIGHT_MODE;
+	const bool gizmosFlag = myRenderMeshesFlag.load() && myMode == LIGHT_MODE;
+	// One read of each selection per frame (picking may change them meanwhile), so the
+	// frame marks one light at most and draws the box only for a decal it has.
+	const int selectedPoint = myCurrentSelectedPoint.load();
+	const int selectedSpot = myCurrentSelectedSpot.load();
+	const int selectedDecal = myCurrentSelectedDecal.load();
 	int gizmo = 0;
 	// The marker of a light: the marked gizmo for the selected one, else the light's
 	// pool gizmo (a pool shorter than the lights leaves the rest unmarked).
@@ -388,7 +400,7 @@ void LumoraWrapper::RenderScene()
 		const Zeph::PointLightData& light = myEnvironmentPointLights[index];
 		if (gizmosFlag)
 		{
-			mark(index == myCurrentSelectedPoint, light.myPosition);
+			mark(index == selectedPoint, light.myPosition);
 		}
 		collector.AddPointLight(light);
 	}
@@ -397,12 +409,12 @@ void LumoraWrapper::RenderScene()
 		const Zeph::SpotLightData& light = myEnvironmentSpotLights[index];
 		if (gizmosFlag)
 		{
-			mark(index == myCurrentSelectedSpot, light.myOrientation.GetPosition());
+			mark(index == selectedSpot, light.myOrientation.GetPosition());
 		}
 		collector.AddSpotLight(light);
 	}
 
-	if (myRenderRoomsFlag)
+	if (myRenderRoomsFlag.load())
 	{
 		for (int index = 0; index < myRooms.Count(); ++index)
 		{
@@ -430,7 +442,7 @@ void LumoraWrapper::RenderScene()
 			myEdges[index].Render();
 		}
 	}
-	else if (myMode == DECAL_MODE && myDecalBox && myCurrentSelectedDecal != -1)
+	else if (myMode == DECAL_MODE && myDecalBox && selectedDecal != -1)
 	{
 		renderer.RenderLateInstance(myDecalBox.get());
 	}

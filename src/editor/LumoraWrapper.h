@@ -207,7 +207,7 @@ private:
 	// Private helpers of picking and editing (Picking.cpp, Editing.cpp).
 	// Waits until the facade is free and takes it when aSelection (read after the
 	// wait) names an object; false, with the flag untouched, when it is -1.
-	bool ClaimForSelection(const int& aSelection);
+	bool ClaimForSelection(const std::atomic<int>& aSelection);
 	// Whether the current mode's moving or turning has a selected object to act on;
 	// aNodesFlag: path nodes count in NODE_MODE.
 	bool HasSelectionForMode(bool aNodesFlag) const;
@@ -245,8 +245,10 @@ private:
 	// Claimants waiting for the busy flag. While any waits, frame steps are dropped, so a
 	// render loop that runs without pause cannot starve the user-interface thread.
 	mutable std::atomic<int> myWaitingClaims{0};
-	bool myRenderRoomsFlag = false;
-	bool myRenderMeshesFlag = true;
+	// The display switches: set from the user-interface thread without the busy flag,
+	// read by the frame.
+	std::atomic<bool> myRenderRoomsFlag{false};
+	std::atomic<bool> myRenderMeshesFlag{true};
 	float myNodeHalfDimensions = 0.25f;
 	std::unique_ptr<Zeph::Camera> myCamera;
 	std::unique_ptr<Zeph::CameraInstance> myCameraInstance;

@@ -2,6 +2,8 @@
 // LightMeshRenderTargetHelper: a debug view of the queued lights: when its render
 // flag is set, Begin draws every point and spot light's volume as a wireframe mesh
 // in the light's colour ("RenderMesh" of the light effects) into the bound target.
+#include <atomic>
+
 #include "renderer/RenderTargetHelper.h"
 
 namespace Zeph
@@ -21,6 +23,7 @@ public:
 
 private:
 	DeferredRenderTargetHelper* myGBuffer = nullptr;
-	bool myRenderFlag = false;
+	// Switched from the editor's user-interface thread while frames run on another.
+	std::atomic<bool> myRenderFlag{false};
 };
 } // namespace Zeph

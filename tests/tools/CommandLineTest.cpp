@@ -15,6 +15,7 @@
 #include "model/AlFile.h"
 #include "model/ModelNode.h"
 #include "model/ModelTreeCheck.h"
+#include "support/FileSizeLimit.h"
 #include "support/Golden.h"
 #include "support/TestSupport.h"
 
@@ -271,4 +272,32 @@ TEST_F(CommandLineTest, CheckListsHostileLevelsAndBakeRefusesThemUnlessForced)
 	const ToolRun empty = RunTool(myScratch.Path(), "check sample_small");
 	EXPECT_NE(empty.myOutput.find("data/XML/EntityTypes.xml: no entity type with a model"), std::string::npos)
 	    << empty.myOutput;
+}
+
+TEST_F(CommandLineTest, ABakeTheDiskWillNotTakeExitsOneNamingTheFileAndKeepsTheOldOne)
+{
+	CopyData();
+	const std::string bake = "bake sample_small --bounces 1 --ambient-only";
+	const ToolRun first = RunTool(myScratch.Path(), bake);
+	if (first.myErrors.find("no OpenGL 4.5") != std::string::npos && std::getenv("CI") == nullptr)
+	{
+		GTEST_SKIP() << first.myErrors;
+	}
+	ASSERT_EQ(first.myStatus, 0) << first.myOutput << first.myErrors;
+	const std::string path = "data/XML/levels/sample_small/ambient.sh";
+	const std::string before = TestSupport::ReadWholeFile((myScratch.Path() / path).string());
+	ASSERT_EQ(before.size(), 708u);
+	TestSupport::WriteWholeFile((myScratch.Path() / "data/XML/levels/sample_small/lights.xml").string(),
+	                            "<root><point-lights/><spot-lights/></root>\n");
+	ToolRun full;
+	{
+		// The disk takes the tool's messages, not the 708 bytes of the new volume.
+		TestSupport::FileSizeLimit limit(640);
+		full = RunTool(myScratch.Path(), bake);
+	}
+	EXPECT_EQ(full.myStatus, 1) << full.myOutput << full.myErrors;
+	EXPECT_NE(full.myErrors.find("the ambient bake did not write " + path), std::string::npos)
+	    << full.myErrors;
+	EXPECT_TRUE(TestSupport::ReadWholeFile((myScratch.Path() / path).string()) == before)
+	    << "the old volume was replaced";
 }
