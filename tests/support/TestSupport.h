@@ -1,8 +1,11 @@
 #pragma once
 // Helpers shared by the test suites: scratch directories and whole-file reads.
 
+#include <cmath>
+#include <cstdint>
 #include <filesystem>
 #include <string>
+#include <vector>
 
 namespace TestSupport
 {
@@ -29,4 +32,22 @@ std::string ReadWholeFile(const std::string& aPath);
 
 // Writes the bytes to a file, replacing it.
 void WriteWholeFile(const std::string& aPath, const std::string& someBytes);
+
+// The sRGB byte that stores a linear value, as an sRGB render target or texture holds it.
+inline uint8_t SrgbEncoded(float aLinear)
+{
+	const float encoded =
+	    aLinear <= 0.0031308f ? aLinear * 12.92f : 1.055f * std::pow(aLinear, 1.0f / 2.4f) - 0.055f;
+	return static_cast<uint8_t>(std::lround(encoded * 255.0f));
+}
+
+// RGBA bytes with every alpha at 255: a frame saved to be looked at, whose alpha means nothing.
+inline std::vector<uint8_t> Opaque(std::vector<uint8_t> someRgba)
+{
+	for (size_t alpha = 3; alpha < someRgba.size(); alpha += 4)
+	{
+		someRgba[alpha] = 255;
+	}
+	return someRgba;
+}
 }

@@ -19,15 +19,11 @@
 #include "platform/gpu/Readback.h"
 #include "platform/gpu/Texture.h"
 #include "support/GlSupport.h"
+#include "support/TestSupport.h"
 
 using Pixel = std::array<uint8_t, 4>;
 
-inline uint8_t SrgbEncoded(float aLinear)
-{
-	const float encoded =
-	    aLinear <= 0.0031308f ? aLinear * 12.92f : 1.055f * std::pow(aLinear, 1.0f / 2.4f) - 0.055f;
-	return static_cast<uint8_t>(std::lround(encoded * 255.0f));
-}
+using TestSupport::SrgbEncoded;
 
 inline float SrgbToLinear(float anEncoded)
 {
@@ -77,10 +73,12 @@ protected:
 	void SetUp() override
 	{
 		ourReports.clear();
+		// The layer reports its failures at the error level; a broken invariant of the core
+		// below it would come at the critical level. Both are collected.
 		myPreviousHandler = CoreReport::GetCriticalHandler();
-		CoreReport::SetCriticalHandler([](int, const char* aFunctionName, const char* aMessage) {
-			ourReports.push_back(std::string(aFunctionName) + ": " + aMessage);
-		});
+		myPreviousErrorHandler = CoreReport::GetErrorHandler();
+		CoreReport::SetCriticalHandler(&Record);
+		CoreReport::SetErrorHandler(&Record);
 		if (!myDevice.Init(64, 64))
 		{
 			const std::string why =
@@ -103,7 +101,13 @@ protected:
 		myTextures.clear();
 		myDevice.Destroy();
 		CoreReport::SetCriticalHandler(myPreviousHandler);
+		CoreReport::SetErrorHandler(myPreviousErrorHandler);
 		EXPECT_TRUE(ourReports.empty()) << "Unexpected reports: " << Joined();
+	}
+
+	static void Record(int, const char* aFunctionName, const char* aMessage)
+	{
+		ourReports.push_back(std::string(aFunctionName) + ": " + aMessage);
 	}
 
 	// The reports made since the last call, as "function: message".
@@ -211,5 +215,6 @@ protected:
 	std::vector<std::unique_ptr<Gpu::Texture>> myTextures;
 	std::deque<Gpu::Buffer> myBuffers; // a deque: buffers cannot move
 	CoreReport::Handler myPreviousHandler = nullptr;
+	CoreReport::Handler myPreviousErrorHandler = nullptr;
 	static inline std::vector<std::string> ourReports;
 };

@@ -1,32 +1,15 @@
 #include <cstdlib>
 #include <filesystem>
-#include <png.h>
+#include <iterator>
+#include <utility>
 
 #include "GpuTest.h"
+#include "support/Golden.h"
 #include "support/TestSupport.h"
 
 namespace
 {
 using ReadbackTest = GpuTest;
-
-std::vector<uint8_t> ReadPng(const std::string& aPath, int& aWidth, int& aHeight)
-{
-	png_image image{};
-	image.version = PNG_IMAGE_VERSION;
-	if (!png_image_begin_read_from_file(&image, aPath.c_str()))
-	{
-		return {};
-	}
-	image.format = PNG_FORMAT_RGBA;
-	std::vector<uint8_t> pixels(PNG_IMAGE_SIZE(image));
-	if (!png_image_finish_read(&image, nullptr, pixels.data(), 0, nullptr))
-	{
-		return {};
-	}
-	aWidth = static_cast<int>(image.width);
-	aHeight = static_cast<int>(image.height);
-	return pixels;
-}
 
 // A picture worth looking at: four quadrants cleared through per-quadrant copies,
 // so orientation mistakes show (red must be top left).
@@ -56,17 +39,12 @@ TEST_F(ReadbackTest, RenderedTargetSurvivesAPngRoundTrip)
 	}
 	int width = 0;
 	int height = 0;
-	const std::vector<uint8_t> decoded = ReadPng(path, width, height);
-	EXPECT_EQ(width, 64);
-	EXPECT_EQ(height, 32);
+	std::vector<uint8_t> decoded;
+	ASSERT_TRUE(TestSupport::ReadPng(path, width, height, decoded));
+	EXPECT_EQ(std::pair(width, height), std::pair(64, 32));
 	EXPECT_EQ(decoded, pixels);
-	size_t files = 0;
-	for (const auto& entry : std::filesystem::directory_iterator(scratch.Path() / "shots"))
-	{
-		EXPECT_EQ(entry.path().filename(), "quadrants.png");
-		++files;
-	}
-	EXPECT_EQ(files, 1u);
+	const std::filesystem::directory_iterator files(scratch.Path() / "shots");
+	EXPECT_EQ(std::distance(begin(files), end(files)), 1) << "no temporary is left beside the picture";
 
 	EXPECT_FALSE(Gpu::SavePng("/proc/lumora/none.png", 64, 32, pixels.data()));
 	EXPECT_FALSE(Gpu::SavePng(path, 0, 32, pixels.data()));

@@ -9,6 +9,7 @@
 
 #include "GpuTest.h"
 #include "platform/gpu/SwapChain.h"
+#include "support/TestSupport.h"
 
 #include "TestProgram.h"
 #include "XServer.h"
@@ -231,26 +232,12 @@ void main() { gl_Position = vec4(corners[gl_VertexID], 0.5, 1.0); })",
 		std::vector<uint8_t> pixels;
 		for (int attempt = 0; attempt < 100; ++attempt)
 		{
-			XImage* image = XGetImage(myDisplay, myWindow, 0, 0, static_cast<unsigned>(aWidth),
-			                          static_cast<unsigned>(aHeight), AllPlanes, ZPixmap);
-			if (image == nullptr)
+			pixels = ReadWindowPixels(myDisplay, myWindow, aWidth, aHeight);
+			if (pixels.empty())
 			{
 				ADD_FAILURE() << "XGetImage failed";
 				return {};
 			}
-			pixels.clear();
-			for (int y = 0; y < aHeight; ++y)
-			{
-				for (int x = 0; x < aWidth; ++x)
-				{
-					const unsigned long value = XGetPixel(image, x, y);
-					pixels.push_back(static_cast<uint8_t>((value & image->red_mask) >> 16));
-					pixels.push_back(static_cast<uint8_t>((value & image->green_mask) >> 8));
-					pixels.push_back(static_cast<uint8_t>(value & image->blue_mask));
-					pixels.push_back(255);
-				}
-			}
-			XDestroyImage(image);
 			if (aShownFlag(pixels))
 			{
 				break;
@@ -262,15 +249,7 @@ void main() { gl_Position = vec4(corners[gl_VertexID], 0.5, 1.0); })",
 
 	// The back buffer's bytes as the window should show them (no alpha channel), and the
 	// window once it shows them.
-	std::vector<uint8_t> OpaqueBackBuffer() const
-	{
-		std::vector<uint8_t> opaque = myBackBuffer;
-		for (size_t at = 3; at < opaque.size(); at += 4)
-		{
-			opaque[at] = 255;
-		}
-		return opaque;
-	}
+	std::vector<uint8_t> OpaqueBackBuffer() const { return TestSupport::Opaque(myBackBuffer); }
 
 	std::vector<uint8_t> ReadWindowShowingBackBuffer(int aWidth, int aHeight)
 	{

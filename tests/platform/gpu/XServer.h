@@ -32,10 +32,35 @@
 #include <sys/wait.h>
 #include <thread>
 #include <unistd.h>
+#include <vector>
 
 #undef None
 
 extern char** environ;
+
+// A window's pixels as RGBA (alpha 255), row 0 at the top; empty when X cannot read them.
+inline std::vector<uint8_t> ReadWindowPixels(Display* aDisplay, Window aWindow, int aWidth, int aHeight)
+{
+	XImage* image = XGetImage(aDisplay, aWindow, 0, 0, static_cast<unsigned>(aWidth),
+	                          static_cast<unsigned>(aHeight), AllPlanes, ZPixmap);
+	if (image == nullptr)
+	{
+		return {};
+	}
+	std::vector<uint8_t> pixels;
+	for (int y = 0; y < aHeight; ++y)
+	{
+		for (int x = 0; x < aWidth; ++x)
+		{
+			const unsigned long value = XGetPixel(image, x, y);
+			pixels.insert(pixels.end(), {static_cast<uint8_t>((value & image->red_mask) >> 16),
+			                             static_cast<uint8_t>((value & image->green_mask) >> 8),
+			                             static_cast<uint8_t>(value & image->blue_mask), 255});
+		}
+	}
+	XDestroyImage(image);
+	return pixels;
+}
 
 class XServer
 {

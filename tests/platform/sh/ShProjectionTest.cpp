@@ -98,15 +98,20 @@ protected:
 	void SetUp() override
 	{
 		ourReports.clear();
+		// Refused arguments are reported at the error level; both levels are collected.
 		myPreviousHandler = CoreReport::GetCriticalHandler();
-		CoreReport::SetCriticalHandler([](int, const char* aFunctionName, const char* aMessage) {
+		myPreviousErrorHandler = CoreReport::GetErrorHandler();
+		const CoreReport::Handler record = [](int, const char* aFunctionName, const char* aMessage) {
 			ourReports.push_back(std::string(aFunctionName) + ": " + aMessage);
-		});
+		};
+		CoreReport::SetCriticalHandler(record);
+		CoreReport::SetErrorHandler(record);
 	}
 
 	void TearDown() override
 	{
 		CoreReport::SetCriticalHandler(myPreviousHandler);
+		CoreReport::SetErrorHandler(myPreviousErrorHandler);
 		EXPECT_TRUE(ourReports.empty()) << "Unexpected report: " << ourReports.front();
 	}
 
@@ -120,6 +125,7 @@ protected:
 	}
 
 	CoreReport::Handler myPreviousHandler = nullptr;
+	CoreReport::Handler myPreviousErrorHandler = nullptr;
 	static inline std::vector<std::string> ourReports;
 };
 
