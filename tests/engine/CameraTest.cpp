@@ -86,10 +86,7 @@ TEST(CameraTest, YawTurnsAboutUpAndPitchIsRefusedNearVertical)
 		const Matrix44<float> viewBefore = camera.GetView();
 		camera.Pitch(1.4f);
 		EXPECT_VEC3_NEAR(camera.GetForward(), 0.0f, 0.0f, 1.0f);
-		for (int i = 0; i < 16; ++i)
-		{
-			EXPECT_EQ(camera.GetView().myMatrix[i], viewBefore.myMatrix[i]);
-		}
+		EXPECT_TRUE(std::equal(viewBefore.myMatrix, viewBefore.myMatrix + 16, camera.GetView().myMatrix));
 		camera.Pitch(-1.4f);
 		EXPECT_VEC3_NEAR(camera.GetForward(), 0.0f, 0.0f, 1.0f);
 	}

@@ -58,10 +58,7 @@ technique RenderOther { pass P0 { VertexShader = VS; PixelShader = PS; } }
 
 TEST_F(EngineTest, EffectsAreSharedByNameTheLineEffectIsKeptApartAndFailedLoadsRetry)
 {
-	if (!CreateEngine(64, 64))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	Zeph::EffectContainer& container = Zeph::Engine::GetInstance()->GetEffectContainer();
 	// Whatever the engine loaded for itself at start-up is not counted.
 	const size_t baseline = container.GetCount();
@@ -91,10 +88,7 @@ TEST_F(EngineTest, EffectsAreSharedByNameTheLineEffectIsKeptApartAndFailedLoadsR
 
 TEST_F(EngineTest, TheSpriteEffectIsCompiledFromSourceAndNeverReadsACompiledFile)
 {
-	if (!CreateEngine(64, 64))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	WorkingDirectory directory(myScratch.Path() / "work");
 	// Damaged compiled files: the sprite effect must not care, another effect must fail.
 	TestSupport::WriteWholeFile("data/Shaders/Sprite/Sprite.fxal", "not a compiled effect");
@@ -117,10 +111,7 @@ TEST_F(EngineTest, TheSpriteEffectIsCompiledFromSourceAndNeverReadsACompiledFile
 
 TEST_F(EngineTest, ABrokenSpriteSourceReportsTheCompilerTextAndTheFile)
 {
-	if (!CreateEngine(64, 64))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	WorkingDirectory directory(myScratch.Path() / "work");
 	TestSupport::WriteWholeFile("data/Shaders/Sprite/Sprite.fx",
 	                            "vertex VS { void main() { gl_Position = undefinedThing; } }\n"
@@ -144,10 +135,7 @@ TEST_F(EngineTest, ABrokenSpriteSourceReportsTheCompilerTextAndTheFile)
 
 TEST_F(EngineTest, EffectsReportTheVariablesTheyMustHaveAndSettersReachTheirVariables)
 {
-	if (!CreateEngine(64, 64))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	WorkingDirectory directory(myScratch.Path() / "work");
 	WriteCompiledEffect("data/Shaders/Test/NoWorld.fx",
 	                    std::string("uniform mat4 View;\nuniform mat4 Projection;\n") + ourPlainPass);

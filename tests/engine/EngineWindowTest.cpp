@@ -11,18 +11,11 @@
 
 namespace
 {
-uint8_t SrgbByte(float aLinear)
-{
-	const float encoded =
-	    aLinear <= 0.0031308f ? aLinear * 12.92f : 1.055f * std::pow(aLinear, 1.0f / 2.4f) - 0.055f;
-	return static_cast<uint8_t>(std::lround(encoded * 255.0f));
-}
-
 bool Near(const uint8_t* aPixel, const float* aLinear)
 {
 	for (int channel = 0; channel < 3; ++channel)
 	{
-		if (std::abs(aPixel[channel] - SrgbByte(aLinear[channel])) > 1)
+		if (std::abs(aPixel[channel] - TestSupport::SrgbEncoded(aLinear[channel])) > 1)
 		{
 			return false;
 		}
@@ -56,25 +49,12 @@ TEST_F(EngineTest, AFrameOnAnX11WindowShowsTheQuadAtTheTop)
 		const float* quadColor = ourQuadColor;
 
 		// Another connection draws the window: wait until the frame has arrived.
-		std::vector<uint8_t> shown(static_cast<size_t>(width * height * 4));
+		std::vector<uint8_t> shown;
 		bool arrivedFlag = false;
 		for (int attempt = 0; attempt < 100 && !arrivedFlag; ++attempt)
 		{
-			XImage* image = XGetImage(display, window, 0, 0, width, height, AllPlanes, ZPixmap);
-			ASSERT_NE(image, nullptr);
-			for (int y = 0; y < height; ++y)
-			{
-				for (int x = 0; x < width; ++x)
-				{
-					const unsigned long value = XGetPixel(image, x, y);
-					uint8_t* pixel = &shown[static_cast<size_t>((y * width + x) * 4)];
-					pixel[0] = static_cast<uint8_t>((value & image->red_mask) >> 16);
-					pixel[1] = static_cast<uint8_t>((value & image->green_mask) >> 8);
-					pixel[2] = static_cast<uint8_t>(value & image->blue_mask);
-					pixel[3] = 255;
-				}
-			}
-			XDestroyImage(image);
+			shown = ReadWindowPixels(display, window, width, height);
+			ASSERT_FALSE(shown.empty());
 			arrivedFlag = Near(&shown[(54 * width + 160) * 4], quadColor);
 			if (!arrivedFlag)
 			{

@@ -11,10 +11,7 @@
 
 TEST_F(EngineTest, TwoThreadsTakingTurnsCreateTexturesAndDrawWithoutErrors)
 {
-	if (!CreateEngine(64, 64))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	Zeph::Engine* engine = Zeph::Engine::GetInstance();
 	engine->ReleaseContext();
 

@@ -18,6 +18,11 @@ void ExpectMatrix(const Matrix44<float>& aMatrix, const std::vector<float>& some
 	}
 }
 
+std::vector<float> Components(const Vector3<float>& aVector)
+{
+	return {aVector.x, aVector.y, aVector.z};
+}
+
 // Records what the instance tells it.
 class Follower : public Zeph::Instance::AttachedObject
 {
@@ -44,8 +49,7 @@ TEST(InstanceTest, ScaleReplacesTheMatrixAndPositionRestoresTheTranslation)
 	instance.SetScale(2.0f, 2.0f, 2.0f);
 	// The translation is gone while the position member still holds it.
 	ExpectMatrix(instance.GetOrientation(), {2, 0, 0, 0, 0, 2, 0, 0, 0, 0, 2, 0, 0, 0, 0, 1});
-	EXPECT_FLOAT_EQ(instance.GetPosition().x, 4.0f);
-	EXPECT_FLOAT_EQ(instance.GetPosition().z, 6.0f);
+	EXPECT_EQ(Components(instance.GetPosition()), (std::vector{4.0f, 5.0f, 6.0f}));
 
 	instance.SetPosition({1.0f, 2.0f, 3.0f});
 	ExpectMatrix(instance.GetOrientation(), {2, 0, 0, 0, 0, 2, 0, 0, 0, 0, 2, 0, 1, 2, 3, 1});
@@ -64,9 +68,7 @@ TEST(InstanceTest, OrientationKeepsTheMatrixBeforeTheLastChange)
 	instance.SetOrientation(second);
 	ExpectMatrix(instance.GetPreviousOrientation(), std::vector<float>(first.myMatrix, first.myMatrix + 16));
 	ExpectMatrix(instance.GetOrientation(), std::vector<float>(second.myMatrix, second.myMatrix + 16));
-	EXPECT_FLOAT_EQ(instance.GetPosition().x, -7.0f);
-	EXPECT_FLOAT_EQ(instance.GetPosition().y, 8.0f);
-	EXPECT_FLOAT_EQ(instance.GetPosition().z, 9.0f);
+	EXPECT_EQ(Components(instance.GetPosition()), (std::vector{-7.0f, 8.0f, 9.0f}));
 }
 
 TEST(InstanceTest, AttachedObjectsFollowPositionAndOrientationButNotScale)
@@ -131,20 +133,12 @@ TEST(InstanceTest, RoomDataReachesTheRootAndTheFirstChildChainOnly)
 	delete root;
 }
 
-TEST(RoomTest, BoundsAndDefaults)
+TEST(RoomTest, BoundsGiveTheCentreAndExtents)
 {
 	const Zeph::Room room({0.0f, 0.0f, 0.0f}, {2.0f, 4.0f, 6.0f});
-	EXPECT_FLOAT_EQ(room.GetCenterPosition().x, 1.0f);
-	EXPECT_FLOAT_EQ(room.GetCenterPosition().y, 2.0f);
-	EXPECT_FLOAT_EQ(room.GetCenterPosition().z, 3.0f);
-	EXPECT_FLOAT_EQ(room.myExtents.x, 1.0f);
-	EXPECT_FLOAT_EQ(room.myExtents.y, 2.0f);
-	EXPECT_FLOAT_EQ(room.myExtents.z, 3.0f);
-	EXPECT_FLOAT_EQ(room.GetMax().y, 4.0f);
-	EXPECT_EQ(room.GetID(), "NO_ID");
-	EXPECT_EQ(room.GetCubemapName(), "");
-	EXPECT_EQ(room.GetCubemapIndex(), -1);
-	EXPECT_EQ(room.GetDebugInstance(), nullptr);
+	EXPECT_EQ(Components(room.GetCenterPosition()), (std::vector{1.0f, 2.0f, 3.0f}));
+	EXPECT_EQ(Components(room.myExtents), (std::vector{1.0f, 2.0f, 3.0f}));
+	EXPECT_EQ(Components(room.GetMax()), (std::vector{2.0f, 4.0f, 6.0f}));
 }
 
 TEST(RoomTest, SphereInsideIsStrictOnEveryAxis)

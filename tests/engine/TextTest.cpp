@@ -52,10 +52,7 @@ protected:
 
 TEST_F(TextTest, ContainerSharesFontsByFamilyAndStoresNoFailedLoad)
 {
-	if (!CreateEngine(ourWidth, ourHeight))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(ourWidth, ourHeight));
 	Zeph::FontContainer& fonts = Zeph::Engine::GetInstance()->GetFontContainer();
 	Zeph::Font* arial = fonts.GetFont("Arial");
 	ASSERT_NE(arial, nullptr) << TakeLog();
@@ -84,10 +81,7 @@ TEST_F(TextTest, ContainerSharesFontsByFamilyAndStoresNoFailedLoad)
 
 TEST_F(TextTest, TextDrawsAtItsPositionRoundedUpWithTheDefaults)
 {
-	if (!CreateEngine(ourWidth, ourHeight))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(ourWidth, ourHeight));
 	Zeph::Font* arial = Zeph::Engine::GetInstance()->GetFontContainer().GetFont("Arial");
 	ASSERT_NE(arial, nullptr) << TakeLog();
 	const std::string utf8 = "Gr\xC3\xB6\xC3\x9F"
@@ -134,10 +128,7 @@ TEST_F(TextTest, TextDrawsAtItsPositionRoundedUpWithTheDefaults)
 
 TEST_F(TextTest, TextRenderedLaterIsQueuedWithTheRenderer)
 {
-	if (!CreateEngine(ourWidth, ourHeight))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(ourWidth, ourHeight));
 	Zeph::Engine* engine = Zeph::Engine::GetInstance();
 	Zeph::Font* arial = engine->GetFontContainer().GetFont("Arial");
 	ASSERT_NE(arial, nullptr) << TakeLog();

