@@ -21,6 +21,7 @@
 #include "renderer/FrameCapture.h"
 #include "renderer/Renderer.h"
 #include "support/Golden.h"
+#include "support/TestSupport.h"
 
 namespace FrameTesting
 {
@@ -96,12 +97,8 @@ protected:
 		int height = 0;
 		ASSERT_TRUE(Zeph::FrameCapture::RenderAndRead([this] { Queue(); }, aFrames, myPixels, width, height));
 		ASSERT_EQ(width, ourWidth);
-		std::vector<uint8_t> opaque = myPixels;
-		for (size_t alpha = 3; alpha < opaque.size(); alpha += 4)
-		{
-			opaque[alpha] = 255;
-		}
-		Gpu::SavePng("/tmp/lumora-frame-tests/" + aName + ".png", ourWidth, ourHeight, opaque.data());
+		Gpu::SavePng("/tmp/lumora-frame-tests/" + aName + ".png", ourWidth, ourHeight,
+		             TestSupport::Opaque(myPixels).data());
 		Zeph::Texture* lit = Renderer().GetLitImage();
 		ASSERT_NE(lit, nullptr);
 		myLit.clear();
@@ -111,12 +108,8 @@ protected:
 
 	void ExpectGolden(const std::string& aName)
 	{
-		std::vector<uint8_t> opaque = myPixels;
-		for (size_t alpha = 3; alpha < opaque.size(); alpha += 4)
-		{
-			opaque[alpha] = 255;
-		}
-		const std::string difference = TestSupport::CompareWithGolden(aName, ourWidth, ourHeight, opaque);
+		const std::string difference =
+		    TestSupport::CompareWithGolden(aName, ourWidth, ourHeight, TestSupport::Opaque(myPixels));
 		EXPECT_TRUE(difference.empty()) << difference;
 	}
 

@@ -52,10 +52,7 @@ protected:
 
 TEST_F(FrameGoldenTest, RoomLitByOnePointLight)
 {
-	if (!StartRoom())
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(StartRoom());
 	myPointLights.push_back(Point({0.2f, 1.6f, 0.3f}, 3.0f, {6.0f, 5.0f, 4.0f, 1.0f}));
 	Render("golden-point-light", ourSettleFrames);
 	ExpectGolden("frame-point-light");
@@ -63,10 +60,7 @@ TEST_F(FrameGoldenTest, RoomLitByOnePointLight)
 
 TEST_F(FrameGoldenTest, SpotLightConeOnTheFloor)
 {
-	if (!StartRoom())
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(StartRoom());
 	mySpotLights.push_back(SpotDown({0.3f, 2.9f, 0.3f}, 4.0f, 0.96f, 0.88f));
 	Render("golden-spot-light", ourSettleFrames);
 	ExpectGolden("frame-spot-light");
@@ -74,10 +68,7 @@ TEST_F(FrameGoldenTest, SpotLightConeOnTheFloor)
 
 TEST_F(FrameGoldenTest, DecalOnAWall)
 {
-	if (!StartRoom())
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(StartRoom());
 	Zeph::TextureContainer& textures = Zeph::Engine::GetInstance()->GetTextureContainer();
 	Zeph::DecalData decal;
 	// A marble plate on the brick wall at the left of the picture (x = -2, facing +X).
@@ -103,10 +94,7 @@ TEST_F(FrameGoldenTest, DecalOnAWall)
 
 TEST_F(FrameGoldenTest, PillarShadowsTheAmbientLight)
 {
-	if (!StartRoom())
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(StartRoom());
 	Place("data/models/pillar.dae", {0.4f, 0.0f, 0.2f});
 	UploadUniformAmbient(0.6f);
 	// The caster's light travels down and to the viewer's right, so the pillar's shadow
@@ -124,10 +112,7 @@ TEST_F(FrameGoldenTest, PillarShadowsTheAmbientLight)
 
 TEST_F(FrameGoldenTest, PostChainWithOcclusionBloomAndGrade)
 {
-	if (!StartRoom())
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(StartRoom());
 	Place("data/models/pillar.dae", {0.4f, 0.0f, 0.2f});
 	UploadUniformAmbient(0.4f);
 	ASSERT_TRUE(Renderer().SetColorGrading("data/grading/warm.dds"));
@@ -139,10 +124,7 @@ TEST_F(FrameGoldenTest, PostChainWithOcclusionBloomAndGrade)
 
 TEST_F(FrameGoldenTest, LateGizmoIsDrawnOverTheScene)
 {
-	if (!StartRoom())
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(StartRoom());
 	myPointLights.push_back(Point({0.2f, 1.6f, 0.3f}, 3.0f, {6.0f, 5.0f, 4.0f, 1.0f}));
 	// A red box behind the crate: drawn late, it shows through the crate.
 	Zeph::ModelNode* box = Zeph::Engine::GetInstance()->GetModelFactory().CreateAABB(
@@ -157,10 +139,7 @@ TEST_F(FrameGoldenTest, LateGizmoIsDrawnOverTheScene)
 
 TEST_F(FrameGoldenTest, SampleModelsShowTheirTexturesAndMaterials)
 {
-	if (!Start())
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(Start());
 	// Concrete tiles, a wooden crate, a marble pillar and the two-material knot (metal
 	// and marble), under a warm and a cool light and a dim ambient.
 	Place("data/models/floor_tile_concrete.dae", {-1.0f, 0.0f, -1.0f});

@@ -12,16 +12,18 @@
 
 using namespace FrameTesting;
 
-TEST_F(FrameTest, PointLightReachesItsFalloffAndNoFurther)
+TEST_F(FrameTest, PointLightReachesItsFalloffAndSpotLightItsOuterConeOnly)
 {
-	if (!Start())
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(Start());
 	Place("data/models/room_small.dae", {0.0f, 0.0f, 0.0f});
 	Look({0.0f, 2.9f, 0.0f}, {0.0f, 0.0f, 0.0f}, {0.0f, 0.0f, 1.0f});
-	Render("point-light-off");
+	Render("light-off");
 	const std::vector<float> unlit = myLit;
+	// What the light adds on the floor at aRadius from the light's foot.
+	const auto added = [&](float aRadius, float anAngle) {
+		const Pixel pixel = Project({aRadius * std::cos(anAngle), 0.0f, aRadius * std::sin(anAngle)});
+		return Luminance(myLit, pixel) - Luminance(unlit, pixel);
+	};
 
 	Zeph::PointLightData light;
 	light.myPosition = Vector3<float>(0.0f, 0.5f, 0.0f);
@@ -29,13 +31,8 @@ TEST_F(FrameTest, PointLightReachesItsFalloffAndNoFurther)
 	light.myColor = Vector4<float>(5.0f, 5.0f, 5.0f, 1.0f);
 	myPointLights.push_back(light);
 	Render("point-light-on");
-
 	// Floor points at horizontal distance r from the light's foot: distance to the
 	// light sqrt(r^2 + 0.25), so 0.748 is 0.9 x falloff and 1.09 is 1.2 x falloff.
-	const auto added = [&](float aRadius, float anAngle) {
-		const Pixel pixel = Project({aRadius * std::cos(anAngle), 0.0f, aRadius * std::sin(anAngle)});
-		return Luminance(myLit, pixel) - Luminance(unlit, pixel);
-	};
 	// Directions toward the picture's sides (it is wider than high).
 	for (float angle : {0.0f, 0.35f, 2.8f, 3.3f})
 	{
@@ -47,26 +44,12 @@ TEST_F(FrameTest, PointLightReachesItsFalloffAndNoFurther)
 		EXPECT_NEAR(added(1.2f, angle), 0.0f, 1e-3f) << "beyond 1.2 x falloff, angle " << angle;
 		EXPECT_NEAR(added(1.8f, angle), 0.0f, 1e-3f) << "far beyond, angle " << angle;
 	}
-}
 
-TEST_F(FrameTest, SpotLightLightsInsideItsOuterConeOnly)
-{
-	if (!Start())
-	{
-		return;
-	}
-	Place("data/models/room_small.dae", {0.0f, 0.0f, 0.0f});
-	Look({0.0f, 2.9f, 0.0f}, {0.0f, 0.0f, 0.0f}, {0.0f, 0.0f, 1.0f});
-	Render("spot-light-off");
-	const std::vector<float> unlit = myLit;
 	// From 2.5 above the floor, outer cosine 0.8: the cone meets the floor at radius
 	// 2.5 x tan(acos 0.8) = 1.875; inner cosine 0.95: full strength within 0.82.
+	myPointLights.clear();
 	mySpotLights.push_back(SpotDown({0.0f, 2.5f, 0.0f}, 4.0f, 0.95f, 0.8f));
 	Render("spot-light-on");
-	const auto added = [&](float aRadius, float anAngle) {
-		const Pixel pixel = Project({aRadius * std::cos(anAngle), 0.0f, aRadius * std::sin(anAngle)});
-		return Luminance(myLit, pixel) - Luminance(unlit, pixel);
-	};
 	for (float angle : {0.0f, 0.3f, 2.9f, 3.4f})
 	{
 		EXPECT_GT(added(0.3f, angle), 0.02f) << "inside the inner cone, angle " << angle;
@@ -77,10 +60,7 @@ TEST_F(FrameTest, SpotLightLightsInsideItsOuterConeOnly)
 
 TEST_F(FrameTest, ShadowQualityPicksTheMapSizeAndRepairsTheSetting)
 {
-	if (!Start())
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(Start());
 	struct Case
 	{
 		int mySetting;
@@ -101,23 +81,25 @@ TEST_F(FrameTest, ShadowQualityPicksTheMapSizeAndRepairsTheSetting)
 
 TEST_F(FrameTest, EveryPassRunsWithNothingQueuedAndLevelZeroDrawsNoShadowMap)
 {
-	if (!Start(0))
-	{
-		return;
-	}
-	Renderer().SetPassTimingFlag(true);
-	Render("empty");
+	LUMORA_RETURN_UNLESS(Start(0));
 	std::vector<std::string> names;
-	for (const Zeph::Renderer::PassTime& pass : Renderer().GetPassTimes())
-	{
-		names.push_back(pass.myName);
-	}
-	for (const char* expected : {"G-buffer", "decals", "lights", "SSAO", "ambient", "forward", "tone map", "bloom",
-	                             "grading", "outline", "late"})
+	const auto renderTimed = [&](const char* aName) {
+		Renderer().SetPassTimingFlag(true);
+		Render(aName);
+		names.clear();
+		for (const Zeph::Renderer::PassTime& pass : Renderer().GetPassTimes())
+		{
+			names.push_back(pass.myName);
+		}
+	};
+	renderTimed("empty");
+	for (const char* expected : {"G-buffer", "decals", "lights", "SSAO", "ambient", "forward", "tone map",
+	                             "bloom", "grading", "outline", "late"})
 	{
 		EXPECT_NE(std::find(names.begin(), names.end(), expected), names.end()) << expected;
 	}
-	EXPECT_EQ(std::find(names.begin(), names.end(), "shadow map"), names.end()) << "quality 0 renders no shadow map";
+	EXPECT_EQ(std::find(names.begin(), names.end(), "shadow map"), names.end())
+	    << "quality 0 renders no shadow map";
 	EXPECT_EQ(std::find(names.begin(), names.end(), "shadow resolve"), names.end());
 	// An empty lit image is black.
 	for (float value : myLit)
@@ -128,22 +110,13 @@ TEST_F(FrameTest, EveryPassRunsWithNothingQueuedAndLevelZeroDrawsNoShadowMap)
 	ASSERT_TRUE(Zeph::Engine::GetInstance()->GetSetupInfo().myShadowQuality == 0);
 	Zeph::Engine::GetInstance()->GetSetupInfo().myShadowQuality = 1;
 	ASSERT_TRUE(Renderer().Init(ourWidth, ourHeight));
-	Renderer().SetPassTimingFlag(true);
-	Render("empty-with-shadows");
-	names.clear();
-	for (const Zeph::Renderer::PassTime& pass : Renderer().GetPassTimes())
-	{
-		names.push_back(pass.myName);
-	}
+	renderTimed("empty-with-shadows");
 	EXPECT_NE(std::find(names.begin(), names.end(), "shadow map"), names.end());
 }
 
 TEST_F(FrameTest, SettingsFilesAndSettersReachTheirVariablesInOrder)
 {
-	if (!Start())
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(Start());
 	Zeph::Effect* effect = Renderer().GetFullScreenHelper().GetEffect();
 	ASSERT_NE(effect, nullptr);
 	const auto value = [effect](const char* aName) {
@@ -160,16 +133,12 @@ TEST_F(FrameTest, SettingsFilesAndSettersReachTheirVariablesInOrder)
 	EXPECT_FLOAT_EQ(value("EmissiveMultiplier"), hdr.GetAttribute<float>("emissive-mult"));
 
 	Renderer().SetSSAOVariables(1.0f, 2.0f, 3.0f, 4.0f);
-	const char* ssaoNames[] = {"SSAO_scale", "SSAO_sample_rad", "SSAO_bias", "SSAO_Intensity"};
-	for (int index = 0; index < 4; ++index)
+	Renderer().SetHDRandBloomVariables(5.0f, 6.0f, 7.0f, 8.0f, 9.0f, 10.0f);
+	const char* names[] = {
+	    "SSAO_scale", "SSAO_sample_rad", "SSAO_bias",      "SSAO_Intensity", "AutoExposureAdjustment",
+	    "lumMin",     "lumMax",          "BloomThreshold", "BloomFactor",    "EmissiveMultiplier"};
+	for (int index = 0; index < 10; ++index)
 	{
-		EXPECT_FLOAT_EQ(value(ssaoNames[index]), static_cast<float>(index + 1)) << ssaoNames[index];
-	}
-	Renderer().SetHDRandBloomVariables(1.0f, 2.0f, 3.0f, 4.0f, 5.0f, 6.0f);
-	const char* hdrNames[] = {"AutoExposureAdjustment", "lumMin", "lumMax", "BloomThreshold", "BloomFactor",
-	                          "EmissiveMultiplier"};
-	for (int index = 0; index < 6; ++index)
-	{
-		EXPECT_FLOAT_EQ(value(hdrNames[index]), static_cast<float>(index + 1)) << hdrNames[index];
+		EXPECT_FLOAT_EQ(value(names[index]), static_cast<float>(index + 1)) << names[index];
 	}
 }

@@ -65,7 +65,8 @@ TEST(ShadowCasterTest, FittedProjectionEnclosesTheViewersBoxExactly)
 	camera.Yaw(0.7f);
 	camera.Pitch(-0.3f);
 	for (const Vector3<float>& direction :
-	     {Vector3<float>(0.0f, 1.0f, 0.0f), Vector3<float>(0.0f, -1.0f, 0.0f), Vector3<float>(0.4f, -0.8f, 0.3f)})
+	     {Vector3<float>(0.0f, 1.0f, 0.0f), Vector3<float>(0.0f, -1.0f, 0.0f),
+	      Vector3<float>(0.4f, -0.8f, 0.3f)})
 	{
 		const Matrix44<float> casterViewProjection = Zeph::ShadowRenderTargetHelper::FitCaster(
 		    direction, camera.GetActualOrientation(), 0.0025f, 25.0f);
@@ -85,12 +86,11 @@ TEST(ShadowCasterTest, FittedProjectionEnclosesTheViewersBoxExactly)
 			}
 		}
 		// The box touches every side of the caster's clip volume: x, y in -1..1, depth 0..1.
-		EXPECT_NEAR(low[0], -1.0f, 1e-3f);
-		EXPECT_NEAR(high[0], 1.0f, 1e-3f);
-		EXPECT_NEAR(low[1], -1.0f, 1e-3f);
-		EXPECT_NEAR(high[1], 1.0f, 1e-3f);
-		EXPECT_NEAR(low[2], 0.0f, 1e-3f);
-		EXPECT_NEAR(high[2], 1.0f, 1e-3f);
+		for (int axis = 0; axis < 3; ++axis)
+		{
+			EXPECT_NEAR(low[axis], axis < 2 ? -1.0f : 0.0f, 1e-3f) << axis;
+			EXPECT_NEAR(high[axis], 1.0f, 1e-3f) << axis;
+		}
 		// Depth grows along the caster direction: a point further along it is deeper.
 		const Vector4<float> near(0.0f, 0.0f, 0.0f, 1.0f);
 		const Vector4<float> far(direction.x, direction.y, direction.z, 1.0f);

@@ -1,6 +1,7 @@
 // The renderer with a GPU (headless, 160 x 90): instances drawn through the
 // collector, room boxes and lines over the frame, read back from the back buffer.
 // Every frame is saved under /tmp/lumora-renderer-tests/ to be looked at.
+#include <algorithm>
 #include <cmath>
 #include <cstdint>
 #include <gtest/gtest.h>
@@ -18,6 +19,7 @@
 #include "platform/gpu/Readback.h"
 #include "renderer/FrameCapture.h"
 #include "renderer/Renderer.h"
+#include "support/TestSupport.h"
 
 namespace
 {
@@ -37,12 +39,8 @@ protected:
 		ASSERT_TRUE(Gpu::ReadRenderTarget(engine->GetContext(), *engine->GetBackBufferView(), myPixels));
 		ASSERT_EQ(myPixels.size(), static_cast<size_t>(ourWidth * ourHeight * 4));
 		// Saved opaque: the room box's colour has alpha 0, which a viewer would show as a hole.
-		std::vector<uint8_t> opaque = myPixels;
-		for (size_t alpha = 3; alpha < opaque.size(); alpha += 4)
-		{
-			opaque[alpha] = 255;
-		}
-		Gpu::SavePng("/tmp/lumora-renderer-tests/" + aName + ".png", ourWidth, ourHeight, opaque.data());
+		Gpu::SavePng("/tmp/lumora-renderer-tests/" + aName + ".png", ourWidth, ourHeight,
+		             TestSupport::Opaque(myPixels).data());
 	}
 
 	const uint8_t* At(int anX, int aY) const
@@ -53,56 +51,28 @@ protected:
 	{
 		return At(anX, aY)[0] == 0 && At(anX, aY)[1] == 0 && At(anX, aY)[2] == 0;
 	}
-	// Any pixel within one of (x, y) with the channel at 255.
-	bool IsLitNear(Pixel aPixel, int aChannel) const
+	// How many pixels within one of aPixel are lit: at 255 in aChannel, or (aChannel -1) not black.
+	int LitNear(Pixel aPixel, int aChannel) const
 	{
-		for (int y = aPixel.myY - 1; y <= aPixel.myY + 1; ++y)
+		int lit = 0;
+		for (int y = std::max(aPixel.myY - 1, 0); y <= std::min(aPixel.myY + 1, ourHeight - 1); ++y)
 		{
-			for (int x = aPixel.myX - 1; x <= aPixel.myX + 1; ++x)
+			for (int x = std::max(aPixel.myX - 1, 0); x <= std::min(aPixel.myX + 1, ourWidth - 1); ++x)
 			{
-				if (x >= 0 && y >= 0 && x < ourWidth && y < ourHeight && At(x, y)[aChannel] == 255)
-				{
-					return true;
-				}
+				lit += (aChannel < 0 ? !IsBlack(x, y) : At(x, y)[aChannel] == 255) ? 1 : 0;
 			}
 		}
-		return false;
-	}
-	bool IsClearNear(Pixel aPixel) const
-	{
-		for (int y = aPixel.myY - 1; y <= aPixel.myY + 1; ++y)
-		{
-			for (int x = aPixel.myX - 1; x <= aPixel.myX + 1; ++x)
-			{
-				if (!IsBlack(x, y))
-				{
-					return false;
-				}
-			}
-		}
-		return true;
+		return lit;
 	}
 
-	// Where the camera puts a world point: clip = (p, 1) * View * Projection, then
-	// the viewport with row 0 at the top.
 	std::vector<uint8_t> myPixels;
 };
 
-// sRGB encoding of a linear value, as the back buffer stores it.
-int Encoded(float aLinear)
-{
-	const float encoded =
-	    aLinear <= 0.0031308f ? aLinear * 12.92f : 1.055f * std::pow(aLinear, 1.0f / 2.4f) - 0.055f;
-	return static_cast<int>(std::lround(encoded * 255.0f));
-}
 } // namespace
 
 TEST_F(RendererTest, LateInstanceOfABoxIsDrawnWhereTheCameraSeesIt)
 {
-	if (!Start())
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(Start());
 	Zeph::ModelNode* box = Factory().CreateAABB("red box", {1.0f, 1.0f, 1.0f}, {0.5f, 0.0f, 0.0f, 1.0f},
 	                                            Gpu::PrimitiveTopology::TriangleList);
 	ASSERT_NE(box, nullptr) << TakeLog();
@@ -113,7 +83,7 @@ TEST_F(RendererTest, LateInstanceOfABoxIsDrawnWhereTheCameraSeesIt)
 	RenderAndRead("box");
 
 	const uint8_t* centre = At(ourWidth / 2, ourHeight / 2);
-	EXPECT_NEAR(centre[0], Encoded(0.5f), 1) << "the back buffer stores sRGB-encoded colour";
+	EXPECT_NEAR(centre[0], TestSupport::SrgbEncoded(0.5f), 1) << "the back buffer stores sRGB-encoded colour";
 	EXPECT_EQ(centre[1], 0);
 	EXPECT_EQ(centre[2], 0);
 	for (const Pixel corner :
@@ -123,7 +93,7 @@ TEST_F(RendererTest, LateInstanceOfABoxIsDrawnWhereTheCameraSeesIt)
 	}
 	// The near face's silhouette: inside just within its corner, outside just beyond.
 	const Pixel topLeft = Project({-1.0f, 1.0f, 9.0f});
-	EXPECT_NEAR(At(topLeft.myX + 2, topLeft.myY + 2)[0], Encoded(0.5f), 1);
+	EXPECT_NEAR(At(topLeft.myX + 2, topLeft.myY + 2)[0], TestSupport::SrgbEncoded(0.5f), 1);
 	EXPECT_TRUE(IsBlack(topLeft.myX - 2, topLeft.myY - 2));
 
 	// The frame emptied the queues: the next one draws nothing.
@@ -133,10 +103,7 @@ TEST_F(RendererTest, LateInstanceOfABoxIsDrawnWhereTheCameraSeesIt)
 
 TEST_F(RendererTest, SubmittingKeepsEachInstancesPreviousWorldMatrix)
 {
-	if (!Start())
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(Start());
 	Zeph::ModelNode* box = Factory().CreateAABB("box", {1.0f, 1.0f, 1.0f}, {1.0f, 1.0f, 1.0f, 1.0f},
 	                                            Gpu::PrimitiveTopology::TriangleList);
 	ASSERT_NE(box, nullptr) << TakeLog();
@@ -165,12 +132,9 @@ TEST_F(RendererTest, SubmittingKeepsEachInstancesPreviousWorldMatrix)
 	RenderAndRead("two-boxes-moved");
 }
 
-TEST_F(RendererTest, RoomBoxIsDrawnAsLinesOverTheFrame)
+TEST_F(RendererTest, RoomBoxIsDrawnAsLinesOverTheFrameAndSharedByEqualBounds)
 {
-	if (!Start())
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(Start());
 	Zeph::Room room({-1.0f, -1.0f, 9.0f}, {1.0f, 1.0f, 11.0f});
 	room.InitDebugInstance();
 	ASSERT_NE(room.GetDebugInstance(), nullptr) << TakeLog();
@@ -187,13 +151,13 @@ TEST_F(RendererTest, RoomBoxIsDrawnAsLinesOverTheFrame)
 	                                   Vector3<float>(1.0f, -1.0f, 10.0f)})
 	{
 		const Pixel pixel = Project(edge);
-		EXPECT_TRUE(IsLitNear(pixel, 0)) << "edge at " << pixel.myX << ", " << pixel.myY;
+		EXPECT_TRUE(LitNear(pixel, 0) > 0) << "edge at " << pixel.myX << ", " << pixel.myY;
 		EXPECT_EQ(At(pixel.myX, pixel.myY)[1], 0) << "red only";
 	}
 	// The faces are not filled: the near face probed off its diagonal (which runs
 	// from (-x, -y) to (+x, +y)), in its upper-left and lower-right quarters.
-	EXPECT_TRUE(IsClearNear(Project({-0.5f, 0.5f, 9.0f})));
-	EXPECT_TRUE(IsClearNear(Project({0.5f, -0.5f, 9.0f})));
+	EXPECT_EQ(LitNear(Project({-0.5f, 0.5f, 9.0f}), -1), 0);
+	EXPECT_EQ(LitNear(Project({0.5f, -0.5f, 9.0f}), -1), 0);
 	EXPECT_TRUE(IsBlack(0, 0));
 
 	// The box is drawn at the room's centre: the same model moved by the instance.
@@ -201,14 +165,8 @@ TEST_F(RendererTest, RoomBoxIsDrawnAsLinesOverTheFrame)
 	EXPECT_FLOAT_EQ(orientation.GetPosition().z, 10.0f);
 	room.DestroyDebugInstance();
 	EXPECT_EQ(room.GetDebugInstance(), nullptr);
-}
 
-TEST_F(RendererTest, RoomsWithEqualBoundsShareTheirBoxModel)
-{
-	if (!Start())
-	{
-		return;
-	}
+	// Rooms with equal bounds share their box model.
 	Zeph::Room first({0.0f, 0.0f, 0.0f}, {2.0f, 4.0f, 6.0f});
 	Zeph::Room same({0.0f, 0.0f, 0.0f}, {2.0f, 4.0f, 6.0f});
 	Zeph::Room other({0.0f, 0.0f, 0.0f}, {2.0f, 4.0f, 7.0f});
@@ -234,17 +192,14 @@ TEST_F(RendererTest, RoomsWithEqualBoundsShareTheirBoxModel)
 
 TEST_F(RendererTest, MovedDebugLineIsDrawnAtItsNewEnds)
 {
-	if (!Start())
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(Start());
 	const Vector4<float> green(0.0f, 1.0f, 0.0f, 0.0f);
 	Zeph::DebugLine line;
 	ASSERT_TRUE(line.Init({{-1.0f, 0.5f, 10.0f}, green}, {{1.0f, 0.5f, 10.0f}, green})) << TakeLog();
 	line.Render();
 	RenderAndRead("line-before");
 	const Pixel oldMiddle = Project({0.0f, 0.5f, 10.0f});
-	ASSERT_TRUE(IsLitNear(oldMiddle, 1)) << "the line as made";
+	ASSERT_TRUE(LitNear(oldMiddle, 1) > 0) << "the line as made";
 
 	line.SetVertexPosition(0, {-1.0f, -0.5f, 10.0f});
 	line.SetVertexPosition(1, {1.0f, -0.8f, 10.0f});
@@ -254,8 +209,8 @@ TEST_F(RendererTest, MovedDebugLineIsDrawnAtItsNewEnds)
 	{
 		const Vector3<float> onNew(-1.0f + 2.0f * t, -0.5f - 0.3f * t, 10.0f);
 		const Vector3<float> onOld(-1.0f + 2.0f * t, 0.5f, 10.0f);
-		EXPECT_TRUE(IsLitNear(Project(onNew), 1)) << "new line at t = " << t;
-		EXPECT_TRUE(IsClearNear(Project(onOld))) << "old line at t = " << t;
+		EXPECT_TRUE(LitNear(Project(onNew), 1) > 0) << "new line at t = " << t;
+		EXPECT_EQ(LitNear(Project(onOld), -1), 0) << "old line at t = " << t;
 	}
 	line.Destroy();
 	EXPECT_EQ(line.GetInstance(), nullptr);
