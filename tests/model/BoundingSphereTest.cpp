@@ -55,9 +55,9 @@ TEST(BoundingSphereTest, TheBoxOfTheFirstModelIsMirroredInX)
 		Zeph::ModelNode root;
 		root.SetModel(ModelWith(test.myType, test.myStride, test.myPositions));
 		const Intersection::Sphere sphere = Zeph::ModelFactory::ComputeBoundingSphere(root);
-		EXPECT_FLOAT_EQ(sphere.myPosition.x, test.myCentre.x) << test.myName;
-		EXPECT_FLOAT_EQ(sphere.myPosition.y, test.myCentre.y) << test.myName;
-		EXPECT_FLOAT_EQ(sphere.myPosition.z, test.myCentre.z) << test.myName;
+		EXPECT_EQ((std::vector{sphere.myPosition.x, sphere.myPosition.y, sphere.myPosition.z}),
+		          (std::vector{test.myCentre.x, test.myCentre.y, test.myCentre.z}))
+		    << test.myName;
 		EXPECT_NEAR(sphere.myRadius, test.myRadius, 1e-5f) << test.myName;
 	}
 }

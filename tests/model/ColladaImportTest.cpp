@@ -2,12 +2,14 @@
 // documents give the trees they declare or are rejected, and small hand-written
 // documents pin the vertex numbering, the winding, the texture coordinates, the
 // mirror at the root, the skin words, cameras, lights and material textures.
+#include <array>
 #include <cmath>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <gtest/gtest.h>
 #include <numbers>
+#include <tuple>
 #include <vector>
 
 #include "engine/Camera.h"
@@ -120,10 +122,7 @@ std::string Source(const std::string& anId, int aStride, const std::string& some
 
 TEST_F(ColladaImportTest, ExportersDocumentsImportAsDeclaredOrAreRejected)
 {
-	if (!CreateEngine(64, 64))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	struct ExpectedModel
 	{
 		const char* myNode;
@@ -226,10 +225,7 @@ TEST_F(ColladaImportTest, ExportersDocumentsImportAsDeclaredOrAreRejected)
 
 TEST_F(ColladaImportTest, CornersWindingUvsMirrorCameraLightAndTexturesOfALitQuad)
 {
-	if (!CreateEngine(64, 64))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	const std::string images[5] = {WriteSolidTexture("reflective.dds"), WriteSolidTexture("diffuse.dds"),
 	                               WriteSolidTexture("bump.dds"), WriteSolidTexture("specular.dds"),
 	                               WriteSolidTexture("ambient.dds")};
@@ -276,17 +272,13 @@ TEST_F(ColladaImportTest, CornersWindingUvsMirrorCameraLightAndTexturesOfALitQua
 
 	// The root is the scene with the identity transform, mirrored in x.
 	const Matrix44<float> root = tree->GetTransformation()->GetTransformationForTime(0.0);
-	for (int i = 0; i < 16; ++i)
-	{
-		EXPECT_EQ(root.myMatrix[i], i == 0 ? -1.0f : (i % 5 == 0 ? 1.0f : 0.0f)) << "element " << i;
-	}
+	EXPECT_EQ(std::vector<float>(root.myMatrix, root.myMatrix + 16),
+	          (std::vector<float>{-1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1, 0, 0, 0, 0, 1}));
 	ASSERT_EQ(tree->GetChildren().Count(), 4);
 	const Zeph::ModelNode& quad = *tree->GetChildren()[0];
 	EXPECT_EQ(quad.GetName(), "Quad");
 	const Matrix44<float> local = quad.GetTransformation()->GetTransformationForTime(0.0);
-	EXPECT_EQ(local.myMatrix[12], 1.0f);
-	EXPECT_EQ(local.myMatrix[13], 2.0f);
-	EXPECT_EQ(local.myMatrix[14], 3.0f);
+	EXPECT_EQ(std::vector<float>(local.myMatrix + 12, local.myMatrix + 15), (std::vector<float>{1, 2, 3}));
 
 	const Zeph::Model* model = quad.GetModel();
 	ASSERT_NE(model, nullptr);
@@ -294,14 +286,13 @@ TEST_F(ColladaImportTest, CornersWindingUvsMirrorCameraLightAndTexturesOfALitQua
 	EXPECT_EQ(model->GetVertexCount(), 4) << "the repeated key is one vertex";
 	EXPECT_EQ(Indices(*model), (std::vector<uint32_t>{2, 1, 0, 3, 3, 3}));
 	// Type 4: position 0, normal 12, uv 24, tangent 32, binormal 44.
-	EXPECT_EQ(VertexValue<float>(*model, 0, 24), 0.25f);
-	EXPECT_EQ(VertexValue<float>(*model, 0, 28), 0.75f);
-	EXPECT_EQ(VertexValue<float>(*model, 1, 0), 1.0f);
-	EXPECT_EQ(VertexValue<float>(*model, 1, 28), 1.0f);
-	EXPECT_EQ(VertexValue<float>(*model, 3, 0), 5.0f);
-	EXPECT_EQ(VertexValue<float>(*model, 2, 20), -1.0f);
-	EXPECT_EQ(VertexValue<float>(*model, 2, 32), 1.0f);
-	EXPECT_EQ(VertexValue<float>(*model, 2, 48), 1.0f);
+	const std::tuple<int, int, float> values[] = {{0, 24, 0.25f}, {0, 28, 0.75f}, {1, 0, 1.0f},
+	                                              {1, 28, 1.0f},  {3, 0, 5.0f},   {2, 20, -1.0f},
+	                                              {2, 32, 1.0f},  {2, 48, 1.0f}};
+	for (const auto& [vertex, offset, value] : values)
+	{
+		EXPECT_EQ(VertexValue<float>(*model, vertex, offset), value) << vertex << " at " << offset;
+	}
 
 	ASSERT_EQ(model->GetSurfaces().Count(), 1);
 	const Zeph::Surface& surface = model->GetSurfaces()[0];
@@ -329,20 +320,15 @@ TEST_F(ColladaImportTest, CornersWindingUvsMirrorCameraLightAndTexturesOfALitQua
 	const Zeph::ModelLight* sun = tree->GetChildren()[2]->GetLight();
 	ASSERT_NE(sun, nullptr);
 	EXPECT_EQ(sun->myKind, Zeph::ModelLight::DIRECTIONAL);
-	EXPECT_EQ(sun->myColor.x, 0.5f);
-	EXPECT_EQ(sun->myColor.y, 0.25f);
-	EXPECT_EQ(sun->myColor.z, 1.0f);
-	EXPECT_EQ(sun->myColor.w, 1.0f);
+	EXPECT_EQ((std::vector{sun->myColor.x, sun->myColor.y, sun->myColor.z, sun->myColor.w}),
+	          (std::vector{0.5f, 0.25f, 1.0f, 1.0f}));
 	ASSERT_NE(tree->GetChildren()[3]->GetLight(), nullptr);
 	EXPECT_EQ(tree->GetChildren()[3]->GetLight()->myKind, Zeph::ModelLight::POINT);
 }
 
 TEST_F(ColladaImportTest, ASkinStoresWeightsAndBonesBytesPerInfluence)
 {
-	if (!CreateEngine(64, 64))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	std::string bind;
 	for (int joint = 0; joint < 4; ++joint)
 	{
@@ -373,10 +359,11 @@ TEST_F(ColladaImportTest, ASkinStoresWeightsAndBonesBytesPerInfluence)
 	EXPECT_EQ(model->GetVertexType(), 7);
 	ASSERT_EQ(model->GetVertexCount(), 3);
 	// Type 7: position 0, weights 12, bones 16, normal 20, uv 32.
+	using Bytes = std::array<uint8_t, 4>;
 	struct Expected
 	{
-		uint8_t myWeights[4];
-		uint8_t myBones[4];
+		Bytes myWeights;
+		Bytes myBones;
 	};
 	const Expected expected[3] = {
 	    {{255, 0, 0, 0}, {3, 0, 0, 0}},
@@ -385,13 +372,8 @@ TEST_F(ColladaImportTest, ASkinStoresWeightsAndBonesBytesPerInfluence)
 	};
 	for (int vertex = 0; vertex < 3; ++vertex)
 	{
-		const auto weights = VertexValue<std::array<uint8_t, 4>>(*model, vertex, 12);
-		const auto bones = VertexValue<std::array<uint8_t, 4>>(*model, vertex, 16);
-		for (int j = 0; j < 4; ++j)
-		{
-			EXPECT_EQ(weights[j], expected[vertex].myWeights[j]) << "vertex " << vertex << ", byte " << j;
-			EXPECT_EQ(bones[j], expected[vertex].myBones[j]) << "vertex " << vertex << ", byte " << j;
-		}
+		EXPECT_EQ(VertexValue<Bytes>(*model, vertex, 12), expected[vertex].myWeights) << "vertex " << vertex;
+		EXPECT_EQ(VertexValue<Bytes>(*model, vertex, 16), expected[vertex].myBones) << "vertex " << vertex;
 	}
 	EXPECT_EQ(VertexValue<float>(*model, 0, 28), -1.0f);
 }
@@ -400,10 +382,7 @@ TEST_F(ColladaImportTest, ASkinStoresWeightsAndBonesBytesPerInfluence)
 // factory as the lit vertex type, with its four material textures on every surface.
 TEST_F(ColladaImportTest, TheSampleModelsImportAsLitModelsWithTheirTextures)
 {
-	if (!CreateEngine(64, 64))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	std::vector<std::string> names;
 	for (const auto& entry : std::filesystem::directory_iterator("data/models"))
 	{

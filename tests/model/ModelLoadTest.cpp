@@ -1,9 +1,11 @@
 // Loading models through the factory with a GPU: ".al" files written and read back
 // with their effects, textures and techniques, the load reports, the stored
 // bounding spheres, the lit effects' techniques and a lit quad on screen.
+#include <array>
 #include <cmath>
 #include <filesystem>
 #include <gtest/gtest.h>
+#include <iterator>
 
 #include "ModelTreeCheck.h"
 #include "engine/Effect.h"
@@ -37,20 +39,11 @@ protected:
 	}
 };
 
-uint8_t ToSrgbByte(float aLinear)
-{
-	const float encoded =
-	    aLinear <= 0.0031308f ? aLinear * 12.92f : 1.055f * std::pow(aLinear, 1.0f / 2.4f) - 0.055f;
-	return static_cast<uint8_t>(std::lround(encoded * 255.0f));
-}
 } // namespace
 
 TEST_F(ModelLoadTest, AnAlFileLoadsAsTheTreeThatWasSavedWithItsTexturesAndTechniques)
 {
-	if (!CreateEngine(64, 64))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	const uint8_t red[4] = {255, 0, 0, 255};
 	const uint8_t flat[4] = {128, 128, 255, 255};
 	const std::string albedo = WriteSolidTexture("albedo.dds", red);
@@ -66,13 +59,9 @@ TEST_F(ModelLoadTest, AnAlFileLoadsAsTheTreeThatWasSavedWithItsTexturesAndTechni
 
 	const std::string path = myScratch.File("models/tree.al");
 	ASSERT_TRUE(Zeph::ColladaMeshFactory::SaveModelNodeAL(*tree, path)) << TakeLog();
-	size_t files = 0;
-	for ([[maybe_unused]] const auto& entry :
-	     std::filesystem::directory_iterator(myScratch.Path() / "models"))
-	{
-		++files;
-	}
-	EXPECT_EQ(files, 1u) << "no temporary file is left beside the model file";
+	const std::filesystem::directory_iterator files(myScratch.Path() / "models");
+	EXPECT_EQ(std::distance(begin(files), end(files)), 1)
+	    << "no temporary file is left beside the model file";
 
 	Zeph::ModelFactory& factory = Zeph::Engine::GetInstance()->GetModelFactory();
 	// Whatever the engine loaded for itself at start-up is not counted.
@@ -110,10 +99,7 @@ TEST_F(ModelLoadTest, AnAlFileLoadsAsTheTreeThatWasSavedWithItsTexturesAndTechni
 
 TEST_F(ModelLoadTest, ModelsThatCannotLoadAreReportedAndNotStored)
 {
-	if (!CreateEngine(64, 64))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	TestSupport::WriteWholeFile(myScratch.File("damaged.al"), std::string("\x02\x00\x00\x00\x07", 5));
 	struct Case
 	{
@@ -158,10 +144,7 @@ TEST_F(ModelLoadTest, ModelsThatCannotLoadAreReportedAndNotStored)
 
 TEST_F(ModelLoadTest, TheStoredSphereComesFromTheFirstModelMirroredInX)
 {
-	if (!CreateEngine(64, 64))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	// A root without a model over one child whose lit model has one vertex at (1, 2, 3).
 	Zeph::ModelNode root;
 	auto* child = new Zeph::ModelNode();
@@ -181,43 +164,16 @@ TEST_F(ModelLoadTest, TheStoredSphereComesFromTheFirstModelMirroredInX)
 	Zeph::ModelFactory& factory = Zeph::Engine::GetInstance()->GetModelFactory();
 	ASSERT_NE(factory.CreateModelNodeAL(path), nullptr) << TakeLog();
 	const Intersection::Sphere sphere = factory.GetCullShapeFromModel(path);
-	EXPECT_FLOAT_EQ(sphere.myPosition.x, -1.0f);
-	EXPECT_FLOAT_EQ(sphere.myPosition.y, 2.0f);
-	EXPECT_FLOAT_EQ(sphere.myPosition.z, 3.0f);
-	EXPECT_FLOAT_EQ(sphere.myRadius, 0.0f);
+	EXPECT_EQ((std::array{sphere.myPosition.x, sphere.myPosition.y, sphere.myPosition.z, sphere.myRadius}),
+	          (std::array{-1.0f, 2.0f, 3.0f, 0.0f}));
 }
 
-TEST_F(ModelLoadTest, TheModelEffectsHaveEveryTechniqueAModelSelects)
+// Every vertex type's layout feeds its effect's "Render" and shadow passes (the two lit
+// effects' techniques are checked with the effect files).
+TEST_F(ModelLoadTest, EveryVertexTypesLayoutFeedsItsEffect)
 {
-	if (!CreateEngine(64, 64))
-	{
-		return;
-	}
-	const char* const litTechniques[] = {
-	    "Render",
-	    "RenderBase",
-	    "RenderAlphaTest",
-	    "RenderFrontFace",
-	    "RenderGBuffer",
-	    "RenderGBufferFrontFace",
-	    "RenderShadowBuffer",
-	    "RenderShadowBufferBase",
-	    "RenderShadowBufferAlphaTest",
-	    "RenderShadowBufferFrontFace",
-	};
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	Zeph::EffectContainer& effects = Zeph::Engine::GetInstance()->GetEffectContainer();
-	for (int row : {Zeph::EFFECT_LIT_MODEL, Zeph::EFFECT_SKINNED_MODEL})
-	{
-		Zeph::Effect* effect = effects.GetEffect(Zeph::ShaderFiles[static_cast<size_t>(row)]);
-		ASSERT_NE(effect, nullptr) << Zeph::ShaderFiles[static_cast<size_t>(row)] << "\n" << TakeLog();
-		for (const char* name : litTechniques)
-		{
-			Fx::Technique* technique = effect->GetEffect()->GetTechniqueByName(name);
-			ASSERT_NE(technique, nullptr) << name;
-			EXPECT_TRUE(technique->IsValid()) << Zeph::ShaderFiles[static_cast<size_t>(row)] << ": " << name;
-		}
-	}
-	// Every vertex type's layout feeds its effect's "Render" and shadow passes.
 	Gpu::Context& context = Zeph::Engine::GetInstance()->GetContext();
 	for (int type = 0; type < Zeph::VERTEX_TYPE_COUNT; ++type)
 	{
@@ -247,10 +203,7 @@ TEST_F(ModelLoadTest, TheModelEffectsHaveEveryTechniqueAModelSelects)
 TEST_F(ModelLoadTest, ALoadedLitModelDrawnWithRenderShowsItsAlbedoLit)
 {
 	const int size = 64;
-	if (!CreateEngine(size, size))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(size, size));
 	const uint8_t albedo[4] = {200, 120, 40, 255};
 	const std::string texture = WriteSolidTexture("albedo.dds", albedo);
 	Zeph::ModelNode source;
@@ -300,7 +253,9 @@ TEST_F(ModelLoadTest, ALoadedLitModelDrawnWithRenderShowsItsAlbedoLit)
 	for (size_t channel = 0; channel < 3; ++channel)
 	{
 		const float lit = static_cast<float>(albedo[channel]) / 255.0f * lightRgb[channel] * lambert;
-		EXPECT_NEAR(pixels[centre + channel], ToSrgbByte(lit), 2) << "quad centre, channel " << channel;
-		EXPECT_NEAR(pixels[corner + channel], ToSrgbByte(ourClearColor[channel]), 1) << "outside the quad";
+		EXPECT_NEAR(pixels[centre + channel], TestSupport::SrgbEncoded(lit), 2)
+		    << "quad centre, channel " << channel;
+		EXPECT_NEAR(pixels[corner + channel], TestSupport::SrgbEncoded(ourClearColor[channel]), 1)
+		    << "outside the quad";
 	}
 }

@@ -141,16 +141,3 @@ TEST(ModelNodeTest, TechniqueSelectionNamesTheGBufferAndShadowTechniques)
 	EXPECT_EQ(tree.firstModel->GetGBufferTechniqueName(), "RenderGBufferFrontFace");
 	EXPECT_EQ(tree.firstModel->GetShadowTechniqueName(), "RenderShadowBufferBase");
 }
-
-TEST(ModelTest, IdsCountUpAndNewModelsHaveTheDocumentedDefaults)
-{
-	Zeph::Model first;
-	Zeph::Model second;
-	EXPECT_EQ(second.GetModelID(), first.GetModelID() + 1);
-	EXPECT_FALSE(first.IsNullObject());
-	EXPECT_EQ(first.GetTechniqueName(), "Render");
-	EXPECT_EQ(first.GetShadowTechniqueName(), "RenderShadowBuffer");
-	EXPECT_EQ(first.GetGBufferTechniqueName(), "");
-	EXPECT_FALSE(first.GetIsShadowCasterFlag());
-	EXPECT_EQ(first.GetChildModels().GetCapacity(), 10);
-}
