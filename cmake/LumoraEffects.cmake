@@ -12,6 +12,10 @@ if(LUMORA_TSAN)
   set(LUMORA_FXC_LAUNCH ${CMAKE_COMMAND} -E env
     "TSAN_OPTIONS=suppressions=${LUMORA_SOURCE_ROOT}/tests/tsan.supp")
 endif()
+# Likewise LeakSanitizer in the libFuzzer build reports the driver's own allocations at exit.
+if(LUMORA_FUZZ)
+  set(LUMORA_FXC_LAUNCH ${CMAKE_COMMAND} -E env "ASAN_OPTIONS=detect_leaks=0")
+endif()
 foreach(source IN LISTS LUMORA_EFFECT_SOURCES)
   file(RELATIVE_PATH relative "${LUMORA_SOURCE_ROOT}" "${source}")
   string(MAKE_C_IDENTIFIER "${relative}" depname)

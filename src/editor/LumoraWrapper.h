@@ -136,6 +136,9 @@ public:
 
 	// Levels.
 	void ParseLevel(const std::u16string& aLevel);
+	// Reads the entity-type and decal-type catalogues again (after the user edited them); the
+	// next ParseLevel places entities and decals by them.
+	void ReloadCatalogues();
 	void SaveLights(const std::u16string& aLevel);
 	void SaveDecals(const std::u16string& aLevel);
 

@@ -39,6 +39,16 @@ void LumoraWrapper::ParseEntities()
 	xml.ExitChild();
 }
 
+void LumoraWrapper::ReloadCatalogues()
+{
+	ClaimAfterTheFrame();
+	myEntityBank.clear();
+	myEntityShadowCasterBank.clear();
+	ParseEntities();
+	ParseDecalTypes("data/XML/DecalTypes.xml");
+	Release();
+}
+
 void LumoraWrapper::ParseDecalTypes(const std::string& aPath)
 {
 	static constexpr const char* ourFunction = "Lumora::LumoraWrapper::ParseDecalTypes";

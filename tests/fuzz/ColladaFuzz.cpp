@@ -1,24 +1,19 @@
-// Fuzz entry for the COLLADA reader: any bytes must load or fail with a message, never crash or
-// read out of range; what loads must triangulate, evaluate its transforms and reduce its skins
-// with every index inside its source.
-//
-// Run the real fuzzer (clang, libFuzzer and ASan):
-//   CC=clang CXX=clang++ cmake -S . -B build-fuzz -G Ninja -DLUMORA_FUZZ=ON -DLUMORA_BUILD_BENCH=OFF
-//   cmake --build build-fuzz --target collada_fuzz
-//   mkdir -p build-fuzz/collada-corpus && cp ../shared/testdata/collada/*.dae build-fuzz/collada-corpus/
-//   ./build-fuzz/tests/fuzz/collada_fuzz -max_total_time=300 build-fuzz/collada-corpus
-// Without clang, collada_tests drives this entry with a fixed set of mutations.
+// COLLADA documents: any bytes load or fail with a message. A loaded document keeps every index
+// inside its source, triangulates, evaluates its transforms and reduces its skins; its import
+// is a model tree that the .al writer and reader carry over unchanged.
 
-#include <cstddef>
-#include <cstdint>
 #include <cstdlib>
 #include <string>
+#include <vector>
 
+#include "FuzzEntries.h"
+#include "ModelTreeGuarantees.h"
+#include "model/ColladaImport.h"
 #include "platform/collada/Document.h"
 
 namespace
 {
-void WalkNode(const Collada::Node& aNode, int aDepth)
+void WalkNode(const ::Collada::Node& aNode, int aDepth)
 {
 	// The reader refuses instance cycles; a walk deeper than any document could nest means one slipped by.
 	if (aDepth > 10000)
@@ -27,7 +22,7 @@ void WalkNode(const Collada::Node& aNode, int aDepth)
 	}
 	volatile float sink = aNode.GetLocalMatrix().myMatrix[0];
 	(void)sink;
-	for (const Collada::Instance& instance : aNode.myInstances)
+	for (const ::Collada::Instance& instance : aNode.myInstances)
 	{
 		if (instance.myNode != nullptr)
 		{
@@ -41,9 +36,9 @@ void WalkNode(const Collada::Node& aNode, int aDepth)
 }
 } // namespace
 
-extern "C" int LLVMFuzzerTestOneInput(const uint8_t* someData, size_t aSize)
+int LumoraFuzz::Collada(const uint8_t* someData, size_t aSize)
 {
-	Collada::Document document;
+	::Collada::Document document;
 	std::string error;
 	if (!document.LoadFromMemory(someData, aSize, error))
 	{
@@ -53,20 +48,21 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* someData, size_t aSize)
 		}
 		return 0;
 	}
-	for (const Collada::Geometry& geometry : document.GetGeometries())
+	++ourAcceptedCount;
+	for (const ::Collada::Geometry& geometry : document.GetGeometries())
 	{
-		Collada::Mesh mesh = geometry.myMesh;
+		::Collada::Mesh mesh = geometry.myMesh;
 		const size_t triangles = mesh.GetTriangleCount();
 		mesh.Triangulate();
 		if (!mesh.IsTriangles() || mesh.GetTriangleCount() != triangles)
 		{
 			std::abort();
 		}
-		for (const Collada::PolygonSet& set : mesh.mySets)
+		for (const ::Collada::PolygonSet& set : mesh.mySets)
 		{
-			for (const Collada::Input& input : set.myInputs)
+			for (const ::Collada::Input& input : set.myInputs)
 			{
-				const Collada::Source* source = mesh.FindSource(input.mySource);
+				const ::Collada::Source* source = mesh.FindSource(input.mySource);
 				if (source == nullptr || input.myIndices.size() != set.GetTriangleCount() * 3)
 				{
 					std::abort();
@@ -81,9 +77,9 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* someData, size_t aSize)
 			}
 		}
 	}
-	for (const Collada::Controller& controller : document.GetControllers())
+	for (const ::Collada::Controller& controller : document.GetControllers())
 	{
-		Collada::Skin skin = controller.mySkin;
+		::Collada::Skin skin = controller.mySkin;
 		skin.ReduceInfluences(4, 0.0f);
 		for (const auto& influences : skin.myInfluences)
 		{
@@ -99,6 +95,12 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* someData, size_t aSize)
 		{
 			WalkNode(*node, 0);
 		}
+	}
+	std::vector<Zeph::AlTextureBinding> bindings;
+	const std::unique_ptr<Zeph::ModelNode> tree = Zeph::ColladaImport::Convert(document, bindings, error);
+	if (tree)
+	{
+		CheckModelTree(*tree, bindings);
 	}
 	return 0;
 }

@@ -1,0 +1,144 @@
+// Level folders: the five level files and the two catalogues, any bytes, loaded through the
+// editor facade with the log non-fatal (the tool that checks levels runs it so): loading may
+// report and leave things out, but never crash.
+//
+// The facade is made once, headless, in a scratch working directory whose data/ links to the
+// repository's data folders, except data/XML, which holds the files of each input.
+
+#include <array>
+#include <bitset>
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <string>
+#include <string_view>
+#include <system_error>
+#include <unistd.h>
+
+#include "FuzzEntries.h"
+#include "editor/LumoraWrapper.h"
+#include "platform/gpu/Device.h"
+
+namespace
+{
+namespace fs = std::filesystem;
+
+// In the order the parts of an input come in.
+constexpr std::array<const char*, 7> ourFiles = {
+    "data/XML/levels/fuzz/rooms.xml",  "data/XML/levels/fuzz/entities.xml",
+    "data/XML/levels/fuzz/lights.xml", "data/XML/levels/fuzz/nodegraph.xml",
+    "data/XML/levels/fuzz/decals.xml", "data/XML/EntityTypes.xml",
+    "data/XML/DecalTypes.xml",
+};
+
+struct LevelState
+{
+	bool myTriedFlag = false;
+	Lumora::LumoraWrapper* myFacade = nullptr;
+	fs::path myScratch;
+	fs::path myPreviousDirectory;
+};
+
+LevelState& State()
+{
+	static LevelState ourState;
+	return ourState;
+}
+
+bool HasGl()
+{
+	Gpu::Device probe;
+	if (!probe.Init(16, 16))
+	{
+		return false;
+	}
+	probe.Destroy();
+	return true;
+}
+
+Lumora::LumoraWrapper* Facade()
+{
+	LevelState& state = State();
+	if (state.myTriedFlag)
+	{
+		return state.myFacade;
+	}
+	state.myTriedFlag = true;
+	if (!HasGl())
+	{
+		return nullptr;
+	}
+	const fs::path source = fs::path(LUMORA_FUZZ_SOURCE_ROOT) / "data";
+	state.myScratch = fs::temp_directory_path() / ("lumora-fuzz-level-" + std::to_string(::getpid()));
+	fs::remove_all(state.myScratch);
+	fs::create_directories(state.myScratch / "data/XML/levels/fuzz");
+	for (const fs::directory_entry& entry : fs::directory_iterator(source))
+	{
+		if (entry.path().filename() != "XML")
+		{
+			fs::create_directory_symlink(entry.path(), state.myScratch / "data" / entry.path().filename());
+		}
+	}
+	fs::copy(source / "XML/EntityTypes.xml", state.myScratch / "data/XML/EntityTypes.xml");
+	fs::copy(source / "XML/DecalTypes.xml", state.myScratch / "data/XML/DecalTypes.xml");
+	state.myPreviousDirectory = fs::current_path();
+	fs::current_path(state.myScratch);
+	// A fuzzer ends by exit(), never through ShutDownLevel: the scratch folder (with a log of
+	// every input's reports) goes then. After a crash it stays, for a look at the log.
+	std::atexit([] {
+		std::error_code ignored;
+		fs::remove_all(State().myScratch, ignored);
+	});
+	Lumora::LumoraWrapper::SetFatalReportLevels(std::bitset<4>(0));
+	if (!Lumora::LumoraWrapper::Create(0, 64, 64))
+	{
+		std::abort(); // a context was there a moment ago
+	}
+	state.myFacade = Lumora::LumoraWrapper::GetInstance();
+	return state.myFacade;
+}
+} // namespace
+
+bool LumoraFuzz::LevelAvailable()
+{
+	return Facade() != nullptr;
+}
+
+void LumoraFuzz::ShutDownLevel()
+{
+	LevelState& state = State();
+	if (state.myFacade != nullptr)
+	{
+		Lumora::LumoraWrapper::ShutDown();
+		Lumora::LumoraWrapper::SetFatalReportLevels(std::bitset<4>(12));
+		fs::current_path(state.myPreviousDirectory);
+		std::error_code ignored;
+		fs::remove_all(state.myScratch, ignored);
+	}
+	state = LevelState();
+}
+
+int LumoraFuzz::Level(const uint8_t* someData, size_t aSize)
+{
+	Lumora::LumoraWrapper* facade = Facade();
+	if (facade == nullptr)
+	{
+		return 0;
+	}
+	std::string_view rest(reinterpret_cast<const char*>(someData), aSize);
+	for (const char* file : ourFiles)
+	{
+		if (rest.data() == nullptr)
+		{
+			std::error_code ignored;
+			fs::remove(file, ignored);
+			continue;
+		}
+		const size_t end = rest.find('\0');
+		std::ofstream(file, std::ios::binary | std::ios::trunc) << rest.substr(0, end);
+		rest = end == std::string_view::npos ? std::string_view() : rest.substr(end + 1);
+	}
+	facade->ReloadCatalogues();
+	facade->ParseLevel(u"fuzz");
+	return 0;
+}
