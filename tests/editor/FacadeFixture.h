@@ -15,6 +15,7 @@
 //       EXPECT_NE(LogText().find("..."), std::string::npos);
 //   }
 
+#include <array>
 #include <filesystem>
 #include <gtest/gtest.h>
 #include <string>
@@ -94,6 +95,13 @@ protected:
 
 	void ClickCentre() { myFacade->DoIntersection(0.5f * ourWidth, 0.5f * ourHeight); }
 
+	// The selected point light, spot light, node and decal (-1 for none), to compare at once.
+	std::array<int, 4> Selection() const
+	{
+		return {myFacade->GetSelectedPoint(), myFacade->GetSelectedSpot(), myFacade->GetSelectedNode(),
+		        myFacade->GetSelectedDecal()};
+	}
+
 private:
 	// One probe per process: a headless context that is made and dropped at once.
 	static bool HasGl()
@@ -152,4 +160,19 @@ private:
 	std::filesystem::path myPreviousDirectory;
 	bool myChangedDirectoryFlag = false;
 	Lumora::LumoraWrapper* myFacade = nullptr;
+};
+
+// Decals need the shipped catalogue's "brick", the type every new decal takes; without
+// it the test is skipped.
+class DecalFacadeTest : public FacadeTest
+{
+protected:
+	void SetUp() override
+	{
+		FacadeTest::SetUp();
+		if (!IsSkipped() && !HasFatalFailure() && Facade().GetDecalTypes().count("brick") == 0)
+		{
+			GTEST_SKIP() << "The decal type catalogue defines no \"brick\" type";
+		}
+	}
 };

@@ -237,18 +237,7 @@ TEST_F(PickingTest, QueriesReportTheSelectionOrLeaveTheRecordAlone)
 	EXPECT_EQ(spot.pos, (std::array<float, 3>{0.0f, 10.0f, 10.0f}));
 }
 
-class DecalPickingTest : public PickingTest
-{
-protected:
-	void SetUp() override
-	{
-		PickingTest::SetUp();
-		if (!IsSkipped() && Facade().GetDecalTypes().count("brick") == 0)
-		{
-			GTEST_SKIP() << "The decal type catalogue defines no \"brick\" type";
-		}
-	}
-};
+using DecalPickingTest = DecalFacadeTest;
 
 // The decal's box is plus and minus size across and 0.5 along z, whatever its direction.
 TEST_F(DecalPickingTest, DecalBoxIgnoresTheDirection)

@@ -1,12 +1,8 @@
 // Strings and records across the front-end boundary: UTF-16 in, UTF-8 inside; the
-// decal type change's low-byte conversion; what a new record holds.
+// decal type change's low-byte conversion.
 #include <gtest/gtest.h>
 #include <string>
 
-#include "editor/DecalStruct.h"
-#include "editor/DecalTypeStruct.h"
-#include "editor/PointLightStruct.h"
-#include "editor/SpotLightStruct.h"
 #include "editor/StringConversion.h"
 
 namespace
@@ -56,23 +52,4 @@ TEST(StringConversionTest, LowBytesKeepsTheLowEightBitsOfEachCharacter)
 	// U+0162 and U+4142 keep 0x62 ('b') and 0x42 ('B'); no multi-byte form appears.
 	EXPECT_EQ(Lumora::LowBytes(u"\u0162\u4142"), "bB");
 	EXPECT_EQ(Lumora::LowBytes(u"\u00e4"), "\xe4");
-}
-
-TEST(InteropRecordTest, NewRecordsAreZeroAndTheDecalHasNoTypeName)
-{
-	const Lumora::SpotLightStruct spot;
-	EXPECT_EQ(spot.pos.size(), 3u);
-	EXPECT_EQ(spot.col.size(), 4u);
-	EXPECT_EQ(spot.direction.size(), 3u);
-	EXPECT_EQ(spot.angles.size(), 2u);
-	for (const float value : {spot.falloff, spot.pos[2], spot.col[3], spot.direction[1], spot.angles[1]})
-	{
-		EXPECT_EQ(value, 0.0f);
-	}
-	const Lumora::PointLightStruct point;
-	EXPECT_EQ(point.falloff + point.pos[0] + point.col[3], 0.0f);
-	const Lumora::DecalStruct decal;
-	EXPECT_FALSE(decal.decalID.has_value());
-	EXPECT_EQ(decal.size + decal.depth, 0.0f);
-	EXPECT_TRUE(Lumora::DecalTypeStruct().decalTypes.empty());
 }
