@@ -269,25 +269,24 @@ Level LoadLevel(const std::string& aName)
 		level.myEntities.push_back({Text(record, "type", files[1]), Vector(record, "position", files[1]),
 		                            Vector(record, "rotation", files[1])});
 	}
-	for (const TiXmlElement* record : Records(documents[2], "point-lights", "point-light"))
+	for (const bool spotFlag : {false, true})
 	{
-		Light light;
-		light.myPosition = Vector(record, "position", files[2]);
-		light.myColor = Colour(record, files[2]);
-		light.myFalloff = Value(record, "falloff", files[2]);
-		level.myLights.push_back(light);
-	}
-	for (const TiXmlElement* record : Records(documents[2], "spot-lights", "spot-light"))
-	{
-		Light light;
-		light.mySpotFlag = true;
-		light.myPosition = Vector(record, "position", files[2]);
-		light.myColor = Colour(record, files[2]);
-		light.myFalloff = Value(record, "falloff", files[2]);
-		light.myDirection = Vector(record, "direction", files[2]);
-		light.myInner = Number(Child(record, "angles", files[2]), "inner", files[2]);
-		light.myOuter = Number(Child(record, "angles", files[2]), "outer", files[2]);
-		level.myLights.push_back(light);
+		for (const TiXmlElement* record : Records(documents[2], spotFlag ? "spot-lights" : "point-lights",
+		                                          spotFlag ? "spot-light" : "point-light"))
+		{
+			Light light;
+			light.mySpotFlag = spotFlag;
+			light.myPosition = Vector(record, "position", files[2]);
+			light.myColor = Colour(record, files[2]);
+			light.myFalloff = Value(record, "falloff", files[2]);
+			if (spotFlag)
+			{
+				light.myDirection = Vector(record, "direction", files[2]);
+				light.myInner = Number(Child(record, "angles", files[2]), "inner", files[2]);
+				light.myOuter = Number(Child(record, "angles", files[2]), "outer", files[2]);
+			}
+			level.myLights.push_back(light);
+		}
 	}
 	const TiXmlElement* graph = Child(documents[3].RootElement(), "node-graph", files[3]);
 	const TiXmlElement* nodes = Child(graph, "nodes", files[3]);
@@ -363,13 +362,11 @@ Level LoadLevel(const std::string& aName)
 		}
 		// Enclosing is not enough for the reflections, which project onto the room's box: it must
 		// be the shell's own bounds.
-		for (int axis = 0; axis < 3; ++axis)
-		{
-			EXPECT_NEAR(Component(home->myBox.myMin, axis), Component(bounds.myMin, axis), ourTolerance)
-			    << aName << ": room " << home->myId << " is larger than its shell";
-			EXPECT_NEAR(Component(home->myBox.myMax, axis), Component(bounds.myMax, axis), ourTolerance)
-			    << aName << ": room " << home->myId << " is larger than its shell";
-		}
+		EXPECT_TRUE(home->myBox.Contains(bounds.myMin, -ourTolerance) &&
+		            home->myBox.Contains(bounds.myMax, -ourTolerance) &&
+		            bounds.Contains(home->myBox.myMin, -ourTolerance) &&
+		            bounds.Contains(home->myBox.myMax, -ourTolerance))
+		    << aName << ": room " << home->myId << " is larger than its shell";
 		++home->myShells;
 		for (const Content::DoorOpening& door : Content::RoomDoors(*shape))
 		{
