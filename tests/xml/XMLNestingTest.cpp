@@ -42,7 +42,9 @@ TEST(XMLNestingScan, CountsOnlyWhatTinyXmlEntersAndNamesTheLine)
 	    {"<a><b z=1/><b/></a>", 0},
 	    // '<' before anything but a letter, '_' or a UTF-8 byte opens no element.
 	    {"<a><b>< c><1><_><\xc3\xa9>", 1},
-	    {"<a><b>\0<c><d>", 0},
+	    {std::string("<a><b>\0<c><d>", 12), 0},
+	    // End tags outside every element close nothing.
+	    {"</a></a></a><a><b><c>", 1},
 	};
 	for (const auto& [text, line] : rows)
 	{

@@ -31,9 +31,10 @@ public:
 			}
 			else if (StartsWith("</"))
 			{
-				// A mismatched end tag stops TinyXML's parse: counting it down never hides a level
-				// that the parser would still enter.
-				--depth;
+				// Inside an element a mismatched end tag stops TinyXML's parse, so counting it down
+				// never hides a level the parser would still enter. Outside every element TinyXML
+				// passes over it as unknown markup: it closes nothing there.
+				depth = depth > 0 ? depth - 1 : 0;
 				SkipPast(">");
 			}
 			else if (OpensElement())
