@@ -187,7 +187,6 @@ void LumoraWrapper::RemoveEdgeAt(int anIndex)
 
 	AI::NGEdge* last = &myEdges.Last();
 	myEdges.RemoveCyclicAtIndex(anIndex);
-	KeptContent::RemovedCyclic(myKept.myEdgeParts, anIndex);
 	if (last == edge)
 	{
 		return;
@@ -215,7 +214,6 @@ void LumoraWrapper::AddPointLight()
 	light.myColor = Vector4<float>(1.0f, 1.0f, 1.0f, 1.0f);
 	light.myFalloff = 0.5f;
 	myEnvironmentPointLights.Add(light);
-	KeptContent::Added(myKept.myPointLightParts, myEnvironmentPointLights.Count());
 	myCurrentSelectedPoint = myEnvironmentPointLights.Count() - 1;
 	myCurrentSelectedSpot = -1;
 	Release();
@@ -238,7 +236,6 @@ void LumoraWrapper::AddSpotLight()
 	light.myOrientation.SetRotation(forward, up, right);
 	light.myOrientation.SetPosition(InFrontOfCamera(ourPlacementDistance));
 	myEnvironmentSpotLights.Add(light);
-	KeptContent::Added(myKept.mySpotLightParts, myEnvironmentSpotLights.Count());
 	myCurrentSelectedPoint = -1;
 	myCurrentSelectedSpot = myEnvironmentSpotLights.Count() - 1;
 	Release();
@@ -269,7 +266,6 @@ void LumoraWrapper::AddDecal()
 	// Facing the camera.
 	decal.myNorm = -myCameraInstance->GetActualOrientation().GetForward();
 	myDecals.Add(decal);
-	KeptContent::Added(myKept.myDecalParts, myDecals.Count());
 	myCurrentSelectedPoint = -1;
 	myCurrentSelectedSpot = -1;
 	myCurrentSelectedDecal = myDecals.Count() - 1;
@@ -289,7 +285,6 @@ void LumoraWrapper::AddPathNode()
 		return;
 	}
 	myNodes.Add(AI::NGNode());
-	KeptContent::Added(myKept.myNodeParts, myNodes.Count());
 	AI::NGNode& node = myNodes.Last();
 	node.SetID(TakeNodeID());
 	node.InitDebugInstance();
@@ -320,7 +315,6 @@ void LumoraWrapper::AddPathNode()
 			AI::NGEdge edge;
 			edge.InitDebugLine();
 			myEdges.Add(edge);
-			KeptContent::Added(myKept.myEdgeParts, myEdges.Count());
 			AI::NGEdge& stored = myEdges.Last();
 			stored.Connect(&previous, &node);
 			previous.AddEdge(&stored);
@@ -338,9 +332,7 @@ void LumoraWrapper::CopyPointLight()
 	{
 		return;
 	}
-	// A copy is a new light: what the file kept with the original stays with the original.
 	myEnvironmentPointLights.Add(myEnvironmentPointLights[myCurrentSelectedPoint]);
-	KeptContent::Added(myKept.myPointLightParts, myEnvironmentPointLights.Count());
 	myCurrentSelectedPoint = -1;
 	Release();
 }
@@ -352,7 +344,6 @@ void LumoraWrapper::CopySpotLight()
 		return;
 	}
 	myEnvironmentSpotLights.Add(myEnvironmentSpotLights[myCurrentSelectedSpot]);
-	KeptContent::Added(myKept.mySpotLightParts, myEnvironmentSpotLights.Count());
 	myCurrentSelectedSpot = -1;
 	Release();
 }
@@ -364,7 +355,6 @@ void LumoraWrapper::CopyDecal()
 		return;
 	}
 	myDecals.Add(myDecals[myCurrentSelectedDecal]);
-	KeptContent::Added(myKept.myDecalParts, myDecals.Count());
 	myCurrentSelectedDecal = -1;
 	Release();
 }
@@ -376,7 +366,6 @@ void LumoraWrapper::RemoveSelectedPointLight()
 		return;
 	}
 	myEnvironmentPointLights.RemoveCyclicAtIndex(myCurrentSelectedPoint);
-	KeptContent::RemovedCyclic(myKept.myPointLightParts, myCurrentSelectedPoint);
 	myCurrentSelectedPoint = -1;
 	Release();
 }
@@ -388,7 +377,6 @@ void LumoraWrapper::RemoveSelectedSpotLight()
 		return;
 	}
 	myEnvironmentSpotLights.RemoveCyclicAtIndex(myCurrentSelectedSpot);
-	KeptContent::RemovedCyclic(myKept.mySpotLightParts, myCurrentSelectedSpot);
 	myCurrentSelectedSpot = -1;
 	Release();
 }
@@ -400,7 +388,6 @@ void LumoraWrapper::RemoveSelectedDecal()
 		return;
 	}
 	myDecals.RemoveCyclicAtIndex(myCurrentSelectedDecal);
-	KeptContent::RemovedCyclic(myKept.myDecalParts, myCurrentSelectedDecal);
 	myCurrentSelectedDecal = -1;
 	Release();
 }
@@ -437,7 +424,6 @@ void LumoraWrapper::RemoveSelectedNode()
 		RemoveEdgeAt(index);
 	}
 	node->DestroyDebugInstance();
-	KeptContent::RemovedCyclic(myKept.myNodeParts, myNodes.Count() - 1);
 	myNodes.RemoveLast();
 	// IDs are not handed out again: the counter keeps counting.
 	myCurrentSelectedNode = -1;

@@ -267,8 +267,8 @@ private:
 	std::map<std::string, bool> myEntityShadowCasterBank;
 	std::map<std::string, DecalType> myDecalTypes;
 	GrowingArray<Zeph::DecalData> myDecals{ourArraySize, ourArraySize, true};
-	// What the loaded level's lights, path graph and decals held beyond what the arrays
-	// hold; the per-record lists run beside the arrays (src/level/KeptContent.h).
+	// What the sections of the loaded level's lights, path graph and decals held beside the
+	// records in the arrays (src/level/KeptContent.h).
 	KeptContent myKept;
 	Zeph::Texture* myTexture = nullptr;
 	Zeph::Texture* myNormTexture = nullptr;

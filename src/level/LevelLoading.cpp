@@ -4,10 +4,10 @@
 // Every value a record requires is read through the cursor, whose report of a missing file,
 // element or attribute ends the editor under the facade's log. What a level may lack without
 // harm (a whole section, an edge's node, a decal's type) is passed over, with a message where
-// the scene lacks something that the file holds. Nothing of the three files that the editor
-// rewrites is lost, though: what the readers do not take in (records left out, comments,
-// unknown elements and attributes) goes to the facade's kept content, which the next save
-// writes back (KeptContent.h).
+// the scene lacks something that the file holds. What the sections of the three files that the
+// editor rewrites hold beside the records taken (records left out, comments, unknown elements)
+// goes to the facade's kept content, which the next save writes back (KeptContent.h); a record
+// taken is the editor's, and is written back from its data alone.
 #include "editor/LumoraWrapper.h"
 
 #include <algorithm>
@@ -15,7 +15,6 @@
 #include <cmath>
 #include <map>
 #include <set>
-#include <span>
 #include <string>
 #include <vector>
 
@@ -59,52 +58,6 @@ std::string LevelFolder(const std::string& aLevel)
 	return "data/XML/levels/" + aLevel;
 }
 
-// A value that a reader takes from a record: attribute myName of the record's first child
-// myTag, or of the record itself when myTag is empty. An empty name is the first attribute,
-// whatever it is called (a single value).
-struct ReadValue
-{
-	const char* myTag;
-	const char* myName;
-};
-
-constexpr ReadValue ourPointLightValues[] = {{"position", "x"}, {"position", "y"}, {"position", "z"},
-                                             {"color", "r"},    {"color", "g"},    {"color", "b"},
-                                             {"color", "a"},    {"falloff", ""}};
-constexpr ReadValue ourSpotLightValues[] = {
-    {"position", "x"},  {"position", "y"},   {"position", "z"},  {"color", "r"},     {"color", "g"},
-    {"color", "b"},     {"color", "a"},      {"falloff", ""},    {"direction", "x"}, {"direction", "y"},
-    {"direction", "z"}, {"angles", "inner"}, {"angles", "outer"}};
-constexpr ReadValue ourNodeValues[] = {{"", "id"}, {"position", "x"}, {"position", "y"}, {"position", "z"}};
-constexpr ReadValue ourEdgeValues[] = {
-    {"connections", "firstID"}, {"connections", "secondID"}, {"distance", ""}};
-constexpr ReadValue ourDecalValues[] = {
-    {"decal-type", ""}, {"position", "x"}, {"position", "y"}, {"position", "z"}, {"norm", "x"},
-    {"norm", "y"},      {"norm", "z"},     {"color", "r"},    {"color", "g"},    {"color", "b"},
-    {"color", "a"},     {"size", ""},      {"depth", ""}};
-
-// What the record under the cursor holds beyond someValues, as kept text: empty when the
-// record holds nothing else. Each child that was read stays, emptied of the values read, as
-// the place where the saver's child goes (XMLElement::AddKept).
-std::string PartsBeyond(const XML& aXML, std::span<const ReadValue> someValues)
-{
-	XMLElement record("record");
-	if (!aXML.CopyCurrentElement(record))
-	{
-		return {};
-	}
-	std::vector<std::string> tags;
-	for (const ReadValue& value : someValues)
-	{
-		record.RemoveValue(value.myTag, value.myName);
-		if (*value.myTag != '\0' && std::find(tags.begin(), tags.end(), value.myTag) == tags.end())
-		{
-			tags.emplace_back(value.myTag);
-		}
-	}
-	return record.HasContentBeyond(tags) ? record.GetText() : std::string();
-}
-
 // The section under the cursor without the records named aRecord that the reader took (flagged
 // in document order), as kept text.
 std::string SectionBeyond(const XML& aXML, const char* aRecord, const std::vector<bool>& someTakenFlags)
@@ -114,7 +67,7 @@ std::string SectionBeyond(const XML& aXML, const char* aRecord, const std::vecto
 	{
 		return {};
 	}
-	section.RemoveChildren(aRecord, someTakenFlags, "");
+	section.RemoveChildren(aRecord, someTakenFlags);
 	return section.GetText();
 }
 
@@ -304,8 +257,6 @@ void LumoraWrapper::ParseLights(const std::string& aPath)
 	myEnvironmentSpotLights.RemoveAll();
 	myKept.myPointLights.clear();
 	myKept.mySpotLights.clear();
-	myKept.myPointLightParts.clear();
-	myKept.mySpotLightParts.clear();
 
 	XML xml(aPath);
 	// Either section may be missing: it holds no lights. Every light record is taken.
@@ -321,7 +272,6 @@ void LumoraWrapper::ParseLights(const std::string& aPath)
 				light.myColor = xml.GetVector4Attribute("color");
 				light.myFalloff = xml.GetChildAttribute<float>("falloff", "");
 				myEnvironmentPointLights.Add(light);
-				myKept.myPointLightParts.push_back(PartsBeyond(xml, ourPointLightValues));
 				takenFlags.push_back(true);
 			} while (xml.GoToNextSibling("point-light"));
 			xml.ExitChild();
@@ -342,7 +292,6 @@ void LumoraWrapper::ParseLights(const std::string& aPath)
 			light.myAngles.y = xml.GetChildAttribute<float>("angles", "outer");
 			light.myColor = xml.GetVector4Attribute("color");
 			myEnvironmentSpotLights.Add(light);
-			myKept.mySpotLightParts.push_back(PartsBeyond(xml, ourSpotLightValues));
 			takenFlags.push_back(true);
 		} while (xml.GoToNextSibling("spot-light"));
 		xml.ExitChild();
@@ -366,9 +315,9 @@ void LumoraWrapper::ParseNodes(const std::string& aPath)
 		myNodes[index].DestroyDebugInstance();
 	}
 	myNodes.RemoveAll();
+	myKept.myNodes.clear();
+	myKept.myEdges.clear();
 	myKept.myNodeGraph.clear();
-	myKept.myNodeParts.clear();
-	myKept.myEdgeParts.clear();
 	myKept.myNodeIDs.clear();
 
 	XML xml(aPath);
@@ -397,7 +346,6 @@ void LumoraWrapper::ParseNodes(const std::string& aPath)
 			node.InitDebugInstance();
 			node.SetID(xml.GetAttribute<int>("id"));
 			node.SetPosition(xml.GetVector3Attribute("position"));
-			myKept.myNodeParts.push_back(PartsBeyond(xml, ourNodeValues));
 			takenNodeFlags.push_back(true);
 		} while (xml.GoToNextSibling("node"));
 		xml.ExitChild();
@@ -499,7 +447,6 @@ void LumoraWrapper::ParseNodes(const std::string& aPath)
 			edge.Connect(first, second);
 			first->AddEdge(&edge);
 			second->AddEdge(&edge);
-			myKept.myEdgeParts.push_back(PartsBeyond(xml, ourEdgeValues));
 			takenEdgeFlags.push_back(true);
 		} while (xml.GoToNextSibling("edge"));
 		xml.ExitChild();
@@ -511,12 +458,20 @@ void LumoraWrapper::ParseNodes(const std::string& aPath)
 		                  std::to_string(refusedEdges) + " edges were left out (kept in the file)");
 	}
 
-	if (xml.GoToElement("node-graph", "", ""))
+	if (xml.GoToElement("node-graph", "nodes", ""))
 	{
-		XMLElement graph("node-graph");
-		xml.CopyCurrentElement(graph);
-		graph.RemoveChildren("node", takenNodeFlags, "nodes");
-		graph.RemoveChildren("edge", takenEdgeFlags, "edges");
+		myKept.myNodes = SectionBeyond(xml, "node", takenNodeFlags);
+	}
+	if (xml.GoToElement("node-graph", "edges", ""))
+	{
+		myKept.myEdges = SectionBeyond(xml, "edge", takenEdgeFlags);
+	}
+	// The first "nodes" and "edges" are the ones read, and the saver writes them anew.
+	XMLElement graph("node-graph");
+	if (xml.GoToElement("node-graph", "", "") && xml.CopyCurrentElement(graph))
+	{
+		graph.RemoveChildren("nodes", {true});
+		graph.RemoveChildren("edges", {true});
 		myKept.myNodeGraph = graph.GetText();
 	}
 }
@@ -542,7 +497,6 @@ void LumoraWrapper::ParseDecals(const std::string& aPath)
 {
 	myDecals.RemoveAll();
 	myKept.myDecals.clear();
-	myKept.myDecalParts.clear();
 
 	XML xml(aPath);
 	std::vector<bool> takenFlags;
@@ -576,7 +530,6 @@ void LumoraWrapper::ParseDecals(const std::string& aPath)
 			decal.myTexture = type->second.myTexture;
 			decal.myNormalTexture = type->second.myNormalTexture;
 			myDecals.Add(decal);
-			myKept.myDecalParts.push_back(PartsBeyond(xml, ourDecalValues));
 			takenFlags.push_back(true);
 		} while (xml.GoToNextSibling("decal"));
 		xml.ExitChild();

@@ -1,9 +1,9 @@
 // Writing back what the designer edits: lights with the path graph, and decals. Each saver
-// loads the level's file, empties the sections it owns (making any that the file lacks),
-// appends one record per object and writes the whole document back (through a temporary
-// renamed over the file), so comments and sections that belong to others stay as they were.
-// What the loader did not take in from those sections (the facade's kept content) goes back
-// too: unknown attributes and children into their records, the rest after the records.
+// loads the level's file, empties the sections it owns, appends one record per object and
+// writes the whole document back (through a temporary renamed over the file), so comments and
+// sections that belong to others stay as they were. Each record is written from the editor's
+// data alone; what a section held beside its records (the facade's kept content: comments,
+// foreign elements, records the loader left out) goes back after the records.
 #include "editor/LumoraWrapper.h"
 
 #include <cstdio>
@@ -87,18 +87,7 @@ void AddVector4Child(XMLElement& aRecord, const char* aTag, const Vector4<float>
 	aRecord.InsertElement(child);
 }
 
-// Folds a record's kept content (XMLElement::GetText of it) into the record.
-void AddKeptText(XMLElement& aRecord, const std::string& aText)
-{
-	XMLElement kept("kept");
-	if (!aText.empty() && kept.SetText(aText))
-	{
-		aRecord.AddKept(kept);
-	}
-}
-
-// Appends what a section kept at the cursor, after the records: as it stood, never folded into a
-// record (a decal left out is no part of the first decal written).
+// Appends what a section kept at the cursor, after the records, as it stood.
 void InsertKeptText(XML& anXML, const std::string& aText)
 {
 	XMLElement kept("kept");
@@ -108,26 +97,46 @@ void InsertKeptText(XML& anXML, const std::string& aText)
 	}
 }
 
-// The cursor on the section under the root. A file that lacks it (one written by hand with
-// only the spot lights, say) gets it, empty, at the end of the root.
-void GoToSection(XML& anXML, const char* aSection)
+// The cursor on the section under the root, emptied. A file that lacks the section is not
+// reshaped: the walk leaves no cursor, RemoveChildren reports it ("No node set to remove
+// children from", fatal under the facade's log) and the answer is false, so that a caller
+// whose log lets it go on leaves the file as it was.
+bool EmptySection(XML& anXML, const char* aSection)
 {
-	if (anXML.GoToElement(aSection, "", ""))
+	const bool foundFlag = anXML.GoToElement(aSection, "", "");
+	anXML.RemoveChildren();
+	return foundFlag;
+}
+
+void InsertPointLights(XML& anXML, const GrowingArray<Zeph::PointLightData>& someLights)
+{
+	for (int index = 0; index < someLights.Count(); ++index)
 	{
-		return;
+		const Zeph::PointLightData& light = someLights[index];
+		XMLElement record("point-light");
+		AddVector3Child(record, "position", light.myPosition);
+		AddVector4Child(record, "color", light.myColor);
+		AddValueChild(record, "falloff", light.myFalloff, "value");
+		anXML.InsertElement(record, false);
 	}
-	const XMLElement section(aSection);
-	// Onto the root element: up from its first child, or by its name when it has no child.
-	if (anXML.GoToElement("", "", ""))
+}
+
+void InsertSpotLights(XML& anXML, const GrowingArray<Zeph::SpotLightData>& someLights)
+{
+	for (int index = 0; index < someLights.Count(); ++index)
 	{
-		anXML.ExitChild();
-		anXML.InsertElement(section, false);
+		const Zeph::SpotLightData& light = someLights[index];
+		XMLElement record("spot-light");
+		AddVector3Child(record, "position", light.myOrientation.GetPosition());
+		AddVector4Child(record, "color", light.myColor);
+		AddValueChild(record, "falloff", light.myFalloff, "value");
+		AddVector3Child(record, "direction", light.myOrientation.GetForward());
+		XMLElement angles("angles");
+		angles.AddAttribute("inner", light.myAngles.x);
+		angles.AddAttribute("outer", light.myAngles.y);
+		record.InsertElement(angles);
+		anXML.InsertElement(record, false);
 	}
-	else
-	{
-		anXML.InsertElementAtRoot(section, false);
-	}
-	anXML.GoToElement(aSection, "", "");
 }
 } // namespace
 
@@ -140,46 +149,23 @@ void LumoraWrapper::SaveLights(const std::u16string& aLevel)
 	Claim();
 	CreateIfMissing(path, {"point-lights", "spot-lights"});
 	{
+		// Both sections or nothing: a file lacking either is written not at all.
 		XML xml(path);
-		GoToSection(xml, "point-lights");
-		xml.RemoveChildren();
-		XMLElement points("point-lights");
-		for (int index = 0; index < myEnvironmentPointLights.Count(); ++index)
+		if (EmptySection(xml, "point-lights"))
 		{
-			const Zeph::PointLightData& light = myEnvironmentPointLights[index];
-			XMLElement record("point-light");
-			AddVector3Child(record, "position", light.myPosition);
-			AddVector4Child(record, "color", light.myColor);
-			AddValueChild(record, "falloff", light.myFalloff, "value");
-			AddKeptText(record, KeptContent::PartsOf(myKept.myPointLightParts, index));
-			points.InsertElement(record);
+			InsertPointLights(xml, myEnvironmentPointLights);
+			InsertKeptText(xml, myKept.myPointLights);
+			if (EmptySection(xml, "spot-lights"))
+			{
+				InsertSpotLights(xml, myEnvironmentSpotLights);
+				InsertKeptText(xml, myKept.mySpotLights);
+				// The lights are on disk before the path graph's file is opened.
+				xml.SaveFile();
+			}
 		}
-		xml.InsertChildrenOf(points, false);
-		InsertKeptText(xml, myKept.myPointLights);
-
-		GoToSection(xml, "spot-lights");
-		xml.RemoveChildren();
-		XMLElement spots("spot-lights");
-		for (int index = 0; index < myEnvironmentSpotLights.Count(); ++index)
-		{
-			const Zeph::SpotLightData& light = myEnvironmentSpotLights[index];
-			XMLElement record("spot-light");
-			AddVector3Child(record, "position", light.myOrientation.GetPosition());
-			AddVector4Child(record, "color", light.myColor);
-			AddValueChild(record, "falloff", light.myFalloff, "value");
-			AddVector3Child(record, "direction", light.myOrientation.GetForward());
-			XMLElement angles("angles");
-			angles.AddAttribute("inner", light.myAngles.x);
-			angles.AddAttribute("outer", light.myAngles.y);
-			record.InsertElement(angles);
-			AddKeptText(record, KeptContent::PartsOf(myKept.mySpotLightParts, index));
-			spots.InsertElement(record);
-		}
-		xml.InsertChildrenOf(spots, false);
-		InsertKeptText(xml, myKept.mySpotLights);
-		// The lights are on disk before the path graph's file is opened.
-		xml.SaveFile();
 	}
+	// Each file stands alone: where the log let a failed lights file pass, the path graph
+	// is still written.
 	SaveNodes(level);
 	Release();
 }
@@ -190,8 +176,10 @@ void LumoraWrapper::SaveNodes(const std::string& aLevel)
 	const std::string path = LevelFile(aLevel, "nodegraph.xml");
 	CreateIfMissing(path, {"node-graph"});
 	XML xml(path);
-	GoToSection(xml, "node-graph");
-	xml.RemoveChildren();
+	if (!EmptySection(xml, "node-graph"))
+	{
+		return;
+	}
 
 	XMLElement nodes("nodes");
 	nodes.AddAttribute("number-of-nodes", myNodes.Count());
@@ -201,9 +189,9 @@ void LumoraWrapper::SaveNodes(const std::string& aLevel)
 		XMLElement record("node");
 		record.AddAttribute("id", node.GetID());
 		AddVector3Child(record, "position", node.GetPosition());
-		AddKeptText(record, KeptContent::PartsOf(myKept.myNodeParts, index));
 		nodes.InsertElement(record);
 	}
+	xml.InsertElement(nodes, false);
 
 	XMLElement edges("edges");
 	edges.AddAttribute("number-of-edges", myEdges.Count());
@@ -216,17 +204,18 @@ void LumoraWrapper::SaveNodes(const std::string& aLevel)
 		connections.AddAttribute("secondID", edge.GetSecondConnectionID());
 		record.InsertElement(connections);
 		AddValueChild(record, "distance", edge.GetDistance(), "value");
-		AddKeptText(record, KeptContent::PartsOf(myKept.myEdgeParts, index));
 		edges.InsertElement(record);
 	}
-	// The kept graph holds the file's "nodes" and "edges" (their records left out, comments,
-	// unknown attributes), which fold into the two written here, and whatever else stood in
-	// "node-graph".
-	XMLElement graph("node-graph");
-	graph.InsertElement(nodes);
-	graph.InsertElement(edges);
-	AddKeptText(graph, myKept.myNodeGraph);
-	xml.InsertChildrenOf(graph, false);
+	xml.InsertElement(edges, false);
+
+	// The kept children of the file's "nodes" and "edges" (records left out, comments) follow the
+	// records written; the graph's other children follow both.
+	xml.GoToElement("node-graph", "nodes", "");
+	InsertKeptText(xml, myKept.myNodes);
+	xml.GoToElement("node-graph", "edges", "");
+	InsertKeptText(xml, myKept.myEdges);
+	xml.GoToElement("node-graph", "", "");
+	InsertKeptText(xml, myKept.myNodeGraph);
 	xml.SaveFile();
 }
 
@@ -237,25 +226,23 @@ void LumoraWrapper::SaveDecals(const std::u16string& aLevel)
 	CreateIfMissing(path, {"decals"});
 	{
 		XML xml(path);
-		GoToSection(xml, "decals");
-		xml.RemoveChildren();
-		XMLElement section("decals");
-		for (int index = 0; index < myDecals.Count(); ++index)
+		if (EmptySection(xml, "decals"))
 		{
-			const Zeph::DecalData& decal = myDecals[index];
-			XMLElement record("decal");
-			AddValueChild(record, "decal-type", decal.myTypeId, "id");
-			AddVector3Child(record, "position", decal.myPosition);
-			AddVector3Child(record, "norm", decal.myNorm);
-			AddVector4Child(record, "color", decal.myColor);
-			AddValueChild(record, "size", decal.mySize, "value");
-			AddValueChild(record, "depth", decal.myDepth, "value");
-			AddKeptText(record, KeptContent::PartsOf(myKept.myDecalParts, index));
-			section.InsertElement(record);
+			for (int index = 0; index < myDecals.Count(); ++index)
+			{
+				const Zeph::DecalData& decal = myDecals[index];
+				XMLElement record("decal");
+				AddValueChild(record, "decal-type", decal.myTypeId, "id");
+				AddVector3Child(record, "position", decal.myPosition);
+				AddVector3Child(record, "norm", decal.myNorm);
+				AddVector4Child(record, "color", decal.myColor);
+				AddValueChild(record, "size", decal.mySize, "value");
+				AddValueChild(record, "depth", decal.myDepth, "value");
+				xml.InsertElement(record, false);
+			}
+			InsertKeptText(xml, myKept.myDecals);
+			xml.SaveFile();
 		}
-		xml.InsertChildrenOf(section, false);
-		InsertKeptText(xml, myKept.myDecals);
-		xml.SaveFile();
 	}
 	Release();
 }

@@ -1,9 +1,7 @@
 #include "xml/XMLElement.h"
 
-#include <algorithm>
 #include <cstdio>
 #include <locale>
-#include <set>
 #include <sstream>
 
 #include <tinyxml.h>
@@ -19,19 +17,6 @@ std::string FloatText(float aValue)
 	stream.imbue(std::locale::classic());
 	stream << aValue;
 	return stream.str();
-}
-
-// Appends a copy of every attribute of aSource that aTarget does not hold yet.
-void AddMissingAttributes(TiXmlElement& aTarget, const TiXmlElement& aSource)
-{
-	for (const TiXmlAttribute* attribute = aSource.FirstAttribute(); attribute != nullptr;
-	     attribute = attribute->Next())
-	{
-		if (aTarget.Attribute(attribute->Name()) == nullptr)
-		{
-			aTarget.SetAttribute(attribute->Name(), attribute->Value());
-		}
-	}
 }
 } // namespace
 
@@ -143,93 +128,19 @@ bool XMLElement::SetText(const std::string& aText)
 	return true;
 }
 
-void XMLElement::RemoveValue(const std::string& aTag, const std::string& aName)
+void XMLElement::RemoveChildren(const std::string& aTag, const std::vector<bool>& someFlags)
 {
-	TiXmlElement* holder = aTag.empty() ? myElement : myElement->FirstChildElement(aTag);
-	if (holder == nullptr)
-	{
-		return;
-	}
-	if (!aName.empty())
-	{
-		holder->RemoveAttribute(aName);
-	}
-	else if (const TiXmlAttribute* first = holder->FirstAttribute())
-	{
-		const std::string name = first->Name();
-		holder->RemoveAttribute(name);
-	}
-}
-
-void XMLElement::RemoveChildren(const std::string& aTag, const std::vector<bool>& someFlags,
-                                const std::string& aParentTag)
-{
-	TiXmlNode* parent = aParentTag.empty() ? myElement : myElement->FirstChild(aParentTag);
-	if (parent == nullptr)
-	{
-		return;
-	}
 	// Matched by name as the cursor's walk matches them, so the places agree with the reader's.
 	size_t place = 0;
-	TiXmlNode* child = parent->FirstChild(aTag);
+	TiXmlNode* child = myElement->FirstChild(aTag);
 	while (child != nullptr)
 	{
 		TiXmlNode* next = child->NextSibling(aTag);
 		if (place < someFlags.size() && someFlags[place])
 		{
-			parent->RemoveChild(child);
+			myElement->RemoveChild(child);
 		}
 		++place;
 		child = next;
-	}
-}
-
-bool XMLElement::HasContentBeyond(const std::vector<std::string>& someTags) const
-{
-	if (myElement->FirstAttribute() != nullptr)
-	{
-		return true;
-	}
-	std::set<std::string> seen;
-	for (const TiXmlNode* child = myElement->FirstChild(); child != nullptr; child = child->NextSibling())
-	{
-		const TiXmlElement* element = child->ToElement();
-		if (element == nullptr || element->FirstAttribute() != nullptr || element->FirstChild() != nullptr)
-		{
-			return true;
-		}
-		const std::string& name = element->ValueStr();
-		const bool listedFlag = std::find(someTags.begin(), someTags.end(), name) != someTags.end();
-		if (!listedFlag || !seen.insert(name).second)
-		{
-			return true;
-		}
-	}
-	return false;
-}
-
-void XMLElement::AddKept(const XMLElement& aKept)
-{
-	AddMissingAttributes(*myElement, *aKept.myElement);
-	// Only the first kept child of a name stands for the child that the reader read; a second
-	// one was never read and goes back as it was.
-	std::set<std::string> seen;
-	for (const TiXmlNode* child = aKept.myElement->FirstChild(); child != nullptr;
-	     child = child->NextSibling())
-	{
-		const TiXmlElement* element = child->ToElement();
-		const bool firstFlag = element != nullptr && seen.insert(element->ValueStr()).second;
-		TiXmlElement* target = firstFlag ? myElement->FirstChildElement(element->ValueStr()) : nullptr;
-		if (target == nullptr)
-		{
-			myElement->InsertEndChild(*child);
-			continue;
-		}
-		AddMissingAttributes(*target, *element);
-		for (const TiXmlNode* grandchild = element->FirstChild(); grandchild != nullptr;
-		     grandchild = grandchild->NextSibling())
-		{
-			target->InsertEndChild(*grandchild);
-		}
 	}
 }

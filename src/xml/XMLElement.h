@@ -11,14 +11,14 @@
 // leaves up; changing an XMLElement after inserting it does not reach the copy. The object owns
 // its element and is never linked into a document itself.
 //
-// Kept content. What a reader did not take from a record (attributes and children it does not
-// know, comments) travels to the next save as an element of its own: the reader copies the
-// record (XML::CopyCurrentElement), takes out the values it read with RemoveValue, and keeps
-// the rest as text; the saver builds the record anew and folds the kept rest back in:
+// Kept content. What a section held beside the records a reader took (comments, foreign
+// elements, records left out) travels to the next save as text: the reader copies the section
+// (XML::CopyCurrentElement), takes out the records it read with RemoveChildren, and keeps the
+// rest with GetText; the saver, after writing the records, appends the kept children back:
 //
-//   XMLElement kept("point-light");
-//   kept.SetText(someKeptText);
-//   record.AddKept(kept);        // unknown attributes and children return beside the new values
+//   XMLElement kept("kept");
+//   if (kept.SetText(someKeptText))
+//       xml.InsertChildrenOf(kept, false);
 
 #include <concepts>
 #include <string>
@@ -60,20 +60,8 @@ public:
 	// with the one the text holds (false, and nothing changed, when it holds none).
 	std::string GetText() const;
 	bool SetText(const std::string& aText);
-	// Takes out attribute aName of the first child named aTag, or of this element when aTag is
-	// empty; an empty aName takes out the first attribute (how single values are read).
-	void RemoveValue(const std::string& aTag, const std::string& aName);
-	// Takes out the children named aTag whose place among them (0, 1, ...) is flagged, from this
-	// element or, when aParentTag is not empty, from its first child of that name.
-	void RemoveChildren(const std::string& aTag, const std::vector<bool>& someFlags,
-	                    const std::string& aParentTag);
-	// Whether anything is left beyond an empty first child for each of someTags: an attribute, a
-	// comment, a second child of a name, or a child of another name.
-	bool HasContentBeyond(const std::vector<std::string>& someTags) const;
-	// Folds kept content back in: its attributes that this element lacks; then its first child
-	// of each name that this element also has gives that child the attributes it lacks and
-	// appends its children there; every other child (comments too) is appended here.
-	void AddKept(const XMLElement& aKept);
+	// Takes out the children named aTag whose place among them (0, 1, ...) is flagged.
+	void RemoveChildren(const std::string& aTag, const std::vector<bool>& someFlags);
 
 private:
 	friend class XML;
