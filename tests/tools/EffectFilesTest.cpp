@@ -215,22 +215,14 @@ protected:
 	Gpu::RenderTargetView* Target(int aWidth, int aHeight, std::array<float, 4> aClear = {0, 0, 0, 0},
 	                              bool aDepthFlag = false, float aDepth = 0.0f)
 	{
-		Gpu::Texture* color = MakeTarget(Dds::Format::R32G32B32A32_FLOAT, aWidth, aHeight);
-		EXPECT_NE(color, nullptr);
-		if (!color)
+		Gpu::DepthStencilView* depth =
+		    aDepthFlag ? MakeTarget(Dds::Format::D32_FLOAT, aWidth, aHeight)->CreateDepthStencilView()
+		               : nullptr;
+		Gpu::RenderTargetView* view = BindTarget(Dds::Format::R32G32B32A32_FLOAT, aWidth, aHeight, depth);
+		if (!view)
 		{
 			return nullptr;
 		}
-		Gpu::RenderTargetView* view = color->CreateRenderTargetView();
-		Gpu::DepthStencilView* depth = nullptr;
-		if (aDepthFlag)
-		{
-			depth = MakeTarget(Dds::Format::D32_FLOAT, aWidth, aHeight)->CreateDepthStencilView();
-		}
-		Gpu::RenderTargetView* targets[] = {view};
-		EXPECT_TRUE(GetContext().SetRenderTargets(targets, depth));
-		GetContext().SetViewport(
-		    {.myWidth = static_cast<float>(aWidth), .myHeight = static_cast<float>(aHeight)});
 		GetContext().ClearRenderTargetView(*view, aClear.data());
 		if (depth)
 		{

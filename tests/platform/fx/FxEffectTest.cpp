@@ -51,14 +51,11 @@ protected:
 		{
 			return;
 		}
-		Gpu::Texture* color = MakeTarget(Dds::Format::R8G8B8A8_UNORM, 64, 64);
 		Gpu::Texture* depth = MakeTarget(Dds::Format::D32_FLOAT, 64, 64);
-		ASSERT_TRUE(color && depth);
-		myTarget = color->CreateRenderTargetView();
+		ASSERT_NE(depth, nullptr);
 		myDepth = depth->CreateDepthStencilView();
-		Gpu::RenderTargetView* targets[] = {myTarget};
-		ASSERT_TRUE(GetContext().SetRenderTargets(targets, myDepth));
-		GetContext().SetViewport({.myWidth = 64, .myHeight = 64});
+		myTarget = BindTarget(Dds::Format::R8G8B8A8_UNORM, 64, 64, myDepth);
+		ASSERT_NE(myTarget, nullptr);
 		Clear();
 	}
 

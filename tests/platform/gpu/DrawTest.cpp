@@ -18,12 +18,8 @@ protected:
 		{
 			return;
 		}
-		Gpu::Texture* target = MakeTarget(Dds::Format::R8G8B8A8_UNORM_SRGB, 64, 64);
-		ASSERT_NE(target, nullptr);
-		myTarget = target->CreateRenderTargetView();
-		Gpu::RenderTargetView* targets[] = {myTarget};
-		ASSERT_TRUE(GetContext().SetRenderTargets(targets, nullptr));
-		GetContext().SetViewport({.myWidth = 64, .myHeight = 64});
+		myTarget = BindTarget(Dds::Format::R8G8B8A8_UNORM_SRGB, 64, 64);
+		ASSERT_NE(myTarget, nullptr);
 		GetContext().ClearRenderTargetView(*myTarget, myClearColor);
 
 		myProgram = LinkProgram(ourColorVertex, ourColorFragment);

@@ -158,6 +158,35 @@ protected:
 		                    .myLabel = "test target"});
 	}
 
+	// A cube of six square faces (aCount faces for a cube array); aMipLevels 0 is the full chain.
+	Gpu::Texture* MakeCube(Dds::Format aFormat, int aSize, int aMipLevels = 1, int aCount = 6)
+	{
+		return MakeTexture({.myKind = Gpu::TextureKind::TextureCube,
+		                    .myWidth = aSize,
+		                    .myHeight = aSize,
+		                    .myArraySize = aCount,
+		                    .myMipLevels = aMipLevels,
+		                    .myFormat = aFormat,
+		                    .myLabel = "test cube"});
+	}
+
+	// A new colour target bound (with aDepth, if any) and the viewport over it; null (test failed)
+	// when it cannot be made.
+	Gpu::RenderTargetView* BindTarget(Dds::Format aFormat, int aWidth, int aHeight,
+	                                  Gpu::DepthStencilView* aDepth = nullptr)
+	{
+		Gpu::Texture* color = MakeTarget(aFormat, aWidth, aHeight);
+		Gpu::RenderTargetView* targets[] = {color ? color->CreateRenderTargetView() : nullptr};
+		if (targets[0] == nullptr || !GetContext().SetRenderTargets(targets, aDepth))
+		{
+			ADD_FAILURE() << "cannot bind a " << aWidth << "x" << aHeight << " target: " << Joined();
+			return nullptr;
+		}
+		GetContext().SetViewport(
+		    {.myWidth = static_cast<float>(aWidth), .myHeight = static_cast<float>(aHeight)});
+		return targets[0];
+	}
+
 	// Draws the vertices from a buffer the fixture keeps, with the bound program and layout:
 	// as quads (four corners each, indexed) or, without aQuadsFlag, as a triangle list.
 	template <typename Vertex>

@@ -72,13 +72,7 @@ TEST_F(TextureTest, SrgbTargetsEncodeAndTypelessViewsReinterpret)
 
 TEST_F(TextureTest, CubeFaceViewsAreSeparateTargets)
 {
-	Gpu::Texture* cube = MakeTexture({.myKind = Gpu::TextureKind::TextureCube,
-	                                  .myWidth = 16,
-	                                  .myHeight = 16,
-	                                  .myArraySize = 6,
-	                                  .myMipLevels = 0,
-	                                  .myFormat = Dds::Format::R8G8B8A8_UNORM,
-	                                  .myLabel = "cube"});
+	Gpu::Texture* cube = MakeCube(Dds::Format::R8G8B8A8_UNORM, 16, 0);
 	ASSERT_NE(cube, nullptr);
 	EXPECT_EQ(cube->GetMipLevels(), 5);
 	EXPECT_EQ(cube->GetDefaultShaderResourceView()->GetTarget(), static_cast<GLenum>(GL_TEXTURE_CUBE_MAP));
@@ -162,12 +156,7 @@ TEST_F(TextureTest, CopiesMoveWholeTexturesAndSubresources)
 	ExpectUniform(GetContext(), *copy->CreateRenderTargetView({.myMip = 1}), second);
 
 	// Mip 1 (4x4) of the source into face 5 of a cube at (2, 1).
-	Gpu::Texture* cube = MakeTexture({.myKind = Gpu::TextureKind::TextureCube,
-	                                  .myWidth = 8,
-	                                  .myHeight = 8,
-	                                  .myArraySize = 6,
-	                                  .myFormat = Dds::Format::R8G8B8A8_UNORM,
-	                                  .myLabel = "cube"});
+	Gpu::Texture* cube = MakeCube(Dds::Format::R8G8B8A8_UNORM, 8);
 	ASSERT_NE(cube, nullptr);
 	Gpu::RenderTargetView* face = cube->CreateRenderTargetView({.myFirstSlice = 5});
 	const float black[4] = {0, 0, 0, 1};

@@ -56,13 +56,7 @@ TEST_F(ShProjectionGpuTest, CubeTexturesProjectLikeTheirTexels)
 		const std::vector<float> texels =
 		    RandomHalfTexels(static_cast<size_t>(6 * width * width * 4), static_cast<unsigned>(format));
 		const std::vector<uint8_t> bytes = Encode(texels, format);
-		Gpu::Texture* cube = MakeTexture({.myKind = Gpu::TextureKind::TextureCube,
-		                                  .myWidth = width,
-		                                  .myHeight = width,
-		                                  .myArraySize = 6,
-		                                  .myMipLevels = 0,
-		                                  .myFormat = format,
-		                                  .myLabel = "probe"});
+		Gpu::Texture* cube = MakeCube(format, width, 0);
 		ASSERT_NE(cube, nullptr);
 		const size_t faceBytes = bytes.size() / 6;
 		for (int face = 0; face < 6; ++face)
@@ -109,14 +103,7 @@ TEST_F(ShProjectionGpuTest, AtlasTexturesProjectLikeTheirTexels)
 
 TEST_F(ShProjectionGpuTest, TexturesThatAreNotFloatCubesAreRefused)
 {
-	auto cubeOf = [&](Dds::Format aFormat, int aFaceCount) {
-		return MakeTexture({.myKind = Gpu::TextureKind::TextureCube,
-		                    .myWidth = 4,
-		                    .myHeight = 4,
-		                    .myArraySize = aFaceCount,
-		                    .myFormat = aFormat,
-		                    .myLabel = "refused"});
-	};
+	auto cubeOf = [&](Dds::Format aFormat, int aFaceCount) { return MakeCube(aFormat, 4, 1, aFaceCount); };
 	Gpu::Texture* floatCube = cubeOf(Dds::Format::R16G16B16A16_FLOAT, 6);
 	Gpu::Texture* byteCube = cubeOf(Dds::Format::R8G8B8A8_UNORM, 6);
 	Gpu::Texture* cubeArray = cubeOf(Dds::Format::R32G32B32A32_FLOAT, 12);
@@ -135,8 +122,8 @@ TEST_F(ShProjectionGpuTest, TexturesThatAreNotFloatCubesAreRefused)
 	std::vector<float> coefficients(27);
 	EXPECT_FALSE(Sh::ProjectCubeAtlas(GetContext(), *floatCube, 4, 1, coefficients.data()));
 	ExpectReports({{"Sh::ProjectCubeMap", "Order 2"},
-	               {"Sh::ProjectCubeMap", "'refused'", "format 28"},
-	               {"Sh::ProjectCubeMap", "'refused'", "12 slices"},
+	               {"Sh::ProjectCubeMap", "'test cube'", "format 28"},
+	               {"Sh::ProjectCubeMap", "'test cube'", "12 slices"},
 	               {"Sh::ProjectCubeMap", "'test target'", "not a single float cube"},
 	               {"Sh::ProjectCubeMap", "not initialised"},
 	               {"Sh::ProjectCubeMap", "output is missing"},

@@ -54,12 +54,8 @@ protected:
 		{
 			return;
 		}
-		Gpu::Texture* color = MakeTarget(Dds::Format::R8G8B8A8_UNORM, ourWidth, ourHeight);
-		ASSERT_NE(color, nullptr);
-		myTarget = color->CreateRenderTargetView();
-		Gpu::RenderTargetView* targets[] = {myTarget};
-		ASSERT_TRUE(GetContext().SetRenderTargets(targets, nullptr));
-		GetContext().SetViewport({.myWidth = ourWidth, .myHeight = ourHeight});
+		myTarget = BindTarget(Dds::Format::R8G8B8A8_UNORM, ourWidth, ourHeight);
+		ASSERT_NE(myTarget, nullptr);
 		ASSERT_TRUE(myFactory.Init());
 		myFont = myFactory.CreateFontWrapper(GetContext(), "Arial");
 		ASSERT_NE(myFont, nullptr);
