@@ -164,6 +164,11 @@ void XML::Error(const std::string& aMessage)
 	log->CriticalErrorMessage(ourErrorLine, "XML::Error", "%s", aMessage.c_str());
 }
 
+bool XML::HasRootElement() const
+{
+	return myDocument != nullptr && myDocument->RootElement() != nullptr;
+}
+
 bool XML::GoToElement(std::string aFirstLevelName, std::string aSecondLevelName, std::string aThirdLevelName)
 {
 	myCurrentElement = myDocument != nullptr ? myDocument->RootElement() : nullptr;

@@ -51,6 +51,9 @@ public:
 	XML(const XML&) = delete;
 	XML& operator=(const XML&) = delete;
 
+	// Whether the file was read and parsed into a document with a root element.
+	bool HasRootElement() const;
+
 	// Walks down from the root element through up to three levels; an empty name at level 1
 	// takes the root's first child of any kind, an empty name at levels 2 and 3 stops there.
 	bool GoToElement(std::string aFirstLevelName, std::string aSecondLevelName, std::string aThirdLevelName);

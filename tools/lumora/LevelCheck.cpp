@@ -159,6 +159,37 @@ void NoteUnbakedFiles(const std::string& aLevel, const Lumora::LumoraWrapper& an
 		}
 	}
 }
+// A file whose section is missing loads as if the section were empty, but the editor cannot
+// save into it (the saver has no section to empty): said here, before a designer's edits are
+// lost to a failed save. Files that do not parse were reported by loading already.
+void CheckSavedSections(const std::string& aLevel, LevelReport& aReport)
+{
+	struct Section
+	{
+		const char* myFile;
+		const char* myName;
+		const char* myWhat;
+	};
+	static const Section ourSections[] = {{"lights.xml", "point-lights", "point lights"},
+	                                      {"lights.xml", "spot-lights", "spot lights"},
+	                                      {"nodegraph.xml", "node-graph", "path graph"},
+	                                      {"decals.xml", "decals", "decals"}};
+	for (const Section& section : ourSections)
+	{
+		const std::string path = "data/XML/levels/" + aLevel + "/" + section.myFile;
+		std::error_code ignored;
+		if (!std::filesystem::is_regular_file(Paths::Resolve(path), ignored))
+		{
+			continue;
+		}
+		XML xml(path);
+		if (xml.HasRootElement() && !xml.GoToElement(section.myName, "", ""))
+		{
+			aReport.myProblems.push_back(path + ": no \"" + section.myName + "\" element under the root, so the " +
+			                             "editor cannot save the level's " + section.myWhat + " into it");
+		}
+	}
+}
 } // namespace
 
 LevelReport CheckLevel(EditorSession& aSession, const std::string& aLevel)
@@ -175,6 +206,7 @@ LevelReport CheckLevel(EditorSession& aSession, const std::string& aLevel)
 	const Lumora::LumoraWrapper& editor = aSession.Editor();
 	CheckEntityTypes(aLevel, editor, report);
 	CheckRooms(aLevel, editor, report);
+	CheckSavedSections(aLevel, report);
 	NoteUnbakedFiles(aLevel, editor, report);
 	return report;
 }
