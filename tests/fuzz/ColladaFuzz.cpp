@@ -1,15 +1,19 @@
-// COLLADA documents: any bytes load or fail with a message. A loaded document keeps every index
+// COLLADA documents (and XML in general): the nesting scan never lets a document deeper than its
+// limit reach TinyXML; any bytes load or fail with a message. A loaded document keeps every index
 // inside its source, triangulates, evaluates its transforms and reduces its skins; its import
 // is a model tree that the .al writer and reader carry over unchanged.
 
+#include <algorithm>
 #include <cstdlib>
 #include <string>
+#include <tinyxml.h>
 #include <vector>
 
 #include "FuzzEntries.h"
 #include "ModelTreeGuarantees.h"
 #include "model/ColladaImport.h"
 #include "platform/collada/Document.h"
+#include "platform/xmlscan/NestingScan.h"
 
 namespace
 {
@@ -34,10 +38,36 @@ void WalkNode(const ::Collada::Node& aNode, int aDepth)
 		WalkNode(*child, aDepth + 1);
 	}
 }
+// The deepest element of a parsed (or partly parsed) document, the root's children at 1.
+int DeepestElement(const TiXmlNode& aNode)
+{
+	int deepest = 0;
+	for (const TiXmlElement* child = aNode.FirstChildElement(); child != nullptr;
+	     child = child->NextSiblingElement())
+	{
+		deepest = std::max(deepest, 1 + DeepestElement(*child));
+	}
+	return deepest;
+}
+
+// The nesting scan that guards every TinyXML load never counts fewer levels than the parser
+// builds (an empty element, which the parser enters without recursing, may add one).
+void CheckNestingScan(const uint8_t* someData, size_t aSize)
+{
+	constexpr int limit = 6;
+	const std::string text(reinterpret_cast<const char*>(someData), aSize);
+	if (XmlScan::FindTooDeep(text, limit) == 0)
+	{
+		TiXmlDocument xml;
+		xml.Parse(text.c_str(), nullptr, TIXML_ENCODING_UTF8);
+		LumoraFuzz::Require(DeepestElement(xml) <= limit + 1);
+	}
+}
 } // namespace
 
 int LumoraFuzz::Collada(const uint8_t* someData, size_t aSize)
 {
+	CheckNestingScan(someData, aSize);
 	::Collada::Document document;
 	std::string error;
 	if (!document.LoadFromMemory(someData, aSize, error))
