@@ -394,14 +394,17 @@ bool XML::WriteThroughTemporary(const TiXmlDocument& aDocument, const std::strin
 	{
 		return false;
 	}
+	// TemporaryFor made the file (empty, ours): every way out below removes it.
 	FILE* file = std::fopen(temporary.c_str(), "w");
 	if (file == nullptr)
 	{
-		// Nothing was created, so nothing is removed: the path may name something that is not ours.
+		std::remove(temporary.c_str());
 		return false;
 	}
 	bool writtenFlag = aDocument.SaveFile(file);
-	// A full disk often shows only when the buffer is flushed at close.
+	// TinyXML's printing does not look at what fwrite answered: the stream's error state
+	// does, and a full disk often shows only when the buffer is flushed at close.
+	writtenFlag = std::fflush(file) == 0 && std::ferror(file) == 0 && writtenFlag;
 	writtenFlag = std::fclose(file) == 0 && writtenFlag;
 	if (!writtenFlag)
 	{
