@@ -35,6 +35,8 @@ TEST(FrustumTest, SpheresOutsideAPlaneAreCulledAndThoseTouchingTheViewKept)
 	{
 		value = 0.0f;
 	}
+	const Matrix44<float> ahead = Perspective(0.1f, 100.0f); // the camera at the origin looking along +z
+	const Matrix44<float> turnedAhead = turned.Inverse() * ahead;
 	const struct
 	{
 		const char* myName;
@@ -43,22 +45,18 @@ TEST(FrustumTest, SpheresOutsideAPlaneAreCulledAndThoseTouchingTheViewKept)
 		float myRadius;
 		bool myOutsideFlag;
 	} cases[] = {
-	    // The camera at the origin looking along +z.
-	    {"straight ahead", Perspective(0.1f, 100.0f), V3(0.0f, 0.0f, 10.0f), 1.0f, false},
-	    {"behind", Perspective(0.1f, 100.0f), V3(0.0f, 0.0f, -10.0f), 1.0f, true},
-	    {"right of the 45 degree side", Perspective(0.1f, 100.0f), V3(20.0f, 0.0f, 10.0f), 1.0f, true},
-	    {"below", Perspective(0.1f, 100.0f), V3(0.0f, -20.0f, 10.0f), 1.0f, true},
-	    {"0.71 from the side plane x = z", Perspective(0.1f, 100.0f), V3(11.0f, 0.0f, 10.0f), 1.0f, false},
-	    {"1.06 from the side plane", Perspective(0.1f, 100.0f), V3(11.5f, 0.0f, 10.0f), 1.0f, true},
-	    {"beyond the far plane", Perspective(0.1f, 100.0f), V3(0.0f, 0.0f, 102.0f), 1.0f, true},
-	    {"across the far plane", Perspective(0.1f, 100.0f), V3(0.0f, 0.0f, 100.5f), 1.0f, false},
-	    {"around the camera", Perspective(0.1f, 100.0f), V3(0.0f, 0.0f, -0.5f), 1.0f, false},
-	    {"turned: ahead, along -x", turned.Inverse() * Perspective(0.1f, 100.0f), V3(-5.0f, 0.0f, 0.0f), 0.5f,
-	     false},
-	    {"turned: behind, along +x", turned.Inverse() * Perspective(0.1f, 100.0f), V3(15.0f, 0.0f, 0.0f),
-	     0.5f, true},
-	    {"turned: to the side", turned.Inverse() * Perspective(0.1f, 100.0f), V3(5.0f, 0.0f, 10.0f), 0.5f,
-	     true},
+	    {"straight ahead", ahead, V3(0.0f, 0.0f, 10.0f), 1.0f, false},
+	    {"behind", ahead, V3(0.0f, 0.0f, -10.0f), 1.0f, true},
+	    {"right of the 45 degree side", ahead, V3(20.0f, 0.0f, 10.0f), 1.0f, true},
+	    {"below", ahead, V3(0.0f, -20.0f, 10.0f), 1.0f, true},
+	    {"0.71 from the side plane x = z", ahead, V3(11.0f, 0.0f, 10.0f), 1.0f, false},
+	    {"1.06 from the side plane", ahead, V3(11.5f, 0.0f, 10.0f), 1.0f, true},
+	    {"beyond the far plane", ahead, V3(0.0f, 0.0f, 102.0f), 1.0f, true},
+	    {"across the far plane", ahead, V3(0.0f, 0.0f, 100.5f), 1.0f, false},
+	    {"around the camera", ahead, V3(0.0f, 0.0f, -0.5f), 1.0f, false},
+	    {"turned: ahead, along -x", turnedAhead, V3(-5.0f, 0.0f, 0.0f), 0.5f, false},
+	    {"turned: behind, along +x", turnedAhead, V3(15.0f, 0.0f, 0.0f), 0.5f, true},
+	    {"turned: to the side", turnedAhead, V3(5.0f, 0.0f, 10.0f), 0.5f, true},
 	    {"a broken matrix culls nothing", zero, V3(1000.0f, -1000.0f, 5.0f), 0.0f, false},
 	};
 	for (const auto& test : cases)

@@ -33,30 +33,24 @@ void AddAll(GrowingArray<int>& anArray, const std::vector<int>& someValues)
 	}
 }
 
-struct DestructionCounter
-{
-	static inline int ourDestroyedCount = 0;
-	~DestructionCounter() { ++ourDestroyedCount; }
-};
-
-// Counts copy assignments, so a test can tell safe-mode growth from a byte copy.
-struct AssignmentCounter
+// Counts copy assignments (so a test can tell safe-mode growth from a byte copy) and destructions,
+// and overwrites its value when destroyed, so a read from released storage shows.
+struct Probe
 {
 	static inline int ourAssignmentCount = 0;
+	static inline int ourDestroyedCount = 0;
 	int myValue = 0;
-	AssignmentCounter& operator=(const AssignmentCounter& anOther)
+	Probe& operator=(const Probe& anOther)
 	{
 		myValue = anOther.myValue;
 		++ourAssignmentCount;
 		return *this;
 	}
-};
-
-// Overwrites its value when destroyed, so a read from released storage shows.
-struct PoisonOnDestroy
-{
-	int myValue = 0;
-	~PoisonOnDestroy() { myValue = -1; }
+	~Probe()
+	{
+		myValue = -1;
+		++ourDestroyedCount;
+	}
 };
 
 std::vector<std::string> ourReports;
@@ -87,9 +81,9 @@ TEST(GrowingArray, GrowsByTheFixedStepAndKeepsOrder)
 	}
 
 	// The argument of Add may live in the storage that its growth replaces.
-	GrowingArray<PoisonOnDestroy> own(2, 2, true);
-	own.Add(PoisonOnDestroy{7});
-	own.Add(PoisonOnDestroy{8});
+	GrowingArray<Probe> own(2, 2, true);
+	own.Add(Probe{7});
+	own.Add(Probe{8});
 	own.Add(own[0]);
 	ASSERT_EQ(own.Count(), 3);
 	EXPECT_EQ(own[2].myValue, 7);
@@ -121,16 +115,15 @@ TEST(GrowingArray, RemovingAndClearing)
 	EXPECT_EQ(Contents(strings), std::vector<std::string>{"X"});
 
 	// DeleteAll skips a null pointer and nulls every used slot.
-	DestructionCounter::ourDestroyedCount = 0;
-	GrowingArray<DestructionCounter*> pointers(4, 4, true);
-	pointers.Add(new DestructionCounter);
+	GrowingArray<Probe*> pointers(4, 4, true);
+	pointers.Add(new Probe);
 	pointers.Add(nullptr);
-	pointers.Add(new DestructionCounter);
+	pointers.Add(new Probe);
+	Probe::ourDestroyedCount = 0;
 	pointers.DeleteAll();
-	EXPECT_EQ(DestructionCounter::ourDestroyedCount, 2);
+	EXPECT_EQ(Probe::ourDestroyedCount, 2);
 	EXPECT_EQ(pointers.Count(), 0);
-	EXPECT_EQ(std::vector<DestructionCounter*>(pointers.begin(), pointers.begin() + 3),
-	          std::vector<DestructionCounter*>(3, nullptr));
+	EXPECT_EQ(std::vector<Probe*>(pointers.begin(), pointers.begin() + 3), std::vector<Probe*>(3, nullptr));
 }
 
 TEST(GrowingArray, SafeModeAssignsOnGrowthRawModeCopiesBytes)
@@ -138,13 +131,13 @@ TEST(GrowingArray, SafeModeAssignsOnGrowthRawModeCopiesBytes)
 	// Four Adds assign in both modes; safe mode also assigns the three moved elements.
 	for (const auto& [safeMode, expectedAssignments] : {std::pair{true, 7}, std::pair{false, 4}})
 	{
-		AssignmentCounter::ourAssignmentCount = 0;
-		GrowingArray<AssignmentCounter> array(3, 3, safeMode);
+		Probe::ourAssignmentCount = 0;
+		GrowingArray<Probe> array(3, 3, safeMode);
 		for (int i = 0; i < 4; ++i)
 		{
-			array.Add(AssignmentCounter{i * 10});
+			array.Add(Probe{i * 10});
 		}
-		EXPECT_EQ(AssignmentCounter::ourAssignmentCount, expectedAssignments) << "safe mode " << safeMode;
+		EXPECT_EQ(Probe::ourAssignmentCount, expectedAssignments) << "safe mode " << safeMode;
 		EXPECT_EQ((std::vector<int>{array[0].myValue, array[1].myValue, array[2].myValue, array[3].myValue}),
 		          Sequence(4, 10));
 	}

@@ -116,21 +116,17 @@ TEST(MathMatrix, RowVectorQuarterTurnsAndProductOrder)
 	}
 }
 
-TEST(MathMatrix, SelfMultiplicationUsesTheOriginalOperands)
+TEST(MathMatrix, CompoundProductsUseTheOriginalOperandsAndAMatrix33TurnsOnlyTheBlock)
 {
 	const M44 original = Distinct();
 	M44 self = original;
 	self *= self;
 	ExpectMatrixNear(self, M44(original) * M44(original), 0.0f);
-
 	M33 block = original.Get33();
 	const M33 expectedBlock = M33(block) * M33(block);
 	block *= block;
 	ExpectMatrixNear(block, expectedBlock, 0.0f);
-}
 
-TEST(MathMatrix, Matrix33TurnsOnlyTheBlockFromTheLeft)
-{
 	M44 transform = M44::CreateRotateAroundX(0.4f) * Scale(2.0f, 3.0f, 0.5f);
 	transform.SetPosition(V3(1.0f, 2.0f, 3.0f));
 	for (int row = 0; row < 4; ++row)
@@ -141,10 +137,10 @@ TEST(MathMatrix, Matrix33TurnsOnlyTheBlockFromTheLeft)
 
 	// Position row and fourth column stay; the block becomes rotation x block.
 	M44 expected = transform;
-	const M33 block = rotation * transform.Get33();
+	const M33 turned = rotation * transform.Get33();
 	for (int i = 0; i < 9; ++i)
 	{
-		expected.myMatrix[4 * (i / 3) + i % 3] = block.myMatrix[i];
+		expected.myMatrix[4 * (i / 3) + i % 3] = turned.myMatrix[i];
 	}
 	transform *= rotation;
 	ExpectMatrixNear(transform, expected, 1e-6f);
