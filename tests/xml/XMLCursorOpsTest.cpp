@@ -6,7 +6,7 @@
 
 #include "XMLTestFixture.h"
 
-TEST_F(XMLFixture, PushPopAndGoToLastChildMoveBetweenPositions)
+TEST_F(XMLFixture, PushPopAndGoToLastChildMoveBetweenPositionsAndRemovalForgetsThoseInside)
 {
 	XML xml(myPath);
 	ASSERT_TRUE(xml.GoToElement("lights", "", ""));
@@ -34,11 +34,8 @@ TEST_F(XMLFixture, PushPopAndGoToLastChildMoveBetweenPositions)
 	xml.PopElement();
 	EXPECT_EQ(xml.GetAttribute<int>("id"), 2);
 	EXPECT_EQ(ReportCount(), 2);
-}
 
-TEST_F(XMLFixture, RemovalForgetsPositionsInsideTheRemovedNodes)
-{
-	XML xml(myPath);
+	// Removal forgets the positions inside the removed nodes.
 	ASSERT_TRUE(xml.GoToElement("lights", "light", ""));
 	xml.PushElement();
 	xml.RemoveCurrentElement();
@@ -57,10 +54,10 @@ TEST_F(XMLFixture, RemovalForgetsPositionsInsideTheRemovedNodes)
 	xml.PopElement();
 	xml.ExitChild();
 	EXPECT_TRUE(Logged("Could not find element [] in [" + myPath + "]"));
-	EXPECT_EQ(ReportCount(), 2);
+	EXPECT_EQ(ReportCount(), 4);
 }
 
-TEST_F(XMLFixture, InsertElementAtRootAppendsToRootAndKeepsTheCursor)
+TEST_F(XMLFixture, InsertElementAtRootAppendsToRootAndKeepsTheCursorEvenInANewEmptyDocument)
 {
 	XML xml(myPath);
 	ASSERT_TRUE(xml.GoToElement("lights", "light", ""));
@@ -72,26 +69,22 @@ TEST_F(XMLFixture, InsertElementAtRootAppendsToRootAndKeepsTheCursor)
 	reread.ExitChild();
 	reread.GoToLastChild();
 	EXPECT_EQ(reread.GetElementName(), "decals");
+
+	// CreateEmptyDocument replaces the file with an empty <root>.
+	xml.CreateEmptyDocument();
+	EXPECT_FALSE(xml.GoToElement("", "", ""));
+	xml.InsertElementAtRoot(XMLElement("sounds"), true);
+	XML recreated(myPath);
+	ASSERT_TRUE(recreated.GoToElement("sounds", "", ""));
+	recreated.ExitChild();
+	EXPECT_EQ(recreated.GetElementName(), "root");
+	EXPECT_EQ(TestSupport::ReadWholeFile(myPath).find("lights"), std::string::npos);
 	EXPECT_EQ(ReportCount(), 0);
 
 	const std::string otherRoot = WriteDocument("other.xml", "<level><a /></level>");
 	XML(otherRoot).InsertElementAtRoot(decals, true);
 	EXPECT_TRUE(Logged("Could not insert element [decals] in file [" + otherRoot + "]"));
 	EXPECT_EQ(TestSupport::ReadWholeFile(otherRoot).find("decals"), std::string::npos);
-}
-
-TEST_F(XMLFixture, CreateEmptyDocumentReplacesTheFileWithAnEmptyRoot)
-{
-	XML xml(myPath);
-	xml.CreateEmptyDocument();
-	EXPECT_FALSE(xml.GoToElement("", "", ""));
-	xml.InsertElementAtRoot(XMLElement("sounds"), true);
-	XML reread(myPath);
-	ASSERT_TRUE(reread.GoToElement("sounds", "", ""));
-	reread.ExitChild();
-	EXPECT_EQ(reread.GetElementName(), "root");
-	EXPECT_EQ(TestSupport::ReadWholeFile(myPath).find("lights"), std::string::npos);
-	EXPECT_EQ(ReportCount(), 0);
 }
 
 TEST_F(XMLFixture, CopyDocumentWritesTheDocumentInMemoryElsewhere)

@@ -14,16 +14,14 @@ namespace
 {
 std::string Nested(int aDepth)
 {
-	std::string text;
+	std::string open;
+	std::string close;
 	for (int level = 0; level < aDepth; ++level)
 	{
-		text += "<a>";
+		open += "<a>";
+		close += "</a>";
 	}
-	for (int level = 0; level < aDepth; ++level)
-	{
-		text += "</a>";
-	}
-	return text;
+	return open + close;
 }
 } // namespace
 

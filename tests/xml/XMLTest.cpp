@@ -40,26 +40,9 @@ TEST_F(XMLFixture, WalksSkipCommentsAndExitChildAfterTheLastSiblingLandsOnTheSec
 	EXPECT_EQ(ReportCount(), 0);
 }
 
-TEST_F(XMLFixture, ReadersFindValuesByNameOrTakeTheFirstAttribute)
+TEST_F(XMLFixture, ReadersFindValuesByNameOrTakeTheFirstAttributeAndTryReadersKeepTheValue)
 {
-	XML xml(myPath);
-	ASSERT_TRUE(xml.GoToElement("lights", "light", ""));
-	EXPECT_EQ(xml.GetChildAttribute<float>("falloff", ""), 2.5f); // value="2.5"
-	EXPECT_EQ(Components(xml.GetVector3Attribute("position")), (std::vector<float>{1, 2, 3}));
-	ASSERT_TRUE(xml.GoToNextSibling("light"));
-	EXPECT_EQ(xml.GetChildAttribute<float>("falloff", ""), 0.5f); // v="0.5"
-	EXPECT_EQ(xml.GetChildAttribute<float>("angles", "outer"), 0.7f);
-	EXPECT_EQ(Components(xml.GetVector4Attribute("color")), (std::vector<float>{2, 0, 0, 1}));
-	// With an empty tag the cursor element itself holds the components.
-	ASSERT_TRUE(xml.GoToElement("lights", "light", "color"));
-	EXPECT_EQ(Components(xml.GetVector4Attribute("")), (std::vector<float>{0.5f, 0.25f, 1, 4}));
-	ASSERT_TRUE(xml.GoToElement("lights", "light", "position"));
-	EXPECT_EQ(Components(xml.GetVector3Attribute("")), (std::vector<float>{1, 2, 3}));
-	EXPECT_EQ(ReportCount(), 0);
-}
-
-TEST_F(XMLFixture, TryReadersAnswerFalseWithoutReportAndKeepTheValue)
-{
+	// The Try readers answer false without a report and keep the value.
 	XML xml(myPath);
 	bool flag = true;
 	std::string text = "unchanged";
@@ -74,6 +57,19 @@ TEST_F(XMLFixture, TryReadersAnswerFalseWithoutReportAndKeepTheValue)
 	EXPECT_TRUE(xml.TryGetAttribute(flag, "id") && !flag);
 	EXPECT_TRUE(xml.TryGetChildAttribute("color", text, "g") && text == "0.25");
 	EXPECT_TRUE(xml.TryGetChildAttribute("falloff", text, "") && text == "2.5");
+
+	EXPECT_EQ(xml.GetChildAttribute<float>("falloff", ""), 2.5f); // value="2.5"
+	EXPECT_EQ(Components(xml.GetVector3Attribute("position")), (std::vector<float>{1, 2, 3}));
+	ASSERT_TRUE(xml.GoToNextSibling("light"));
+	EXPECT_EQ(xml.GetChildAttribute<float>("falloff", ""), 0.5f); // v="0.5"
+	EXPECT_EQ(xml.GetChildAttribute<float>("angles", "outer"), 0.7f);
+	EXPECT_EQ(Components(xml.GetVector4Attribute("color")), (std::vector<float>{2, 0, 0, 1}));
+	// With an empty tag the cursor element itself holds the components.
+	ASSERT_TRUE(xml.GoToElement("lights", "light", "color"));
+	EXPECT_EQ(Components(xml.GetVector4Attribute("")), (std::vector<float>{0.5f, 0.25f, 1, 4}));
+	ASSERT_TRUE(xml.GoToElement("lights", "light", "position"));
+	EXPECT_EQ(Components(xml.GetVector3Attribute("")), (std::vector<float>{1, 2, 3}));
+	EXPECT_EQ(ReportCount(), 0);
 }
 
 TEST_F(XMLFixture, EveryFailureReportsOnceWithItsMessageAndNamesAsGiven)

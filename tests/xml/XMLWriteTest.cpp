@@ -4,11 +4,10 @@
 #include "xml/XML.h"
 #include "xml/XMLElement.h"
 
-#include <csignal>
 #include <locale>
-#include <sys/resource.h>
 
 #include "XMLTestFixture.h"
+#include "support/FileSizeLimit.h"
 
 namespace
 {
@@ -129,37 +128,29 @@ TEST_F(XMLFixture, NumbersAreWrittenWithSixSignificantDigitsAndReadBackWhateverT
 	std::locale::global(previous);
 }
 
-TEST_F(XMLFixture, FailedSaveLeavesTheOldFileAndNoTemporary)
+TEST_F(XMLFixture, FailedSavesLeaveTheFileAsItWasAndNoTemporary)
 {
 	XML xml(myPath);
 	ASSERT_TRUE(xml.GoToElement("lights", "", ""));
 	XMLElement big("big");
 	big.AddAttribute("text", std::string(64 * 1024, 'x'));
 	xml.InsertElement(big, false);
-	// A file size limit makes the write fail part way, as a full disk would.
-	rlimit previousLimit{};
-	ASSERT_EQ(getrlimit(RLIMIT_FSIZE, &previousLimit), 0);
-	rlimit smallLimit = previousLimit;
-	smallLimit.rlim_cur = 16 * 1024;
-	void (*previousHandler)(int) = std::signal(SIGXFSZ, SIG_IGN);
-	ASSERT_EQ(setrlimit(RLIMIT_FSIZE, &smallLimit), 0);
-	xml.SaveFile();
-	setrlimit(RLIMIT_FSIZE, &previousLimit);
-	std::signal(SIGXFSZ, previousHandler);
-
+	{
+		// A file size limit makes the write fail part way, as a full disk would.
+		const TestSupport::FileSizeLimit full(16 * 1024);
+		xml.SaveFile();
+	}
 	EXPECT_TRUE(Logged("Could not save file [" + myPath + "]"));
 	EXPECT_EQ(TestSupport::ReadWholeFile(myPath), ourLightsText);
 	EXPECT_EQ(FileCount(std::filesystem::path(myPath).parent_path()), 1);
-}
 
-TEST_F(XMLFixture, DocumentThatFailedToLoadIsNeverWrittenOverItsFile)
-{
+	// A document that failed to load is never written over its file, nor copied.
 	const std::string broken = "<root><lights></root>";
 	const std::string path = WriteDocument("broken.xml", broken);
-	XML xml(path);
-	EXPECT_FALSE(xml.GoToElement("", "", ""));
-	xml.SaveFile();
-	xml.CopyDocument(myScratch.File("copy.xml"));
+	XML failed(path);
+	EXPECT_FALSE(failed.GoToElement("", "", ""));
+	failed.SaveFile();
+	failed.CopyDocument(myScratch.File("copy.xml"));
 	EXPECT_TRUE(Logged("Could not save file [" + path + "]"));
 	EXPECT_TRUE(Logged("No document set to copy"));
 	EXPECT_EQ(TestSupport::ReadWholeFile(path), broken);
