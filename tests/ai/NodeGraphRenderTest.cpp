@@ -3,6 +3,7 @@
 // back buffer. Frames are saved under /tmp/lumora-ai-tests/ to be looked at.
 #include <cmath>
 #include <cstdint>
+#include <functional>
 #include <gtest/gtest.h>
 #include <memory>
 #include <string>
@@ -46,68 +47,37 @@ protected:
 		ASSERT_EQ(width, ourWidth);
 		ASSERT_EQ(height, ourHeight);
 		EXPECT_EQ(lateCount, 3) << "two boxes and a line on the late list";
-		std::vector<uint8_t> opaque = myPixels;
-		for (size_t alpha = 3; alpha < opaque.size(); alpha += 4)
-		{
-			opaque[alpha] = 255;
-		}
-		Gpu::SavePng("/tmp/lumora-ai-tests/" + aName + ".png", ourWidth, ourHeight, opaque.data());
+		Gpu::SavePng("/tmp/lumora-ai-tests/" + aName + ".png", ourWidth, ourHeight,
+		             TestSupport::Opaque(myPixels).data());
 	}
 
-	const uint8_t* At(int anX, int aY) const
+	// Whether some pixel within one of (x, y) passes aTest on its RGB bytes (or, with anAllFlag,
+	// every pixel there does).
+	bool Around(Pixel aPixel, bool anAllFlag, const std::function<bool(const uint8_t*)>& aTest) const
 	{
-		return &myPixels[static_cast<size_t>((aY * ourWidth + anX) * 4)];
+		for (int y = std::max(aPixel.myY - 1, 0); y <= std::min(aPixel.myY + 1, ourHeight - 1); ++y)
+		{
+			for (int x = std::max(aPixel.myX - 1, 0); x <= std::min(aPixel.myX + 1, ourWidth - 1); ++x)
+			{
+				if (aTest(&myPixels[static_cast<size_t>((y * ourWidth + x) * 4)]) != anAllFlag)
+				{
+					return !anAllFlag;
+				}
+			}
+		}
+		return anAllFlag;
 	}
 	// A pixel within one of (x, y) that is pure full red or pure full green.
 	bool IsNear(Pixel aPixel, int aChannel) const
 	{
-		for (int y = aPixel.myY - 1; y <= aPixel.myY + 1; ++y)
-		{
-			for (int x = aPixel.myX - 1; x <= aPixel.myX + 1; ++x)
-			{
-				if (x < 0 || y < 0 || x >= ourWidth || y >= ourHeight)
-				{
-					continue;
-				}
-				const uint8_t* pixel = At(x, y);
-				if (pixel[aChannel] == 255 && pixel[1 - aChannel] == 0 && pixel[2] == 0)
-				{
-					return true;
-				}
-			}
-		}
-		return false;
+		return Around(aPixel, false, [&](const uint8_t* aRgb) {
+			return aRgb[aChannel] == 255 && aRgb[1 - aChannel] == 0 && aRgb[2] == 0;
+		});
 	}
 	bool IsBlackAround(Pixel aPixel) const
 	{
-		for (int y = aPixel.myY - 1; y <= aPixel.myY + 1; ++y)
-		{
-			for (int x = aPixel.myX - 1; x <= aPixel.myX + 1; ++x)
-			{
-				const uint8_t* pixel = At(x, y);
-				if (pixel[0] != 0 || pixel[1] != 0 || pixel[2] != 0)
-				{
-					return false;
-				}
-			}
-		}
-		return true;
-	}
-
-	// The graph a - b with both visuals, made as the editor makes them.
-	void BuildGraph(const Vector3<float>& aFirst, const Vector3<float>& aSecond)
-	{
-		for (int at = 0; at < 2; ++at)
-		{
-			myNodes[at].InitDebugInstance();
-			myNodes[at].SetID(at + 1);
-		}
-		myNodes[0].SetPosition(aFirst);
-		myNodes[1].SetPosition(aSecond);
-		myEdge.InitDebugLine();
-		myEdge.Connect(&myNodes[0], &myNodes[1]);
-		myNodes[0].AddEdge(&myEdge);
-		myNodes[1].AddEdge(&myEdge);
+		return Around(aPixel, true,
+		              [](const uint8_t* aRgb) { return aRgb[0] == 0 && aRgb[1] == 0 && aRgb[2] == 0; });
 	}
 
 	void TearDown() override
@@ -132,15 +102,22 @@ Vector3<float> Along(const Vector3<float>& aFrom, const Vector3<float>& aTo, flo
 }
 } // namespace
 
-TEST_F(NodeGraphRenderTest, BoxesAtTheNodesAndALineBetweenThem)
+TEST_F(NodeGraphRenderTest, BoxesAtTheNodesAndALineBetweenThemFollowAMovedNode)
 {
-	if (!Start())
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(Start());
 	const Vector3<float> a(-1.5f, -0.5f, 10.0f);
 	const Vector3<float> b(1.5f, 0.5f, 10.0f);
-	BuildGraph(a, b);
+	// The graph a - b with both visuals, made as the editor makes them.
+	for (int at = 0; at < 2; ++at)
+	{
+		myNodes[at].InitDebugInstance();
+		myNodes[at].SetID(at + 1);
+		myNodes[at].SetPosition(at == 0 ? a : b);
+	}
+	myEdge.InitDebugLine();
+	myEdge.Connect(&myNodes[0], &myNodes[1]);
+	myNodes[0].AddEdge(&myEdge);
+	myNodes[1].AddEdge(&myEdge);
 	ASSERT_NE(myNodes[0].GetDebugInstance(), nullptr) << TakeLog();
 	ASSERT_NE(myEdge.GetDebugLine(), nullptr) << TakeLog();
 	EXPECT_EQ(myNodes[0].GetDebugInstance()->GetModelNode(), myNodes[1].GetDebugInstance()->GetModelNode())
@@ -167,20 +144,6 @@ TEST_F(NodeGraphRenderTest, BoxesAtTheNodesAndALineBetweenThem)
 	}
 	EXPECT_TRUE(IsBlackAround(Project({0.0f, 1.0f, 10.0f}))) << "nothing off the graph";
 	EXPECT_TRUE(IsBlackAround(Project({0.0f, -1.0f, 10.0f}))) << "nothing off the graph";
-}
-
-TEST_F(NodeGraphRenderTest, MovingANodeMovesItsBoxTheLineAndTheDistance)
-{
-	if (!Start())
-	{
-		return;
-	}
-	const Vector3<float> a(-1.5f, 0.5f, 10.0f);
-	const Vector3<float> b(1.5f, 0.5f, 10.0f);
-	BuildGraph(a, b);
-	ASSERT_FLOAT_EQ(myEdge.GetDistance(), 3.0f);
-	Draw("graph-before-move");
-	ASSERT_TRUE(IsNear(Project(Along(a, b, 0.5f)), ourGreen)) << "the line as connected";
 
 	const Vector3<float> moved(1.5f, -1.0f, 8.0f);
 	myNodes[1].SetPosition(moved);
@@ -197,10 +160,7 @@ TEST_F(NodeGraphRenderTest, MovingANodeMovesItsBoxTheLineAndTheDistance)
 
 TEST_F(NodeGraphRenderTest, MakingVisualsAgainReplacesThem)
 {
-	if (!Start())
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(Start());
 	// The replaced box and line are deleted (the sanitizer build reports a leak otherwise).
 	AI::NGNode node;
 	node.InitDebugInstance();

@@ -1,36 +1,26 @@
 // The path graph without a GPU: edge slots, distances, the queries over the graph and
 // the reports they write to the log.
-#include <bitset>
 #include <cmath>
 #include <gtest/gtest.h>
 #include <string>
+#include <vector>
 
 #include "ai/NGEdge.h"
 #include "ai/NGNode.h"
 #include "core/GrowingArray.h"
-#include "engine/Debug.h"
-#include "support/TestSupport.h"
+#include "engine/EngineFixture.h"
 
 namespace
 {
-// A log that ends nothing, so that reports can be read back.
-class NodeGraphTest : public testing::Test
+// The engine fixture's log without an engine: a report the test does not take fails it.
+class NodeGraphTest : public EngineTest
 {
 protected:
-	void SetUp() override
+	// Expects the log written since the last look to hold aPart.
+	void ExpectLogged(const std::string& aPart)
 	{
-		myLogPath = myScratch.File("DebugLogger.txt");
-		ASSERT_TRUE(Debug::Create(myLogPath, std::bitset<4>(0)));
-	}
-	void TearDown() override { Debug::Destroy(); }
-
-	// The log written since the last call.
-	std::string TakeLog()
-	{
-		const std::string all = TestSupport::ReadWholeFile(myLogPath);
-		const std::string rest = all.size() > myLogTaken ? all.substr(myLogTaken) : std::string();
-		myLogTaken = all.size();
-		return rest;
+		const std::string log = TakeLog();
+		EXPECT_NE(log.find(aPart), std::string::npos) << aPart << "\nnot in:\n" << log;
 	}
 
 	// The entry as the log writes a critical report.
@@ -39,10 +29,6 @@ protected:
 		return "\"Error Type:\"\"CRITICAL ERROR\"\n\"Line:\"" + std::to_string(aLine) + "\n\"Function:\"\"" +
 		       aFunction + "\"\n\"" + aMessage + "\n\"\n";
 	}
-
-	TestSupport::ScratchDir myScratch;
-	std::string myLogPath;
-	size_t myLogTaken = 0;
 };
 
 AI::NGNode MakeNode(int anID, const Vector3<float>& aPosition)
@@ -52,9 +38,21 @@ AI::NGNode MakeNode(int anID, const Vector3<float>& aPosition)
 	node.SetPosition(aPosition);
 	return node;
 }
+
+std::vector<const AI::NGEdge*> Slots(const AI::NGNode& aNode)
+{
+	return {aNode.GetEdgeSlots()[0], aNode.GetEdgeSlots()[1]};
+}
+
+std::vector<AI::NGNode*> Neighbours(AI::NGNode& aNode)
+{
+	GrowingArray<AI::NGNode*> neighbours(4, 4);
+	aNode.GetNeighbours(neighbours);
+	return {neighbours.begin(), neighbours.end()};
+}
 } // namespace
 
-TEST_F(NodeGraphTest, ConnectStoresBothNodesAndTheirDistance)
+TEST_F(NodeGraphTest, ConnectStoresBothNodesAndTheirDistanceWhichRenderingUpdates)
 {
 	struct Case
 	{
@@ -80,21 +78,15 @@ TEST_F(NodeGraphTest, ConnectStoresBothNodesAndTheirDistance)
 		EXPECT_EQ(edge.GetFirstConnectionID(), 11);
 		EXPECT_EQ(edge.GetSecondConnectionID(), 12);
 		EXPECT_EQ(first.GetEdgeSlots()[0], nullptr) << "Connect leaves registering to the caller";
+
+		// Moving a node alone changes nothing; rendering the edge (no engine and no line: only the
+		// distance) makes the distance follow.
+		second.SetPosition(test.myFirst + Vector3<float>(0.0f, 0.0f, 2.0f));
+		EXPECT_FLOAT_EQ(edge.GetDistance(), test.myDistance);
+		edge.Render();
+		EXPECT_FLOAT_EQ(edge.GetDistance(), 2.0f);
 	}
 	EXPECT_EQ(TakeLog(), "");
-}
-
-TEST_F(NodeGraphTest, RenderingAnEdgeMakesItsDistanceFollowTheNodes)
-{
-	AI::NGNode first = MakeNode(1, {0.0f, 0.0f, 0.0f});
-	AI::NGNode second = MakeNode(2, {3.0f, 4.0f, 0.0f});
-	AI::NGEdge edge;
-	edge.Connect(&first, &second);
-	ASSERT_FLOAT_EQ(edge.GetDistance(), 5.0f);
-	second.SetPosition({0.0f, 0.0f, 2.0f});
-	EXPECT_FLOAT_EQ(edge.GetDistance(), 5.0f) << "moving a node alone changes nothing";
-	edge.Render(); // no engine and no line: only the distance
-	EXPECT_FLOAT_EQ(edge.GetDistance(), 2.0f);
 }
 
 TEST_F(NodeGraphTest, ANodeHoldsTwoEdgesAndRefusesAThird)
@@ -105,31 +97,23 @@ TEST_F(NodeGraphTest, ANodeHoldsTwoEdgesAndRefusesAThird)
 	node.AddEdge(&edges[1]);
 	EXPECT_EQ(TakeLog(), "");
 	node.AddEdge(&edges[2]);
-	EXPECT_NE(
-	    TakeLog().find(Critical(34, "AI::NGNode::AddEdge", "Tried to connect more than 2 edges to node")),
-	    std::string::npos);
-	EXPECT_EQ(node.GetEdgeSlots()[0], &edges[0]);
-	EXPECT_EQ(node.GetEdgeSlots()[1], &edges[1]);
+	ExpectLogged(Critical(34, "AI::NGNode::AddEdge", "Tried to connect more than 2 edges to node"));
+	EXPECT_EQ(Slots(node), (std::vector<const AI::NGEdge*>{&edges[0], &edges[1]}));
+	EXPECT_EQ(Slots(AI::NGNode(node)), Slots(node)) << "a copy shares the edges";
 
 	// Removing the first leaves the second where it was; the next edge takes the free slot.
 	node.RemoveEdge(&edges[0]);
-	EXPECT_EQ(node.GetEdgeSlots()[0], nullptr);
-	EXPECT_EQ(node.GetEdgeSlots()[1], &edges[1]);
+	EXPECT_EQ(Slots(node), (std::vector<const AI::NGEdge*>{nullptr, &edges[1]}));
 	node.AddEdge(&edges[2]);
-	EXPECT_EQ(node.GetEdgeSlots()[0], &edges[2]);
-	EXPECT_EQ(node.GetEdgeSlots()[1], &edges[1]);
+	EXPECT_EQ(Slots(node), (std::vector<const AI::NGEdge*>{&edges[2], &edges[1]}));
 	node.RemoveEdge(&edges[1]);
-	EXPECT_EQ(node.GetEdgeSlots()[0], &edges[2]);
-	EXPECT_EQ(node.GetEdgeSlots()[1], nullptr);
+	EXPECT_EQ(Slots(node), (std::vector<const AI::NGEdge*>{&edges[2], nullptr}));
 	EXPECT_EQ(TakeLog(), "");
 
 	// An edge the node does not hold: reported, and both slots stay.
 	node.RemoveEdge(&edges[0]);
-	EXPECT_NE(TakeLog().find(
-	              Critical(51, "AI::NGNode::RemoveEdge", "Tried to remove an unconnected edge from node")),
-	          std::string::npos);
-	EXPECT_EQ(node.GetEdgeSlots()[0], &edges[2]);
-	EXPECT_EQ(node.GetEdgeSlots()[1], nullptr);
+	ExpectLogged(Critical(51, "AI::NGNode::RemoveEdge", "Tried to remove an unconnected edge from node"));
+	EXPECT_EQ(Slots(node), (std::vector<const AI::NGEdge*>{&edges[2], nullptr}));
 }
 
 TEST_F(NodeGraphTest, QueriesWalkAChain)
@@ -153,36 +137,28 @@ TEST_F(NodeGraphTest, QueriesWalkAChain)
 	EXPECT_EQ(nodes[1].FindConnectingEdge(&nodes[0]), &edges[0]);
 	EXPECT_EQ(nodes[1].FindConnectingEdge(&nodes[2]), &edges[1]);
 	EXPECT_EQ(nodes[2].FindConnectingEdge(&nodes[1]), &edges[1]);
-
-	GrowingArray<AI::NGNode*> neighbours(4, 4);
-	nodes[1].GetNeighbours(neighbours);
-	ASSERT_EQ(neighbours.Count(), 2);
-	EXPECT_EQ(neighbours[0], &nodes[0]);
-	EXPECT_EQ(neighbours[1], &nodes[2]);
-	neighbours.RemoveAll();
-	nodes[2].GetNeighbours(neighbours);
-	ASSERT_EQ(neighbours.Count(), 1);
-	EXPECT_EQ(neighbours[0], &nodes[1]);
+	EXPECT_EQ(Neighbours(nodes[1]), (std::vector<AI::NGNode*>{&nodes[0], &nodes[2]}));
+	EXPECT_EQ(Neighbours(nodes[2]), (std::vector<AI::NGNode*>{&nodes[1]}));
+	// A copy of an edge joins the same nodes.
+	AI::NGEdge edgeCopy;
+	edgeCopy = edges[0];
+	EXPECT_EQ(edgeCopy.GetConnections()[0], &nodes[0]);
+	EXPECT_EQ(edgeCopy.GetConnections()[1], &nodes[1]);
 	// After its first edge is removed the middle node still has the second neighbour.
 	nodes[1].RemoveEdge(&edges[0]);
-	neighbours.RemoveAll();
-	nodes[1].GetNeighbours(neighbours);
-	ASSERT_EQ(neighbours.Count(), 1);
-	EXPECT_EQ(neighbours[0], &nodes[2]);
+	EXPECT_EQ(Neighbours(nodes[1]), (std::vector<AI::NGNode*>{&nodes[2]}));
 	EXPECT_EQ(TakeLog(), "");
 
 	// Unconnected pairs: reported; the answer falls back to the first end and first slot.
 	EXPECT_EQ(edges[0].GetOtherNode(&nodes[2]), &nodes[0]);
-	EXPECT_NE(TakeLog().find(Critical(50, "AI::NGEdge::GetOtherNode",
-	                                  "Tried to get other node whilst not connected to edge")),
-	          std::string::npos);
+	ExpectLogged(
+	    Critical(50, "AI::NGEdge::GetOtherNode", "Tried to get other node whilst not connected to edge"));
 	EXPECT_EQ(nodes[0].FindConnectingEdge(&nodes[2]), &edges[0]);
-	EXPECT_NE(TakeLog().find(Critical(117, "AI::NGNode::FindConnectingEdge",
-	                                  "Tried to find connection for unconnected nodes")),
-	          std::string::npos);
+	ExpectLogged(
+	    Critical(117, "AI::NGNode::FindConnectingEdge", "Tried to find connection for unconnected nodes"));
 	// The middle node's first slot is empty now: nothing to fall back on.
 	EXPECT_EQ(nodes[1].FindConnectingEdge(&nodes[0]), nullptr);
-	EXPECT_NE(TakeLog().find("Tried to find connection for unconnected nodes"), std::string::npos);
+	ExpectLogged("Tried to find connection for unconnected nodes");
 }
 
 TEST_F(NodeGraphTest, AnEdgeWithAMissingNodeKeepsItsDistance)
@@ -191,22 +167,21 @@ TEST_F(NodeGraphTest, AnEdgeWithAMissingNodeKeepsItsDistance)
 	AI::NGEdge edge;
 	edge.SetDistance(7.5f);
 	edge.Connect(&node, nullptr);
-	EXPECT_NE(TakeLog().find("Tried to connect an edge to a missing node"), std::string::npos);
+	ExpectLogged("Tried to connect an edge to a missing node");
 	EXPECT_FLOAT_EQ(edge.GetDistance(), 7.5f);
 	EXPECT_EQ(edge.GetFirstConnectionID(), 5);
 	EXPECT_EQ(edge.GetSecondConnectionID(), 0);
 	edge.Render();
 	EXPECT_FLOAT_EQ(edge.GetDistance(), 7.5f);
 	edge.Connect(nullptr, &node);
+	ExpectLogged("Tried to connect an edge to a missing node");
 	EXPECT_EQ(edge.GetFirstConnectionID(), 0);
 	EXPECT_EQ(edge.GetSecondConnectionID(), 5);
 	EXPECT_EQ(edge.GetOtherNode(&node), nullptr) << "the other end is the missing one";
 
 	// A node with one empty slot has one neighbour at most; the missing end adds none.
 	node.AddEdge(&edge);
-	GrowingArray<AI::NGNode*> neighbours(2, 2);
-	node.GetNeighbours(neighbours);
-	EXPECT_EQ(neighbours.Count(), 0);
+	EXPECT_EQ(Neighbours(node), std::vector<AI::NGNode*>{});
 }
 
 TEST_F(NodeGraphTest, VisualsNeedAnEngine)
@@ -214,31 +189,13 @@ TEST_F(NodeGraphTest, VisualsNeedAnEngine)
 	AI::NGNode node;
 	node.InitDebugInstance();
 	EXPECT_EQ(node.GetDebugInstance(), nullptr);
-	EXPECT_NE(TakeLog().find("Couldn't create the path node marker without an engine"), std::string::npos);
+	ExpectLogged("Couldn't create the path node marker without an engine");
 	node.Render();
 	node.DestroyDebugInstance();
 
 	AI::NGEdge edge;
 	edge.InitDebugLine();
 	EXPECT_EQ(edge.GetDebugLine(), nullptr);
-	EXPECT_NE(TakeLog().find("Couldn't create the line model"), std::string::npos);
+	ExpectLogged("Couldn't create the line model");
 	edge.DestroyDebugLine();
-}
-
-TEST_F(NodeGraphTest, CopiesShareEdgesAndNodes)
-{
-	AI::NGNode first = MakeNode(1, {0.0f, 0.0f, 0.0f});
-	AI::NGNode second = MakeNode(2, {0.0f, 1.0f, 0.0f});
-	AI::NGEdge edges[2];
-	first.AddEdge(&edges[0]);
-	first.AddEdge(&edges[1]);
-	edges[0].Connect(&first, &second);
-
-	const AI::NGNode nodeCopy = first;
-	EXPECT_EQ(nodeCopy.GetEdgeSlots()[0], &edges[0]);
-	EXPECT_EQ(nodeCopy.GetEdgeSlots()[1], &edges[1]);
-	AI::NGEdge edgeCopy;
-	edgeCopy = edges[0];
-	EXPECT_EQ(edgeCopy.GetConnections()[0], &first);
-	EXPECT_EQ(edgeCopy.GetConnections()[1], &second);
 }
