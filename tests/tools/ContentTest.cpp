@@ -7,6 +7,7 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
+#include <bit>
 #include <cmath>
 #include <filesystem>
 #include <set>
@@ -22,36 +23,13 @@
 
 namespace
 {
-struct Vec
-{
-	double x, y, z;
-};
+using ContentTestSupport::Dot;
+using Vec = Vector3<double>;
 
 Vec Read(const Collada::Source& aSource, uint32_t anIndex)
 {
 	const float* value = aSource.Element(anIndex);
-	return value ? Vec{value[0], value[1], value[2]} : Vec{0.0, 0.0, 0.0};
-}
-
-Vec Sub(const Vec& aLeft, const Vec& aRight)
-{
-	return {aLeft.x - aRight.x, aLeft.y - aRight.y, aLeft.z - aRight.z};
-}
-
-Vec Scale(const Vec& aVector, double aFactor)
-{
-	return {aVector.x * aFactor, aVector.y * aFactor, aVector.z * aFactor};
-}
-
-double Dot(const Vec& aLeft, const Vec& aRight)
-{
-	return aLeft.x * aRight.x + aLeft.y * aRight.y + aLeft.z * aRight.z;
-}
-
-Vec Cross(const Vec& aLeft, const Vec& aRight)
-{
-	return {aLeft.y * aRight.z - aLeft.z * aRight.y, aLeft.z * aRight.x - aLeft.x * aRight.z,
-	        aLeft.x * aRight.y - aLeft.y * aRight.x};
+	return value ? Vec(value[0], value[1], value[2]) : Vec(0.0, 0.0, 0.0);
 }
 
 using ContentTestSupport::GeneratedContent;
@@ -69,12 +47,7 @@ void CheckTexture(const std::string& anImagePath, bool anSrgbFlag)
 	std::string error;
 	ASSERT_TRUE(Dds::LoadFromFile(GeneratedFileFor(anImagePath), image, error)) << error;
 	const Dds::ImageInfo& info = image.Info();
-	uint32_t fullChain = 1;
-	while ((std::max(info.myWidth, info.myHeight) >> fullChain) > 0)
-	{
-		++fullChain;
-	}
-	EXPECT_EQ(info.myMipLevels, fullChain) << anImagePath;
+	EXPECT_EQ(info.myMipLevels, std::bit_width(std::max(info.myWidth, info.myHeight))) << anImagePath;
 	EXPECT_GE(info.myWidth, 128u) << anImagePath;
 	EXPECT_EQ(Dds::IsSRGB(info.myFormat), anSrgbFlag) << anImagePath;
 	EXPECT_EQ(Dds::BlockBytes(info.myFormat), 4u) << anImagePath;
@@ -143,30 +116,23 @@ TEST(ContentDocumentTest, EveryMeshHasTheLitLayoutAndEveryMaterialExistingTextur
 		mesh.Triangulate();
 		for (const Collada::PolygonSet& set : mesh.mySets)
 		{
-			// Exactly the inputs of POSITION, NORMAL, TEXCOORD, TANGENT, BINORMAL and nothing else.
+			// Exactly the inputs of POSITION, NORMAL, TEXCOORD, TANGENT, BINORMAL and nothing else, the
+			// last three of set 0.
+			using enum Collada::Semantic;
+			const Collada::Semantic order[5] = {Position, Normal, TexCoord, TexTangent, TexBinormal};
 			std::multiset<Collada::Semantic> semantics;
 			for (const Collada::Input& input : set.myInputs)
 			{
 				semantics.insert(input.mySemantic);
 			}
-			EXPECT_EQ(semantics,
-			          (std::multiset<Collada::Semantic>{
-			              Collada::Semantic::Position, Collada::Semantic::Normal, Collada::Semantic::TexCoord,
-			              Collada::Semantic::TexTangent, Collada::Semantic::TexBinormal}))
+			EXPECT_EQ(semantics, std::multiset<Collada::Semantic>(std::begin(order), std::end(order)))
 			    << name << ": " << set.myMaterial;
-			const Collada::Input* inputs[5] = {set.FindInput(Collada::Semantic::Position),
-			                                   set.FindInput(Collada::Semantic::Normal),
-			                                   set.FindInput(Collada::Semantic::TexCoord, 0),
-			                                   set.FindInput(Collada::Semantic::TexTangent, 0),
-			                                   set.FindInput(Collada::Semantic::TexBinormal, 0)};
-			if (std::find(std::begin(inputs), std::end(inputs), nullptr) != std::end(inputs))
-			{
-				ADD_FAILURE() << name << ": a set lacks an input of set 0";
-				continue;
-			}
+			const Collada::Input* inputs[5] = {};
 			const Collada::Source* sources[5] = {};
 			for (int at = 0; at < 5; ++at)
 			{
+				inputs[at] = set.FindInput(order[at], at < 2 ? -1 : 0);
+				ASSERT_NE(inputs[at], nullptr) << name << ": " << set.myMaterial;
 				sources[at] = mesh.FindSource(inputs[at]->mySource);
 				ASSERT_NE(sources[at], nullptr) << name;
 			}
@@ -191,7 +157,7 @@ TEST(ContentDocumentTest, EveryMeshHasTheLitLayoutAndEveryMaterialExistingTextur
 					                  std::abs(Dot(b, b) - 1.0) < 1e-3;
 					const bool orthogonal = std::abs(Dot(n, t)) < 1e-3 && std::abs(Dot(n, b)) < 1e-3 &&
 					                        std::abs(Dot(t, b)) < 1e-3;
-					const bool rightHanded = Dot(Cross(t, b), n) > 0.99;
+					const bool rightHanded = Dot(t.Cross(b), n) > 0.99;
 					if (!unit || !orthogonal || !rightHanded)
 					{
 						++failures;
@@ -201,17 +167,17 @@ TEST(ContentDocumentTest, EveryMeshHasTheLitLayoutAndEveryMaterialExistingTextur
 				}
 				// The face winds counter-clockwise around its normals, and the frame follows the
 				// texture: the tangent along +u and the binormal along +v over this triangle.
-				const Vec edge1 = Sub(position[1], position[0]);
-				const Vec edge2 = Sub(position[2], position[0]);
-				const Vec faceNormal = Cross(edge1, edge2);
+				const Vec edge1 = position[1] - position[0];
+				const Vec edge2 = position[2] - position[0];
+				const Vec faceNormal = edge1.Cross(edge2);
 				const double du1 = u[1] - u[0], dv1 = v[1] - v[0], du2 = u[2] - u[0], dv2 = v[2] - v[0];
 				const double determinant = du1 * dv2 - du2 * dv1;
 				if (Dot(faceNormal, faceNormal) < 1e-12 || std::abs(determinant) < 1e-9)
 				{
 					continue;
 				}
-				const Vec alongU = Scale(Sub(Scale(edge1, dv2), Scale(edge2, dv1)), 1.0 / determinant);
-				const Vec alongV = Scale(Sub(Scale(edge2, du1), Scale(edge1, du2)), 1.0 / determinant);
+				const Vec alongU = (edge1 * dv2 - edge2 * dv1) * (1.0 / determinant);
+				const Vec alongV = (edge2 * du1 - edge1 * du2) * (1.0 / determinant);
 				for (int k = 0; k < 3; ++k)
 				{
 					if (Dot(faceNormal, normal[k]) <= 0.0 || Dot(alongU, tangent[k]) <= 0.0 ||

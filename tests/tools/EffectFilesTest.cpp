@@ -149,55 +149,36 @@ protected:
 		return effect.GetTechniqueCount() > 0 ? &effect : nullptr;
 	}
 
-	Gpu::ShaderResourceView* Upload(const Image& anImage)
+	// A texture of the given description holding someTexels; its view, or null (test failed).
+	Gpu::ShaderResourceView* Upload(const Gpu::TextureDesc& aDesc, const void* someTexels, uint32_t aRowPitch)
 	{
-		Gpu::Texture* texture = MakeTexture({.myWidth = anImage.myWidth,
-		                                     .myHeight = anImage.myHeight,
-		                                     .myFormat = Dds::Format::R32G32B32A32_FLOAT,
-		                                     .myLabel = "test input"});
-		EXPECT_NE(texture, nullptr);
-		if (!texture)
-		{
-			return nullptr;
-		}
-		EXPECT_TRUE(
-		    texture->Upload(0, 0, anImage.myValues.data(), static_cast<uint32_t>(anImage.myWidth * 16)));
-		return texture->GetDefaultShaderResourceView();
+		Gpu::Texture* texture = MakeTexture(aDesc);
+		EXPECT_TRUE(texture && texture->Upload(0, 0, someTexels, aRowPitch)) << aDesc.myLabel;
+		return texture ? texture->GetDefaultShaderResourceView() : nullptr;
 	}
 
-	// A UNORM volume of aSize^3 texels, r along width, g along height, b along depth.
-	Gpu::ShaderResourceView* Volume(int aSize, const std::function<Pixel(int, int, int)>& aTexel)
+	// A UNORM volume of 2^3 texels of one value.
+	Gpu::ShaderResourceView* Volume(Pixel aTexel)
 	{
-		Gpu::Texture* texture = MakeTexture({.myKind = Gpu::TextureKind::Texture3D,
-		                                     .myWidth = aSize,
-		                                     .myHeight = aSize,
-		                                     .myDepth = aSize,
-		                                     .myFormat = Dds::Format::R8G8B8A8_UNORM,
-		                                     .myLabel = "test volume"});
-		EXPECT_NE(texture, nullptr);
-		if (!texture)
-		{
-			return nullptr;
-		}
-		std::vector<uint8_t> bytes;
-		for (int z = 0; z < aSize; ++z)
-		{
-			for (int y = 0; y < aSize; ++y)
-			{
-				for (int x = 0; x < aSize; ++x)
-				{
-					const Pixel texel = aTexel(x, y, z);
-					bytes.insert(bytes.end(), texel.begin(), texel.end());
-				}
-			}
-		}
-		EXPECT_TRUE(texture->Upload(0, 0, bytes.data(), static_cast<uint32_t>(aSize * 4)));
-		return texture->GetDefaultShaderResourceView();
+		const std::vector<Pixel> texels(8, aTexel);
+		return Upload({.myKind = Gpu::TextureKind::Texture3D,
+		               .myWidth = 2,
+		               .myHeight = 2,
+		               .myDepth = 2,
+		               .myFormat = Dds::Format::R8G8B8A8_UNORM,
+		               .myLabel = "test volume"},
+		              texels.data(), 8);
 	}
 
 	void Bind(Fx::Effect& anEffect, const char* aName, const Image& anImage)
 	{
-		EXPECT_TRUE(anEffect.GetVariableByName(aName)->SetResource(Upload(anImage))) << aName;
+		Gpu::ShaderResourceView* view =
+		    Upload({.myWidth = anImage.myWidth,
+		            .myHeight = anImage.myHeight,
+		            .myFormat = Dds::Format::R32G32B32A32_FLOAT,
+		            .myLabel = "test input"},
+		           anImage.myValues.data(), static_cast<uint32_t>(anImage.myWidth * 16));
+		EXPECT_TRUE(anEffect.GetVariableByName(aName)->SetResource(view)) << aName;
 	}
 
 	void Set(Fx::Effect& anEffect, const char* aName, std::array<float, 4> aValue)
@@ -262,17 +243,6 @@ protected:
 		EXPECT_TRUE(Gpu::ReadRenderTarget(GetContext(), *aView, image.myValues));
 		image.myValues.resize(static_cast<size_t>(image.myWidth) * image.myHeight * 4);
 		return image;
-	}
-
-	// Writes the image (clamped to 0..1) to /tmp/lumora-effect-<name>.png, to look at.
-	static void SavePicture(const Image& anImage, const std::string& aName)
-	{
-		std::vector<uint8_t> bytes;
-		for (const float value : anImage.myValues)
-		{
-			bytes.push_back(static_cast<uint8_t>(std::lround(std::clamp(value, 0.0f, 1.0f) * 255.0f)));
-		}
-		Gpu::SavePng("/tmp/lumora-effect-" + aName + ".png", anImage.myWidth, anImage.myHeight, bytes.data());
 	}
 
 	// The full-screen effect with its camera: identity view, the far-plane corners above.
@@ -496,8 +466,7 @@ TEST_F(EffectFilesTest, AmbientPassAddsVolumeIrradianceShadowedAndEmissiveLight)
 	// Stored coefficient c as c * 0.5 + 0.5: red has a constant term 0.5, green 0.5 * n.y,
 	// blue 0.5 * n.x (zero for this normal); the quadratic terms are zero.
 	auto coefficients = [&](const char* aName, Pixel aTexel) {
-		EXPECT_TRUE(
-		    effect->GetVariableByName(aName)->SetResource(Volume(2, [&](int, int, int) { return aTexel; })));
+		EXPECT_TRUE(effect->GetVariableByName(aName)->SetResource(Volume(aTexel)));
 	};
 	coefficients("cArTexture", {128, 128, 128, 192});
 	coefficients("cAgTexture", {128, 192, 128, 128});
@@ -572,7 +541,6 @@ TEST_F(EffectFilesTest, OcclusionDarkensBesideAStepAndNowhereOnAnOpenPlane)
 		Gpu::RenderTargetView* target = Target(64, 64);
 		DrawQuad(*effect, "RenderSSAO");
 		const Image result = Read(target);
-		SavePicture(result, stepFlag ? "ssao-step" : "ssao-plane");
 		float nearStep = 0.0f;
 		for (int y = 0; y < 64; ++y)
 		{
@@ -645,7 +613,6 @@ TEST_F(EffectFilesTest, LightsReachNoFartherThanTheirFalloffAndSpotsStayInTheirC
 		Gpu::RenderTargetView* target = Target(33, 33, {0.125f, 0.125f, 0.125f, 1.0f}, true, 0.0f);
 		DrawQuad(*effect, "Render");
 		const Image result = Read(target);
-		SavePicture(result, spotFlag ? "spot-light" : "point-light");
 
 		const float* center = result.At(16, 16);
 		EXPECT_GT(center[0], center[1] + 0.05f); // the light's colour: red over green over blue

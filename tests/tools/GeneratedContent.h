@@ -1,6 +1,7 @@
 #pragma once
 // GeneratedContent: runs the content generator once per test binary into a scratch directory and
-// gives the tests its files; LoadGeneratedImage reads one of them back with the DDS reader.
+// gives the tests its files; LoadGeneratedImage reads one of them back with the DDS reader; Dot is the
+// tests' own, so that a fault in the generator's vector helpers cannot hide in both.
 
 #include <gtest/gtest.h>
 
@@ -10,11 +11,17 @@
 #include <vector>
 
 #include "Generator.h"
+#include "core/Vector3.h"
 #include "platform/dds/DdsFile.h"
 #include "support/TestSupport.h"
 
 namespace ContentTestSupport
 {
+template <typename T> T Dot(const Vector3<T>& aLeft, const Vector3<T>& aRight)
+{
+	return aLeft.x * aRight.x + aLeft.y * aRight.y + aLeft.z * aRight.z;
+}
+
 class GeneratedContent
 {
 public:

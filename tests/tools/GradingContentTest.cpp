@@ -5,6 +5,7 @@
 
 #include <array>
 #include <cmath>
+#include <functional>
 #include <string>
 
 #include "GeneratedContent.h"
@@ -34,48 +35,49 @@ void Load(const std::string& aName, Dds::Image& anImageOut)
 	EXPECT_EQ(info.myMipLevels, 1u) << aName;
 	EXPECT_EQ(info.myFormat, Dds::Format::R8G8B8A8_UNORM) << aName;
 }
+
+// Fails for each texel (the first five) that anOk refuses, given the texel and its red, green and
+// blue indices.
+void ExpectEveryTexel(const Dds::Image& anImage,
+                      const std::function<bool(const Bytes&, const uint32_t*)>& anOk)
+{
+	int wrong = 0;
+	for (uint32_t index = 0; index < 32 * 32 * 32 && wrong < 5; ++index)
+	{
+		const uint32_t at[3] = {index % 32, index / 32 % 32, index / 1024};
+		if (!anOk(At(anImage, at[0], at[1], at[2]), at) && ++wrong)
+		{
+			ADD_FAILURE() << "texel (" << at[0] << ", " << at[1] << ", " << at[2] << ")";
+		}
+	}
+}
 } // namespace
 
 TEST(GradingContentTest, DefaultLookupIsTheIdentity)
 {
 	Dds::Image image;
 	ASSERT_NO_FATAL_FAILURE(Load("grading/default.dds", image));
-	int wrong = 0;
-	for (uint32_t index = 0; index < 32 * 32 * 32 && wrong < 5; ++index)
-	{
-		const uint32_t red = index % 32, green = index / 32 % 32, blue = index / 1024;
-		if (At(image, red, green, blue) != Bytes{Encoded(red), Encoded(green), Encoded(blue), 255})
-		{
-			++wrong;
-			ADD_FAILURE() << "texel (" << red << ", " << green << ", " << blue << ")";
-		}
-	}
-	EXPECT_EQ(At(image, 31, 31, 31), (Bytes{255, 255, 255, 255}));
+	ExpectEveryTexel(image, [](const Bytes& aTexel, const uint32_t* anAt) {
+		return aTexel == Bytes{Encoded(anAt[0]), Encoded(anAt[1]), Encoded(anAt[2]), 255};
+	});
 }
 
 TEST(GradingContentTest, WarmLookupIsMonotonicLiftsShadowsAndWarmsHighlights)
 {
 	Dds::Image image;
 	ASSERT_NO_FATAL_FAILURE(Load("grading/warm.dds", image));
-	int wrong = 0;
-	for (uint32_t index = 0; index < 32 * 32 * 32 && wrong < 5; ++index)
-	{
-		const uint32_t at[3] = {index % 32, index / 32 % 32, index / 1024};
-		const Bytes texel = At(image, at[0], at[1], at[2]);
-		bool ok = texel[3] == 255;
+	ExpectEveryTexel(image, [&](const Bytes& aTexel, const uint32_t* anAt) {
+		bool ok = aTexel[3] == 255;
 		for (int channel = 0; channel < 3; ++channel)
 		{
 			// Not below the texel one step lower along its own axis, and still close to the input.
-			uint32_t lower[3] = {at[0], at[1], at[2]};
+			uint32_t lower[3] = {anAt[0], anAt[1], anAt[2]};
 			lower[channel] -= lower[channel] > 0 ? 1 : 0;
-			ok = ok && At(image, lower[0], lower[1], lower[2])[channel] <= texel[channel] &&
-			     std::abs(texel[channel] - Encoded(at[channel])) <= 40;
+			ok = ok && At(image, lower[0], lower[1], lower[2])[channel] <= aTexel[channel] &&
+			     std::abs(aTexel[channel] - Encoded(anAt[channel])) <= 40;
 		}
-		if (!ok && ++wrong)
-		{
-			ADD_FAILURE() << "texel (" << at[0] << ", " << at[1] << ", " << at[2] << ")";
-		}
-	}
+		return ok;
+	});
 	const Bytes black = At(image, 0, 0, 0);
 	EXPECT_TRUE(black[0] > 0 && black[1] > 0 && black[2] > 0 && black[0] < 20) << "shadows not lifted";
 	for (const uint32_t level : {24u, 31u})
