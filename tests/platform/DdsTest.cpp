@@ -145,7 +145,7 @@ TEST(DdsFormatTest, SRGBAndTypelessMaps)
 	}
 }
 
-TEST(DdsFileTest, EveryFormatRoundTripsByteForByte)
+TEST(DdsFileTest, EveryFormatAndLayoutRoundTripsByteForByte)
 {
 	ScratchDir scratch;
 	const struct
@@ -169,18 +169,14 @@ TEST(DdsFileTest, EveryFormatRoundTripsByteForByte)
 		ExpectRoundTrip(scratch, ImageInfo{20, 12, 1, 1, 5, 0, test.format}, test.dx10Flag,
 		                Dds::FormatName(test.format));
 	}
-}
 
-TEST(DdsFileTest, CubesVolumesAndArraysRoundTrip)
-{
-	ScratchDir scratch;
 	const struct
 	{
 		const char* label;
 		ImageInfo info;
 		bool dx10Flag;
 		uint64_t totalBytes;
-	} cases[] = {
+	} layouts[] = {
 	    // 4 bytes x (256^2 + 128^2 + ... + 1) = 349524 per face.
 	    {"cube", ImageInfo{256, 256, 1, 6, 9, Dds::MiscTextureCube, Format::R8G8B8A8_UNORM}, false,
 	     6 * 349524ull},
@@ -196,16 +192,15 @@ TEST(DdsFileTest, CubesVolumesAndArraysRoundTrip)
 	    {"line", ImageInfo{16, 1, 1, 1, 5, 0, Format::R8G8B8A8_UNORM, ResourceDimension::Texture1D}, true,
 	     4 * 31},
 	};
-	for (const auto& test : cases)
+	for (const auto& test : layouts)
 	{
 		SCOPED_TRACE(test.label);
-		const Dds::Image image = MakeImage(test.info);
-		EXPECT_EQ(image.Bytes().size(), test.totalBytes);
+		EXPECT_EQ(MakeImage(test.info).Bytes().size(), test.totalBytes);
 		ExpectRoundTrip(scratch, test.info, test.dx10Flag, test.label);
 	}
 
 	// Subresources follow Direct3D's order: face 1 starts after face 0's whole chain.
-	const Dds::Image cube = MakeImage(cases[0].info);
+	const Dds::Image cube = MakeImage(layouts[0].info);
 	EXPECT_EQ(cube.Data(0, 1) - cube.Data(0, 0), 349524);
 	EXPECT_EQ(cube.Data(8, 5) - cube.Data(0, 0), 6 * 349524 - 4);
 	EXPECT_EQ(cube.RowPitch(1), 512u);
@@ -304,6 +299,10 @@ TEST(DdsFileTest, MalformedInputFailsWithAMessage)
 	    {"dimension", dx10, [](auto& b) { SetU32(b, 132, 7); },
 	     "cube flag is set on a texture that is not 2D"},
 	    {"dimension", dx10, [](auto& b) { SetU32(b, 132, 7), SetU32(b, 136, 0); }, "resource dimension 7"},
+	    // Cut inside the magic, the legacy header and the DX10 header.
+	    {"cut magic", dx10, [](auto& b) { b.resize(3); }, "truncated"},
+	    {"cut header", legacy, [](auto& b) { b.resize(100); }, "truncated: 100 bytes"},
+	    {"cut DX10 header", dx10, [](auto& b) { b.resize(140); }, "truncated: 140 bytes"},
 	};
 	for (const auto& test : cases)
 	{
@@ -317,24 +316,6 @@ TEST(DdsFileTest, MalformedInputFailsWithAMessage)
 		EXPECT_NE(error.find(test.message), std::string::npos) << test.label << ": " << error;
 		EXPECT_TRUE(image.IsEmpty()) << test.label;
 	}
-
-	// Every proper prefix of a valid file is refused.
-	for (const std::vector<uint8_t>* file : {&legacy, &dx10})
-	{
-		for (size_t length = 0; length < file->size(); ++length)
-		{
-			// A copy of exactly that length, so reading past it shows under ASan.
-			const std::vector<uint8_t> prefix(file->begin(), file->begin() + std::ptrdiff_t(length));
-			Dds::Image image;
-			std::string error;
-			ASSERT_FALSE(Dds::LoadFromMemory(prefix.data(), prefix.size(), image, error)) << length;
-			ASSERT_NE(
-			    error.find(length < 4 ? "truncated" : "truncated: " + std::to_string(length) + " bytes"),
-			    std::string::npos)
-			    << length << ": " << error;
-		}
-	}
-
 	ScratchDir scratch;
 	const std::string path = scratch.File("short.dds");
 	WriteWholeFile(path, std::string(legacy.begin(), legacy.end() - 1));

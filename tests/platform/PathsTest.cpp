@@ -86,7 +86,7 @@ TEST_F(PathsTest, TemporaryForGivesUniqueNewFilesBesideTheTarget)
 	EXPECT_EQ(Paths::TemporaryFor(myScratch.File("missing/level.xml")), "");
 }
 
-TEST_F(PathsTest, ReplaceWithSwapsInTheNewContentKeepingPermissions)
+TEST_F(PathsTest, ReplaceWithSwapsInTheNewContentKeepingPermissionsOrKeepsTheOldFile)
 {
 	WriteWholeFile("level.xml", "old");
 	fs::permissions("level.xml", fs::perms(0640));
@@ -99,10 +99,8 @@ TEST_F(PathsTest, ReplaceWithSwapsInTheNewContentKeepingPermissions)
 		EXPECT_FALSE(fs::exists(temporary));
 	}
 	EXPECT_EQ(fs::status("level.xml").permissions(), fs::perms(0640));
-}
 
-TEST_F(PathsTest, FailedReplaceKeepsTheOldFileAndRemovesTheTemporary)
-{
+	// A failed replace keeps the old file and removes the temporary.
 	WriteWholeFile("plain", "old");
 	fs::create_directories("busy");
 	WriteWholeFile("busy/inside.txt", "kept");
