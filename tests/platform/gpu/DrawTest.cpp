@@ -11,13 +11,8 @@
 class DrawTest : public GpuTest
 {
 protected:
-	void SetUp() override
+	void SetUpGpu() override
 	{
-		GpuTest::SetUp();
-		if (IsSkipped() || HasFailure())
-		{
-			return;
-		}
 		myTarget = BindTarget(Dds::Format::R8G8B8A8_UNORM_SRGB, 64, 64);
 		ASSERT_NE(myTarget, nullptr);
 		GetContext().ClearRenderTargetView(*myTarget, myClearColor);

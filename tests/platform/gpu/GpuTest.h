@@ -1,8 +1,7 @@
 #pragma once
 // The fixture for tests that need a GL context: a headless device, current on the
 // test's thread. Without one the test is skipped, except under CI=true, where a
-// missing GL is a failure. Every report the layer makes is collected; a test that
-// expects one takes it with TakeReports(), and any left over fails the test.
+// missing GL is a failure. Reports are collected as ReportTest describes.
 // Beside it, what the GPU suites share: pixels read back, sRGB encoding.
 
 #include <array>
@@ -13,7 +12,7 @@
 #include <string>
 #include <vector>
 
-#include "core/CoreReport.h"
+#include "platform/ReportTest.h"
 #include "platform/gpu/Buffer.h"
 #include "platform/gpu/Device.h"
 #include "platform/gpu/Readback.h"
@@ -67,18 +66,12 @@ inline std::vector<ColorVertex> Quad(float aLeft, float aTop, float aRight, floa
 		GTEST_SKIP() << (aWhy);                                                                              \
 	} while (false)
 
-class GpuTest : public testing::Test
+class GpuTest : public ReportTest
 {
 protected:
 	void SetUp() override
 	{
-		ourReports.clear();
-		// The layer reports its failures at the error level; a broken invariant of the core
-		// below it would come at the critical level. Both are collected.
-		myPreviousHandler = CoreReport::GetCriticalHandler();
-		myPreviousErrorHandler = CoreReport::GetErrorHandler();
-		CoreReport::SetCriticalHandler(&Record);
-		CoreReport::SetErrorHandler(&Record);
+		ReportTest::SetUp();
 		if (!myDevice.Init(64, 64))
 		{
 			const std::string why =
@@ -86,7 +79,11 @@ protected:
 			ourReports.clear();
 			LUMORA_SKIP_OR_FAIL(why);
 		}
+		SetUpGpu();
 	}
+
+	// What a suite sets up on the device; runs only when there is one.
+	virtual void SetUpGpu() {}
 
 	void TearDown() override
 	{
@@ -100,32 +97,7 @@ protected:
 		}
 		myTextures.clear();
 		myDevice.Destroy();
-		CoreReport::SetCriticalHandler(myPreviousHandler);
-		CoreReport::SetErrorHandler(myPreviousErrorHandler);
-		EXPECT_TRUE(ourReports.empty()) << "Unexpected reports: " << Joined();
-	}
-
-	static void Record(int, const char* aFunctionName, const char* aMessage)
-	{
-		ourReports.push_back(std::string(aFunctionName) + ": " + aMessage);
-	}
-
-	// The reports made since the last call, as "function: message".
-	static std::vector<std::string> TakeReports() { return std::exchange(ourReports, {}); }
-
-	// Expects exactly one report per entry, each containing all of that entry's parts.
-	static void ExpectReports(const std::vector<std::vector<std::string>>& someParts)
-	{
-		const std::string all = Joined();
-		const std::vector<std::string> reports = TakeReports();
-		ASSERT_EQ(reports.size(), someParts.size()) << all;
-		for (size_t index = 0; index < reports.size(); ++index)
-		{
-			for (const std::string& part : someParts[index])
-			{
-				EXPECT_NE(reports[index].find(part), std::string::npos) << part << " in: " << reports[index];
-			}
-		}
+		ReportTest::TearDown();
 	}
 
 	// A texture that the fixture destroys; null (with the report kept) when Init fails.
@@ -230,20 +202,7 @@ protected:
 
 	Gpu::Context& GetContext() { return myDevice.GetContext(); }
 
-	static std::string Joined()
-	{
-		std::string text;
-		for (const std::string& report : ourReports)
-		{
-			text += report + "; ";
-		}
-		return text;
-	}
-
 	Gpu::Device myDevice;
 	std::vector<std::unique_ptr<Gpu::Texture>> myTextures;
 	std::deque<Gpu::Buffer> myBuffers; // a deque: buffers cannot move
-	CoreReport::Handler myPreviousHandler = nullptr;
-	CoreReport::Handler myPreviousErrorHandler = nullptr;
-	static inline std::vector<std::string> ourReports;
 };

@@ -30,24 +30,34 @@ Pixel Stored(const float aColor[4], Dds::Format aFormat)
 	return pixel;
 }
 
-constexpr Dds::Format ourFormats[] = {Dds::Format::R8G8B8A8_UNORM_SRGB, Dds::Format::R8G8B8A8_UNORM,
-                                      Dds::Format::B8G8R8A8_UNORM_SRGB, Dds::Format::B8G8R8A8_UNORM};
 constexpr float ourClearColor[4] = {0.6f, 0.2f, 1.0f, 1.0f};
 constexpr float ourQuadColor[4] = {1.0f, 0.6f, 0.0f, 1.0f};
 } // namespace
 
 using SwapChainTest = GpuTest;
 
-TEST_F(SwapChainTest, HeadlessBackBufferIsARenderTargetOfTheAskedSizeAndFormat)
+// Resizing with UNKNOWN keeps the format; the last case changes it.
+TEST_F(SwapChainTest, HeadlessBackBufferIsARenderTargetThatResizeBuffersReplaces)
 {
-	for (const Dds::Format format : ourFormats)
+	using Dds::Format;
+	const std::pair<Format, Format> cases[] = {{Format::R8G8B8A8_UNORM_SRGB, Format::UNKNOWN},
+	                                           {Format::R8G8B8A8_UNORM, Format::UNKNOWN},
+	                                           {Format::B8G8R8A8_UNORM_SRGB, Format::UNKNOWN},
+	                                           {Format::R8G8B8A8_UNORM_SRGB, Format::B8G8R8A8_UNORM}};
+	for (const auto& [initial, resized] : cases)
 	{
-		SCOPED_TRACE(static_cast<unsigned>(format));
+		const Format format = resized == Format::UNKNOWN ? initial : resized;
+		SCOPED_TRACE(Dds::FormatName(format));
 		Gpu::SwapChain swapChain;
-		ASSERT_TRUE(swapChain.Init(myDevice, 48, 20, format));
-		EXPECT_FALSE(swapChain.HasWindow());
+		ASSERT_TRUE(swapChain.Init(myDevice, 32, 16, initial));
+		Gpu::RenderTargetView* views[] = {swapChain.GetBuffer()->CreateRenderTargetView()};
+		ASSERT_TRUE(GetContext().SetRenderTargets(views, nullptr));
+		const size_t framebufferCount = GetContext().GetFramebufferCache().GetEntryCount();
+
+		ASSERT_TRUE(swapChain.ResizeBuffers(48, 20, resized));
 		EXPECT_EQ(swapChain.GetFormat(), format);
-		ASSERT_NE(swapChain.GetBuffer(), nullptr);
+		// The old view's framebuffer went with it, so nothing can draw into freed storage.
+		EXPECT_EQ(GetContext().GetFramebufferCache().GetEntryCount(), framebufferCount - 1);
 		Gpu::RenderTargetView* view = swapChain.GetBuffer()->CreateRenderTargetView();
 		ASSERT_NE(view, nullptr);
 		GetContext().ClearRenderTargetView(*view, ourClearColor);
@@ -59,36 +69,6 @@ TEST_F(SwapChainTest, HeadlessBackBufferIsARenderTargetOfTheAskedSizeAndFormat)
 		swapChain.Destroy();
 		EXPECT_EQ(swapChain.GetBuffer(), nullptr);
 	}
-}
-
-TEST_F(SwapChainTest, ResizeBuffersReplacesTheBufferAndItsViews)
-{
-	Gpu::SwapChain swapChain;
-	ASSERT_TRUE(swapChain.Init(myDevice, 32, 16, Dds::Format::R8G8B8A8_UNORM_SRGB));
-	Gpu::RenderTargetView* views[] = {swapChain.GetBuffer()->CreateRenderTargetView()};
-	ASSERT_TRUE(GetContext().SetRenderTargets(views, nullptr));
-	const size_t framebufferCount = GetContext().GetFramebufferCache().GetEntryCount();
-
-	ASSERT_TRUE(swapChain.ResizeBuffers(64, 8, Dds::Format::UNKNOWN));
-	EXPECT_EQ(swapChain.GetWidth(), 64);
-	EXPECT_EQ(swapChain.GetHeight(), 8);
-	EXPECT_EQ(swapChain.GetFormat(), Dds::Format::R8G8B8A8_UNORM_SRGB);
-	// The old view's framebuffer went with it, so nothing can draw into freed storage.
-	EXPECT_EQ(GetContext().GetFramebufferCache().GetEntryCount(), framebufferCount - 1);
-	Gpu::RenderTargetView* view = swapChain.GetBuffer()->CreateRenderTargetView();
-	ASSERT_NE(view, nullptr);
-	EXPECT_EQ(view->GetWidth(), 64);
-	EXPECT_EQ(view->GetHeight(), 8);
-
-	ASSERT_TRUE(swapChain.ResizeBuffers(16, 16, Dds::Format::B8G8R8A8_UNORM));
-	EXPECT_EQ(swapChain.GetFormat(), Dds::Format::B8G8R8A8_UNORM);
-	view = swapChain.GetBuffer()->CreateRenderTargetView();
-	ASSERT_NE(view, nullptr);
-	GetContext().ClearRenderTargetView(*view, ourQuadColor);
-	const std::vector<uint8_t> bytes = ReadPixels(*view);
-	EXPECT_EQ(bytes.size(), 16u * 16u * 4u);
-	EXPECT_EQ(PixelAt(bytes, 16, 15, 15), Stored(ourQuadColor, Dds::Format::B8G8R8A8_UNORM));
-	swapChain.Destroy();
 }
 
 TEST_F(SwapChainTest, BadRequestsAreReportedAndChangeNothing)
@@ -126,8 +106,7 @@ TEST_F(SwapChainTest, BadRequestsAreReportedAndChangeNothing)
 }
 
 // A device and swap chain on a 320x240 X11 window of an X server the suite
-// starts (or finds). A headless device from GpuTest stays beside it; the window
-// device's context is current during the test.
+// starts (or finds); the window device replaces GpuTest's headless one.
 class SwapChainWindowTest : public GpuTest
 {
 protected:
@@ -143,13 +122,8 @@ protected:
 		ourServer = nullptr;
 	}
 
-	void SetUp() override
+	void SetUpGpu() override
 	{
-		GpuTest::SetUp();
-		if (IsSkipped() || HasFailure())
-		{
-			return;
-		}
 		if (!ourServerFlag && XServer::IsXvfbInstalled())
 		{
 			LUMORA_SKIP_OR_FAIL(ourServer->GetReason());
@@ -162,8 +136,9 @@ protected:
 		ASSERT_NE(myDisplay, nullptr);
 		myWindow = XCreateSimpleWindow(myDisplay, DefaultRootWindow(myDisplay), 0, 0, 320, 240, 0, 0, 0);
 		XSync(myDisplay, False);
-		ASSERT_TRUE(myWindowDevice.Init(320, 240, myWindow)) << Joined();
-		EXPECT_EQ(myWindowDevice.GetWindow(), myWindow);
+		myDevice.Destroy();
+		ASSERT_TRUE(myDevice.Init(320, 240, myWindow)) << Joined();
+		EXPECT_EQ(myDevice.GetWindow(), myWindow);
 		// The device mapped the window through its own connection.
 		XWindowAttributes attributes{};
 		for (int attempt = 0; attempt < 200; ++attempt)
@@ -189,26 +164,24 @@ void main() { gl_Position = vec4(corners[gl_VertexID], 0.5, 1.0); })",
 
 	void TearDown() override
 	{
-		if (myWindowDevice.IsInitialized())
+		if (myDevice.IsInitialized() && myDevice.MakeCurrent())
 		{
-			myWindowDevice.MakeCurrent();
-			myWindowDevice.GetContext().GetStateCache().ForgetProgram(myProgram);
+			GetContext().GetStateCache().ForgetProgram(myProgram);
 			glDeleteProgram(myProgram);
 			mySwapChain.Destroy();
-			myWindowDevice.Destroy();
 		}
+		GpuTest::TearDown(); // the device goes before its window
 		if (myDisplay != nullptr)
 		{
 			XDestroyWindow(myDisplay, myWindow);
 			XCloseDisplay(myDisplay);
 		}
-		GpuTest::TearDown();
 	}
 
 	// Clears the back buffer and draws a quad over the top half of the view (clip y 0..1).
 	void DrawFrame(const float aClearColor[4])
 	{
-		Gpu::Context& context = myWindowDevice.GetContext();
+		Gpu::Context& context = GetContext();
 		Gpu::RenderTargetView* views[] = {mySwapChain.GetBuffer()->CreateRenderTargetView()};
 		ASSERT_NE(views[0], nullptr);
 		ASSERT_TRUE(context.SetRenderTargets(views, nullptr));
@@ -220,15 +193,22 @@ void main() { gl_Position = vec4(corners[gl_VertexID], 0.5, 1.0); })",
 		context.SetInputLayout(nullptr);
 		context.SetPrimitiveTopology(Gpu::PrimitiveTopology::TriangleStrip);
 		context.Draw(4, 0);
-		ASSERT_TRUE(Gpu::ReadRenderTarget(context, *views[0], myBackBuffer));
+		myBackBuffer = ReadPixels(*views[0]);
 	}
 
-	// The window's pixels as RGBA (alpha 255), row 0 at the top. Another client
-	// (the device's connection) draws them, so wait until aShownFlag says the frame
-	// has arrived, or a few seconds pass.
+	// The window's pixels as RGBA (alpha 255), row 0 at the top. Another client (the
+	// device's connection) draws them, so wait until aShownFlag says the frame has
+	// arrived, or a few seconds pass; without aShownFlag, until the window shows the
+	// back buffer's bytes (without its alpha channel).
 	std::vector<uint8_t> ReadWindow(int aWidth, int aHeight,
-	                                const std::function<bool(const std::vector<uint8_t>&)>& aShownFlag)
+	                                std::function<bool(const std::vector<uint8_t>&)> aShownFlag = nullptr)
 	{
+		if (!aShownFlag)
+		{
+			aShownFlag = [&](const std::vector<uint8_t>& someShown) {
+				return someShown == TestSupport::Opaque(myBackBuffer);
+			};
+		}
 		std::vector<uint8_t> pixels;
 		for (int attempt = 0; attempt < 100; ++attempt)
 		{
@@ -247,29 +227,18 @@ void main() { gl_Position = vec4(corners[gl_VertexID], 0.5, 1.0); })",
 		return pixels;
 	}
 
-	// The back buffer's bytes as the window should show them (no alpha channel), and the
-	// window once it shows them.
-	std::vector<uint8_t> OpaqueBackBuffer() const { return TestSupport::Opaque(myBackBuffer); }
-
-	std::vector<uint8_t> ReadWindowShowingBackBuffer(int aWidth, int aHeight)
-	{
-		return ReadWindow(aWidth, aHeight, [&](const std::vector<uint8_t>& someShown) {
-			return someShown == OpaqueBackBuffer();
-		});
-	}
-
 	static inline XServer* ourServer = nullptr;
 	static inline bool ourServerFlag = false;
 	Display* myDisplay = nullptr;
 	Window myWindow = 0;
-	Gpu::Device myWindowDevice;
 	Gpu::SwapChain mySwapChain;
 	GLuint myProgram = 0;
 	std::vector<uint8_t> myBackBuffer;
 };
 
-// The last case draws and presents on a render thread that holds the context meanwhile.
-TEST_F(SwapChainWindowTest, PresentShowsTheBackBufferUprightWithItsBytes)
+// The last case draws and presents on a render thread that holds the context meanwhile; then the
+// back buffer follows the window's new size, or is stretched over it.
+TEST_F(SwapChainWindowTest, PresentShowsTheBackBufferUprightWithItsBytesAndFollowsTheWindow)
 {
 	const std::pair<Dds::Format, bool> cases[] = {{Dds::Format::R8G8B8A8_UNORM_SRGB, false},
 	                                              {Dds::Format::B8G8R8A8_UNORM, false},
@@ -278,7 +247,7 @@ TEST_F(SwapChainWindowTest, PresentShowsTheBackBufferUprightWithItsBytes)
 	{
 		SCOPED_TRACE(std::to_string(static_cast<unsigned>(format)) +
 		             (threadFlag ? " on a render thread" : ""));
-		ASSERT_TRUE(mySwapChain.Init(myWindowDevice, 0, 0, format)); // the window's size
+		ASSERT_TRUE(mySwapChain.Init(myDevice, 0, 0, format)); // the window's size
 		EXPECT_TRUE(mySwapChain.HasWindow());
 		EXPECT_EQ(mySwapChain.GetWidth(), 320);
 		EXPECT_EQ(mySwapChain.GetHeight(), 240);
@@ -289,16 +258,16 @@ TEST_F(SwapChainWindowTest, PresentShowsTheBackBufferUprightWithItsBytes)
 		};
 		if (threadFlag)
 		{
-			myWindowDevice.ReleaseCurrent();
+			myDevice.ReleaseCurrent();
 			std::thread renderThread([&] {
-				if (myWindowDevice.MakeCurrent())
+				if (myDevice.MakeCurrent())
 				{
 					frame();
-					myWindowDevice.ReleaseCurrent();
+					myDevice.ReleaseCurrent();
 				}
 			});
 			renderThread.join();
-			ASSERT_TRUE(myWindowDevice.MakeCurrent());
+			ASSERT_TRUE(myDevice.MakeCurrent());
 		}
 		else
 		{
@@ -306,7 +275,7 @@ TEST_F(SwapChainWindowTest, PresentShowsTheBackBufferUprightWithItsBytes)
 		}
 		ASSERT_TRUE(presentedFlag);
 
-		const std::vector<uint8_t> window = ReadWindowShowingBackBuffer(320, 240);
+		const std::vector<uint8_t> window = ReadWindow(320, 240);
 		const Pixel quad = Stored(ourQuadColor, format);
 		const Pixel clear = Stored(ourClearColor, format);
 		// Direct3D's orientation: the top rows of the view are the top rows of the window.
@@ -315,15 +284,12 @@ TEST_F(SwapChainWindowTest, PresentShowsTheBackBufferUprightWithItsBytes)
 		EXPECT_EQ(PixelAt(window, 320, 0, 120), clear);
 		EXPECT_EQ(PixelAt(window, 320, 319, 239), clear);
 		// Every byte arrives as the back buffer stored it (sRGB-encoded, not decoded or encoded again).
-		EXPECT_TRUE(window == OpaqueBackBuffer());
+		EXPECT_TRUE(window == TestSupport::Opaque(myBackBuffer));
 		Gpu::SavePng("/tmp/lumora-swapchain-window.png", 320, 240, window.data());
 		mySwapChain.Destroy();
 	}
-}
 
-TEST_F(SwapChainWindowTest, ResizeBuffersFollowsTheWindow)
-{
-	ASSERT_TRUE(mySwapChain.Init(myWindowDevice, 320, 240, Dds::Format::R8G8B8A8_UNORM_SRGB));
+	ASSERT_TRUE(mySwapChain.Init(myDevice, 320, 240, Dds::Format::R8G8B8A8_UNORM_SRGB));
 	XResizeWindow(myDisplay, myWindow, 400, 300);
 	XSync(myDisplay, False);
 	ASSERT_TRUE(mySwapChain.ResizeBuffers(0, 0, Dds::Format::UNKNOWN));
@@ -331,8 +297,8 @@ TEST_F(SwapChainWindowTest, ResizeBuffersFollowsTheWindow)
 	EXPECT_EQ(mySwapChain.GetHeight(), 300);
 	DrawFrame(ourClearColor);
 	ASSERT_TRUE(mySwapChain.Present(1));
-	std::vector<uint8_t> window = ReadWindowShowingBackBuffer(400, 300);
-	EXPECT_TRUE(window == OpaqueBackBuffer());
+	std::vector<uint8_t> window = ReadWindow(400, 300);
+	EXPECT_TRUE(window == TestSupport::Opaque(myBackBuffer));
 	Gpu::SavePng("/tmp/lumora-swapchain-resized.png", 400, 300, window.data());
 
 	// A back buffer smaller than the window is stretched over all of it.
@@ -387,7 +353,7 @@ TEST_F(SwapChainWindowTest, BadWindowOrDisplayIsReportedNotFatal)
 	}
 	setenv("DISPLAY", display.c_str(), 1);
 	// The window device is untouched and still presents.
-	ASSERT_TRUE(myWindowDevice.MakeCurrent());
-	ASSERT_TRUE(mySwapChain.Init(myWindowDevice, 0, 0, Dds::Format::R8G8B8A8_UNORM));
+	ASSERT_TRUE(myDevice.MakeCurrent());
+	ASSERT_TRUE(mySwapChain.Init(myDevice, 0, 0, Dds::Format::R8G8B8A8_UNORM));
 	EXPECT_TRUE(mySwapChain.Present(0));
 }

@@ -91,14 +91,7 @@ const std::array<float, 4> ourFaceDirections[6] = {{1, 0, 0, 0},  {-1, 0, 0, 0},
 class TextureLoaderTest : public GpuTest
 {
 protected:
-	void SetUp() override
-	{
-		GpuTest::SetUp();
-		if (!IsSkipped() && !HasFailure())
-		{
-			mySampleProgram.Init(GetContext());
-		}
-	}
+	void SetUpGpu() override { mySampleProgram.Init(GetContext()); }
 
 	void TearDown() override
 	{
@@ -124,14 +117,6 @@ protected:
 	Gpu::Texture* Load(const std::string& aPath, Dds::ImageInfo* anInfoOut)
 	{
 		return Keep(Gpu::CreateTextureFromFile(GetContext(), aPath, anInfoOut));
-	}
-
-	std::vector<Color> Sample(const Gpu::Texture& aTexture, const std::vector<SampleQuery>& someQueries)
-	{
-		const std::vector<Color> colors =
-		    mySampleProgram.Sample(*aTexture.GetDefaultShaderResourceView(), someQueries);
-		EXPECT_EQ(colors.size(), someQueries.size());
-		return colors;
 	}
 
 	TestSupport::ScratchDir myScratch;
@@ -180,13 +165,23 @@ TEST_F(TextureLoaderTest, EveryItemMipAndSliceSamplesItsOwnColour)
 			                      (aPixel[2] >> 3) / 31.0f, 1}
 			              : Unorm(aPixel);
 		};
+		// Each subresource filled with its colours, and one query per colour to read it back.
 		Dds::Image image = MakeImage(info);
+		std::vector<SampleQuery> queries;
+		std::vector<std::pair<Color, std::string>> expected;
 		for (uint32_t item = 0; item < info.myArraySize; ++item)
 		{
 			for (uint32_t mip = 0; mip < info.myMipLevels; ++mip)
 			{
 				const uint32_t height = Dds::MipExtent(info.myHeight, mip);
-				for (uint32_t slice = 0; slice < Dds::MipExtent(info.myDepth, mip); ++slice)
+				const uint32_t depth = Dds::MipExtent(info.myDepth, mip);
+				if (bcFlag)
+				{
+					const Pixel pixel = color(item, mip, 0, true);
+					Repeat(image.Data(mip, item), image.SubresourceSize(mip),
+					       Bc1Block(Rgb565(pixel[0] >> 3, pixel[1] >> 2, pixel[2] >> 3), 0, 0));
+				}
+				for (uint32_t slice = 0; slice < depth; ++slice)
 				{
 					for (uint32_t row = 0; row < height && !bcFlag; ++row)
 					{
@@ -196,33 +191,6 @@ TEST_F(TextureLoaderTest, EveryItemMipAndSliceSamplesItsOwnColour)
 						           row * image.RowPitch(mip),
 						       image.RowPitch(mip), {pixel.begin(), pixel.end()});
 					}
-				}
-				const Pixel pixel = color(item, mip, 0, true);
-				if (bcFlag)
-				{
-					Repeat(image.Data(mip, item), image.SubresourceSize(mip),
-					       Bc1Block(Rgb565(pixel[0] >> 3, pixel[1] >> 2, pixel[2] >> 3), 0, 0));
-				}
-			}
-		}
-		// Readers find the file under another spelling of its path.
-		Save(myScratch.File(std::string("Layouts/") + test.myName + ".DDS"), image);
-		Dds::ImageInfo loadedInfo;
-		Gpu::Texture* texture =
-		    Load(myScratch.File(std::string("LAYOUTS/") + test.myName + ".dds"), &loadedInfo);
-		ASSERT_NE(texture, nullptr);
-		EXPECT_EQ(loadedInfo, info);
-		EXPECT_EQ(texture->GetDefaultShaderResourceView()->GetTarget(), test.myViewTarget);
-
-		std::vector<SampleQuery> queries;
-		std::vector<std::pair<Color, std::string>> expected;
-		for (uint32_t item = 0; item < info.myArraySize; ++item)
-		{
-			for (uint32_t mip = 0; mip < info.myMipLevels; ++mip)
-			{
-				const uint32_t depth = Dds::MipExtent(info.myDepth, mip);
-				for (uint32_t slice = 0; slice < depth; ++slice)
-				{
 					for (const bool topFlag : {true, false})
 					{
 						if (!topFlag && !test.myHalvesFlag)
@@ -241,8 +209,7 @@ TEST_F(TextureLoaderTest, EveryItemMipAndSliceSamplesItsOwnColour)
 						}
 						queries.push_back({coord, float(mip)});
 						// A mip one row high has only its top row.
-						const bool shownTopFlag = topFlag || Dds::MipExtent(info.myHeight, mip) == 1;
-						expected.emplace_back(read(color(item, mip, slice, shownTopFlag)),
+						expected.emplace_back(read(color(item, mip, slice, topFlag || height == 1)),
 						                      "item " + std::to_string(item) + " mip " + std::to_string(mip) +
 						                          " slice " + std::to_string(slice) +
 						                          (topFlag ? " top" : " bottom"));
@@ -250,7 +217,16 @@ TEST_F(TextureLoaderTest, EveryItemMipAndSliceSamplesItsOwnColour)
 				}
 			}
 		}
-		const std::vector<Color> colors = Sample(*texture, queries);
+		// Readers find the file under another spelling of its path.
+		Save(myScratch.File(std::string("Layouts/") + test.myName + ".DDS"), image);
+		Dds::ImageInfo loadedInfo;
+		Gpu::Texture* texture =
+		    Load(myScratch.File(std::string("LAYOUTS/") + test.myName + ".dds"), &loadedInfo);
+		ASSERT_NE(texture, nullptr);
+		EXPECT_EQ(loadedInfo, info);
+		EXPECT_EQ(texture->GetDefaultShaderResourceView()->GetTarget(), test.myViewTarget);
+		const std::vector<Color> colors =
+		    mySampleProgram.Sample(*texture->GetDefaultShaderResourceView(), queries);
 		for (size_t query = 0; query < colors.size(); ++query)
 		{
 			ExpectColor(colors[query], expected[query].first, bcFlag ? 4e-3f : 1e-4f, expected[query].second);
@@ -314,9 +290,11 @@ TEST_F(TextureLoaderTest, FormatsSampleTheirStoredValues)
 	{
 		SCOPED_TRACE(Dds::FormatName(test.myFormat));
 		Dds::Image image = MakeImage({8, 8, 1, 1, 4, 0, test.myFormat});
+		std::vector<SampleQuery> queries;
 		for (uint32_t mip = 0; mip < 4; ++mip)
 		{
 			Repeat(image.Data(mip, 0), image.SubresourceSize(mip), test.myPattern);
+			queries.push_back({{0.4f, 0.6f, 0, 0}, float(mip)});
 		}
 		const std::string path = myScratch.File(std::to_string(++number) + ".dds");
 		Save(path, image);
@@ -324,12 +302,8 @@ TEST_F(TextureLoaderTest, FormatsSampleTheirStoredValues)
 		Gpu::Texture* texture = Load(path, &info);
 		ASSERT_NE(texture, nullptr);
 		EXPECT_EQ(info.myFormat, test.myFormat);
-		std::vector<SampleQuery> queries;
-		for (int mip = 0; mip < 4; ++mip)
-		{
-			queries.push_back({{0.4f, 0.6f, 0, 0}, float(mip)});
-		}
-		const std::vector<Color> colors = Sample(*texture, queries);
+		const std::vector<Color> colors =
+		    mySampleProgram.Sample(*texture->GetDefaultShaderResourceView(), queries);
 		for (size_t mip = 0; mip < colors.size(); ++mip)
 		{
 			ExpectColor(colors[mip], test.myExpected, test.myTolerance, "mip " + std::to_string(mip));

@@ -77,19 +77,18 @@ TEST_F(TextureTest, CubeFaceViewsAreSeparateTargets)
 	EXPECT_EQ(cube->GetMipLevels(), 5);
 	EXPECT_EQ(cube->GetDefaultShaderResourceView()->GetTarget(), static_cast<GLenum>(GL_TEXTURE_CUBE_MAP));
 
+	auto faceColor = [](int aFace) { return Pixel{uint8_t(40 * aFace), 255, uint8_t(aFace), 255}; };
 	std::array<Gpu::RenderTargetView*, 6> faces{};
 	for (int face = 0; face < 6; ++face)
 	{
 		faces[face] = cube->CreateRenderTargetView({.myFirstSlice = face});
 		ASSERT_NE(faces[face], nullptr);
-		const Pixel color = {static_cast<uint8_t>(40 * face), 255, static_cast<uint8_t>(face), 255};
-		GetContext().ClearRenderTargetView(*faces[face], ToColor(color).data());
+		GetContext().ClearRenderTargetView(*faces[face], ToColor(faceColor(face)).data());
 	}
 	for (int face = 0; face < 6; ++face)
 	{
 		SCOPED_TRACE(face);
-		ExpectUniform(GetContext(), *faces[face],
-		              {static_cast<uint8_t>(40 * face), 255, static_cast<uint8_t>(face), 255});
+		ExpectUniform(GetContext(), *faces[face], faceColor(face));
 	}
 	// A face of a lower mip is its own target too, and leaves mip 0 alone.
 	Gpu::RenderTargetView* smallFace = cube->CreateRenderTargetView({.myMip = 2, .myFirstSlice = 3});
@@ -98,7 +97,7 @@ TEST_F(TextureTest, CubeFaceViewsAreSeparateTargets)
 	const Pixel white = {255, 255, 255, 255};
 	GetContext().ClearRenderTargetView(*smallFace, ToColor(white).data());
 	ExpectUniform(GetContext(), *smallFace, white);
-	ExpectUniform(GetContext(), *faces[3], {120, 255, 3, 255});
+	ExpectUniform(GetContext(), *faces[3], faceColor(3));
 
 	// GLSL reads single cube texels through a 2D-array view of the faces.
 	Gpu::ShaderResourceView* layers =

@@ -8,11 +8,12 @@
 //   server.Stop();                             // or let it go out of scope
 //
 // Start uses $DISPLAY when it names a server that answers. Otherwise it starts
-// `Xvfb :N -screen 0 640x480x24 -nolisten tcp` on a display number nobody holds,
-// waits until it accepts connections, points $DISPLAY at it, and Stop ends it and
-// puts $DISPLAY back. Whether a test may skip when Start fails depends on why:
-// IsXvfbInstalled() tells the case the machine cannot help (no Xvfb at all) from
-// a server that would not start.
+// `Xvfb -displayfd FD -screen 0 640x480x24 -nolisten tcp`: Xvfb takes the first display
+// number whose lock it can create (so parallel test processes never share one) and
+// writes that number to the pipe once it accepts connections. Start points $DISPLAY
+// at it, and Stop ends it and puts $DISPLAY back. Whether a test may skip when Start
+// fails depends on why: IsXvfbInstalled() tells the case the machine cannot help (no
+// Xvfb at all) from a server that would not start.
 //
 // Xlib comes with this header. Its macro None (0L) would replace every enumerator
 // of that name (Gpu::CullMode::None, Gpu::DeviceFailure::None), so it is undone
@@ -20,17 +21,14 @@
 
 #include <X11/Xlib.h>
 #include <X11/Xutil.h>
-#include <chrono>
 #include <cstdlib>
 #include <fcntl.h>
-#include <fstream>
+#include <poll.h>
 #include <signal.h>
 #include <spawn.h>
 #include <sstream>
 #include <string>
-#include <sys/stat.h>
 #include <sys/wait.h>
-#include <thread>
 #include <unistd.h>
 #include <vector>
 
@@ -75,9 +73,8 @@ public:
 	{
 		if (const char* display = std::getenv("DISPLAY"); display != nullptr && *display != '\0')
 		{
-			if (Answers(display))
+			if (Connect(display))
 			{
-				myDisplayName = display;
 				return true;
 			}
 		}
@@ -86,22 +83,26 @@ public:
 			myReason = "no X server can be started: $DISPLAY does not answer and Xvfb is not installed";
 			return false;
 		}
-		// Another process may take the number between the check and the start: try a few.
-		for (int number = FreeDisplayNumber(99), attempt = 0; number > 0 && attempt < 5;
-		     number = FreeDisplayNumber(number + 1), ++attempt)
+		const char* previous = std::getenv("DISPLAY");
+		myPreviousDisplay = previous != nullptr ? previous : "";
+		const std::string name = ":" + StartXvfb(aScreen);
+		if (name == ":" || !Connect(name.c_str()))
 		{
-			if (StartXvfb(number, aScreen))
-			{
-				return true;
-			}
+			Stop();
+			myReason = "no X server can be started: Xvfb did not accept connections";
+			return false;
 		}
-		myReason = "no X server can be started: Xvfb did not accept connections";
-		return false;
+		setenv("DISPLAY", name.c_str(), 1);
+		return true;
 	}
 
 	void Stop()
 	{
-		Disconnect();
+		if (myConnection != nullptr)
+		{
+			XCloseDisplay(myConnection);
+			myConnection = nullptr;
+		}
 		if (myPid <= 0)
 		{
 			return;
@@ -122,28 +123,14 @@ public:
 
 	static bool IsXvfbInstalled() { return !FindXvfb().empty(); }
 	const std::string& GetReason() const { return myReason; }
-	const std::string& GetDisplayName() const { return myDisplayName; }
-	bool IsOwnServer() const { return myPid > 0; }
 
 private:
 	// Keeps the connection that answered: an X server resets when its last client
 	// leaves and refuses connections meanwhile, which later clients would run into.
-	bool Answers(const char* aDisplayName)
+	bool Connect(const char* aDisplayName)
 	{
-		if (myConnection == nullptr)
-		{
-			myConnection = XOpenDisplay(aDisplayName);
-		}
+		myConnection = XOpenDisplay(aDisplayName);
 		return myConnection != nullptr;
-	}
-
-	void Disconnect()
-	{
-		if (myConnection != nullptr)
-		{
-			XCloseDisplay(myConnection);
-			myConnection = nullptr;
-		}
 	}
 
 	static std::string FindXvfb()
@@ -160,88 +147,48 @@ private:
 		return {};
 	}
 
-	// The process id in a display's lock file; 0 when there is none.
-	static pid_t LockOwner(int aNumber)
+	// The display number Xvfb reports once it is ready; empty when it exits or stays silent
+	// for ten seconds (the server, if any, is left to Stop).
+	std::string StartXvfb(const std::string& aScreen)
 	{
-		std::ifstream lock("/tmp/.X" + std::to_string(aNumber) + "-lock");
-		long pid = 0;
-		lock >> pid;
-		return static_cast<pid_t>(pid);
-	}
-
-	// The first number from aFirst on with neither a lock file nor a socket.
-	static int FreeDisplayNumber(int aFirst)
-	{
-		for (int number = aFirst; number < aFirst + 200; ++number)
+		// Only the write end goes to the child.
+		int pipeEnds[2];
+		if (pipe(pipeEnds) != 0 || fcntl(pipeEnds[0], F_SETFD, FD_CLOEXEC) != 0)
 		{
-			struct stat info;
-			const std::string lock = "/tmp/.X" + std::to_string(number) + "-lock";
-			const std::string socket = "/tmp/.X11-unix/X" + std::to_string(number);
-			if (stat(lock.c_str(), &info) != 0 && stat(socket.c_str(), &info) != 0)
-			{
-				return number;
-			}
+			return {};
 		}
-		return -1;
-	}
-
-	bool StartXvfb(int aNumber, const std::string& aScreen)
-	{
-		const std::string xvfb = FindXvfb();
-		const std::string name = ":" + std::to_string(aNumber);
-		char* arguments[] = {const_cast<char*>("Xvfb"),          const_cast<char*>(name.c_str()),
-		                     const_cast<char*>("-screen"),       const_cast<char*>("0"),
-		                     const_cast<char*>(aScreen.c_str()), const_cast<char*>("-nolisten"),
-		                     const_cast<char*>("tcp"),           nullptr};
 		posix_spawn_file_actions_t actions;
 		posix_spawn_file_actions_init(&actions);
 		posix_spawn_file_actions_addopen(&actions, STDOUT_FILENO, "/dev/null", O_WRONLY, 0);
 		posix_spawn_file_actions_addopen(&actions, STDERR_FILENO, "/dev/null", O_WRONLY, 0);
-		pid_t pid = -1;
-		const int result = posix_spawn(&pid, xvfb.c_str(), &actions, nullptr, arguments, environ);
+		const std::string xvfb = FindXvfb();
+		const std::string writeEnd = std::to_string(pipeEnds[1]);
+		const char* arguments[] = {"Xvfb",      "-displayfd", writeEnd.c_str(),
+		                           "-screen",   "0",          aScreen.c_str(),
+		                           "-nolisten", "tcp",        nullptr};
+		const int result =
+		    posix_spawn(&myPid, xvfb.c_str(), &actions, nullptr, const_cast<char**>(arguments), environ);
 		posix_spawn_file_actions_destroy(&actions);
+		close(pipeEnds[1]);
 		if (result != 0)
 		{
-			return false;
+			myPid = -1;
 		}
-		const auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(10);
-		while (std::chrono::steady_clock::now() < deadline)
+		// Xvfb writes "N\n"; the pipe ends early when it exits.
+		std::string number;
+		pollfd ready = {.fd = pipeEnds[0], .events = POLLIN, .revents = 0};
+		char character = 0;
+		while (myPid > 0 && poll(&ready, 1, 10000) == 1 && read(pipeEnds[0], &character, 1) == 1 &&
+		       character != '\n')
 		{
-			int status = 0;
-			if (waitpid(pid, &status, WNOHANG) == pid)
-			{
-				return false; // it exited: the number was taken after all
-			}
-			// Another test process may hold the number and answer in its place: the
-			// lock file names the server's process.
-			if (Answers(name.c_str()) && LockOwner(aNumber) != pid)
-			{
-				Disconnect(); // another process's server
-			}
-			else if (myConnection != nullptr)
-			{
-				myPid = pid;
-				const char* previous = std::getenv("DISPLAY");
-				myPreviousDisplay = previous != nullptr ? previous : "";
-				setenv("DISPLAY", name.c_str(), 1);
-				myDisplayName = name;
-				return true;
-			}
-			if (LockOwner(aNumber) > 0 && LockOwner(aNumber) != pid)
-			{
-				break;
-			}
-			std::this_thread::sleep_for(std::chrono::milliseconds(20));
+			number += character;
 		}
-		kill(pid, SIGTERM);
-		int status = 0;
-		waitpid(pid, &status, 0);
-		return false;
+		close(pipeEnds[0]);
+		return character == '\n' ? number : std::string();
 	}
 
 	pid_t myPid = -1;
 	Display* myConnection = nullptr;
-	std::string myDisplayName;
 	std::string myPreviousDisplay;
 	std::string myReason;
 };
