@@ -44,13 +44,8 @@ const Pixel ourGreen = {0, 255, 0, 255};
 class FxEffectTest : public GpuTest
 {
 protected:
-	void SetUp() override
+	void SetUpGpu() override
 	{
-		GpuTest::SetUp();
-		if (IsSkipped() || HasFailure())
-		{
-			return;
-		}
 		Gpu::Texture* depth = MakeTarget(Dds::Format::D32_FLOAT, 64, 64);
 		ASSERT_NE(depth, nullptr);
 		myDepth = depth->CreateDepthStencilView();
@@ -252,18 +247,19 @@ technique T
 	EXPECT_EQ(At(pixels, 48, 32), ourRed);
 }
 
-TEST_F(FxEffectTest, VertexPosColTransformsByEngineMatricesAsRowVectors)
+TEST_F(FxEffectTest, VertexPosColTransformsByEngineMatricesAndDrawsSolidOrWireframe)
 {
 	Fx::Effect* effect = Load("data/Shaders/Misc/Vertex_PosCol.fxal");
 	ASSERT_NE(effect, nullptr);
-	// v * World * View: x moves right by 0.5, then everything halves.
+	Fx::Pass* solid = effect->GetTechniqueByName("Render")->GetPassByIndex(0);
+	Fx::Pass* wire = effect->GetTechniqueByName("RenderWireFrame")->GetPassByIndex(0);
+	// v * World * View, as row vectors: x moves right by 0.5, then everything halves.
 	const std::array<float, 16> world = Translation(0.5f, 0.0f, 0.0f);
 	const std::array<float, 16> view = Scale(0.5f);
 	SetIdentityCamera(*effect);
 	ASSERT_TRUE(effect->GetVariableByName("World")->SetMatrix(world.data()));
 	ASSERT_TRUE(effect->GetVariableByName("View")->SetMatrix(view.data()));
-	Draw(effect->GetTechniqueByName("Render")->GetPassByIndex(0), Quad(-0.5f, 1.0f, 0.5f, 0.0f, ourOrange));
-
+	Draw(solid, Quad(-0.5f, 1.0f, 0.5f, 0.0f, ourOrange));
 	// Clip x 0..0.5 is columns 32..47; clip y 0..0.5 (up) is rows 16..31 (row 0 at the top).
 	const std::vector<uint8_t> pixels = ReadAll("vertex_poscol");
 	for (const auto& [x, y] : {std::pair{32, 16}, std::pair{47, 31}})
@@ -271,16 +267,9 @@ TEST_F(FxEffectTest, VertexPosColTransformsByEngineMatricesAsRowVectors)
 		EXPECT_EQ(At(pixels, x, y), ourOrange) << x << ", " << y;
 	}
 	EXPECT_EQ(CountNotClear(pixels), 16 * 16);
-}
 
-TEST_F(FxEffectTest, WireframeAndSolidPassesDrawDifferentPixels)
-{
-	Fx::Effect* effect = Load("data/Shaders/Misc/Vertex_PosCol.fxal");
-	ASSERT_NE(effect, nullptr);
+	Clear();
 	SetIdentityCamera(*effect);
-	Fx::Pass* solid = effect->GetTechniqueByName("Render")->GetPassByIndex(0);
-	Fx::Pass* wire = effect->GetTechniqueByName("RenderWireFrame")->GetPassByIndex(0);
-
 	Draw(solid, Quad(-0.5f, 0.5f, 0.5f, -0.5f, ourOrange));
 	const std::vector<uint8_t> filled = ReadAll("solid");
 	EXPECT_EQ(At(filled, 32, 32), ourOrange);
@@ -303,33 +292,33 @@ TEST_F(FxEffectTest, WireframeAndSolidPassesDrawDifferentPixels)
 	EXPECT_EQ(CountNotClear(ReadAll()), CountNotClear(outlined));
 }
 
+// Applied in this order: Vertex_PosCol's Render declares depth and rasterizer states, not blending,
+// so the sprite's blending stays on; Line2D tests depth without writing it and culls nothing.
 TEST_F(FxEffectTest, PassesSetOnlyTheStateGroupsTheyDeclare)
 {
-	Fx::Effect* sprite = Load("data/Shaders/Sprite/Sprite.fxal");
-	Fx::Effect* posCol = Load("data/Shaders/Misc/Vertex_PosCol.fxal");
-	Fx::Effect* line = Load("data/Shaders/Misc/Line2D.fxal");
-	ASSERT_TRUE(sprite && posCol && line);
-	GLboolean writeMask = GL_FALSE;
-
-	ASSERT_TRUE(sprite->GetTechniqueByName("Render")->GetPassByIndex(0)->Apply(GetContext()));
-	EXPECT_TRUE(glIsEnabled(GL_BLEND));
-	EXPECT_FALSE(glIsEnabled(GL_DEPTH_TEST));
-	EXPECT_FALSE(glIsEnabled(GL_CULL_FACE));
-
-	// Render declares depth and rasterizer states, not blending: blending stays on.
-	ASSERT_TRUE(posCol->GetTechniqueByName("Render")->GetPassByIndex(0)->Apply(GetContext()));
-	EXPECT_TRUE(glIsEnabled(GL_BLEND));
-	EXPECT_TRUE(glIsEnabled(GL_DEPTH_TEST));
-	EXPECT_TRUE(glIsEnabled(GL_CULL_FACE));
-	glGetBooleanv(GL_DEPTH_WRITEMASK, &writeMask);
-	EXPECT_EQ(writeMask, GL_TRUE);
-
-	// Line2D tests depth without writing it and culls nothing.
-	ASSERT_TRUE(line->GetTechniqueByName("Render")->GetPassByIndex(0)->Apply(GetContext()));
-	EXPECT_TRUE(glIsEnabled(GL_DEPTH_TEST));
-	glGetBooleanv(GL_DEPTH_WRITEMASK, &writeMask);
-	EXPECT_EQ(writeMask, GL_FALSE);
-	EXPECT_FALSE(glIsEnabled(GL_CULL_FACE));
+	const struct
+	{
+		const char* myFile;
+		GLboolean myBlendFlag;
+		GLboolean myDepthTestFlag;
+		GLboolean myDepthWriteFlag;
+		GLboolean myCullFlag;
+	} passes[] = {{"data/Shaders/Sprite/Sprite.fxal", GL_TRUE, GL_FALSE, GL_FALSE, GL_FALSE},
+	              {"data/Shaders/Misc/Vertex_PosCol.fxal", GL_TRUE, GL_TRUE, GL_TRUE, GL_TRUE},
+	              {"data/Shaders/Misc/Line2D.fxal", GL_TRUE, GL_TRUE, GL_FALSE, GL_FALSE}};
+	for (const auto& pass : passes)
+	{
+		SCOPED_TRACE(pass.myFile);
+		Fx::Effect* effect = Load(pass.myFile);
+		ASSERT_NE(effect, nullptr);
+		ASSERT_TRUE(effect->GetTechniqueByName("Render")->GetPassByIndex(0)->Apply(GetContext()));
+		GLboolean writeMask = GL_FALSE;
+		glGetBooleanv(GL_DEPTH_WRITEMASK, &writeMask);
+		EXPECT_EQ(glIsEnabled(GL_BLEND), pass.myBlendFlag);
+		EXPECT_EQ(glIsEnabled(GL_DEPTH_TEST), pass.myDepthTestFlag);
+		EXPECT_EQ(writeMask, pass.myDepthWriteFlag);
+		EXPECT_EQ(glIsEnabled(GL_CULL_FACE), pass.myCullFlag);
+	}
 }
 
 TEST_F(FxEffectTest, SpriteSamplesWithItsClampSamplerAndBlends)

@@ -8,6 +8,7 @@
 #include <string>
 #include <vector>
 
+#include "fuzz/FuzzCorpus.h"
 #include "platform/fx/CompiledFormat.h"
 #include "platform/fx/Compiler.h"
 #include "support/TestSupport.h"
@@ -127,39 +128,17 @@ TEST(FxCompiledFormatTest, DamagedFilesAreRefusedWithAMessageOrReadWhole)
 		ASSERT_FALSE(error.empty());
 	}
 
-	// Half the mutations recompute the checksum, so the structural checks behind it are reached.
-	const uint32_t interesting[] = {0,      1,       2,          3,          0x7F,      0xFF,
-	                                0xFFFF, 0x10000, 0x7FFFFFFF, 0x80000000, 0xFFFFFFFF};
+	// The fuzz targets' kinds of change; half the mutations recompute the checksum, so the structural
+	// checks behind it are reached.
+	const std::string originalBytes(original.begin(), original.end());
 	std::mt19937 random(20240611);
 	int read = 0;
 	int refused = 0;
 	for (int iteration = 0; iteration < 4000; ++iteration)
 	{
-		std::vector<uint8_t> bytes = original;
-		const int changes = 1 + static_cast<int>(random() % 3);
-		for (int change = 0; change < changes; ++change)
-		{
-			const size_t at = random() % bytes.size();
-			switch (random() % 3)
-			{
-			case 0:
-				bytes[at] ^= static_cast<uint8_t>(1u << (random() % 8));
-				break;
-			case 1: {
-				const uint32_t value = interesting[random() % std::size(interesting)];
-				for (size_t index = 0; index < 4 && at + index < bytes.size(); ++index)
-				{
-					bytes[at + index] = static_cast<uint8_t>(value >> (8 * index));
-				}
-				break;
-			}
-			case 2:
-				bytes.resize(std::max<size_t>(1, random() % bytes.size()));
-				break;
-			}
-		}
-		const bool resealedFlag = iteration % 2 == 0;
-		if (resealedFlag)
+		const std::string mutated = FuzzCorpus::Mutate(originalBytes, random);
+		std::vector<uint8_t> bytes(mutated.begin(), mutated.end());
+		if (iteration % 2 == 0)
 		{
 			Fx::ResealCompiled(bytes);
 		}
