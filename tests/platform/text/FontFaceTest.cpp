@@ -53,9 +53,7 @@ TEST_F(FontFaceTest, FailuresAreReportedClearly)
 {
 	Glyphs::FontMatch match;
 	EXPECT_FALSE(Glyphs::FontFace::Resolve("", match));
-	std::vector<std::string> reports = TakeReports();
-	ASSERT_EQ(reports.size(), 1u);
-	EXPECT_NE(reports[0].find("Glyphs::FontFace::Resolve: No font family named"), std::string::npos);
+	ExpectReports({{"Glyphs::FontFace::Resolve: No font family named"}});
 
 	TestSupport::ScratchDir scratch;
 	const std::string notAFont = scratch.File("notafont.ttf");
@@ -65,10 +63,7 @@ TEST_F(FontFaceTest, FailuresAreReportedClearly)
 	Glyphs::FontFace face;
 	EXPECT_FALSE(face.Init(myFactory.GetLibrary(), match));
 	EXPECT_FALSE(face.IsInitialized());
-	reports = TakeReports();
-	ASSERT_EQ(reports.size(), 1u);
-	EXPECT_NE(reports[0].find("FreeType cannot open '" + notAFont), std::string::npos) << reports[0];
-	EXPECT_NE(reports[0].find("'Broken'"), std::string::npos) << reports[0];
+	ExpectReports({{"FreeType cannot open '" + notAFont, "'Broken'"}});
 }
 
 TEST_F(FontFaceTest, AtlasPacksGlyphsWithoutOverlapAndGrowsWhenFull)

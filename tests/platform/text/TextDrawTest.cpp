@@ -42,24 +42,27 @@ LitBox FindLit(const std::vector<uint8_t>& somePixels, Pixel aBackground)
 	}
 	return box;
 }
+
+// A pixel in the stem of the first of some lit letters I: well inside the glyph.
+Pixel StemPixel(const std::vector<uint8_t>& somePixels, Pixel aBackground)
+{
+	const LitBox lit = FindLit(somePixels, aBackground);
+	EXPECT_GT(lit.myCount, 0);
+	return PixelAt(somePixels, ourWidth, lit.myLeft + 2, (lit.myTop + lit.myBottom) / 2);
+}
 } // namespace
 
 class TextDrawTest : public GpuTest
 {
 protected:
-	void SetUp() override
+	void SetUpGpu() override
 	{
-		GpuTest::SetUp();
-		if (IsSkipped() || HasFailure())
-		{
-			return;
-		}
 		myTarget = BindTarget(Dds::Format::R8G8B8A8_UNORM, ourWidth, ourHeight);
 		ASSERT_NE(myTarget, nullptr);
 		ASSERT_TRUE(myFactory.Init());
 		myFont = myFactory.CreateFontWrapper(GetContext(), "Arial");
 		ASSERT_NE(myFont, nullptr);
-		Clear({0, 0, 0, 1});
+		Clear({0, 0, 0, 255});
 	}
 
 	void TearDown() override
@@ -72,7 +75,12 @@ protected:
 		GpuTest::TearDown();
 	}
 
-	void Clear(std::array<float, 4> aColor) { GetContext().ClearRenderTargetView(*myTarget, aColor.data()); }
+	void Clear(Pixel aColor)
+	{
+		const float color[4] = {aColor[0] / 255.0f, aColor[1] / 255.0f, aColor[2] / 255.0f,
+		                        aColor[3] / 255.0f};
+		GetContext().ClearRenderTargetView(*myTarget, color);
+	}
 
 	std::vector<uint8_t> Read(const char* aName)
 	{
@@ -135,7 +143,7 @@ TEST_F(TextDrawTest, StringIntoARectangleWrapsAndClipsToIt)
 	for (const Case& test : cases)
 	{
 		SCOPED_TRACE(test.myName);
-		Clear({0, 0, 0, 1});
+		Clear({0, 0, 0, 255});
 		ASSERT_TRUE(myFont->DrawString(text, 14.0f, rect, 0xFFFFFFFF, test.myFlags | RestoreState));
 		const LitBox lit = FindLit(Read(test.myName), {0, 0, 0, 255});
 		EXPECT_GT(lit.myCount, 100);
@@ -153,14 +161,14 @@ TEST_F(TextDrawTest, ColourIsRedInTheLowByteAndAlphaBlendsOverTheBackground)
 	{
 		const char* myName;
 		uint32_t myColor;
-		std::array<float, 4> myBackground;
+		Pixel myBackground;
 		Pixel myExpected; // at a fully covered pixel
 	};
 	const Case cases[] = {
-	    {"red", 0xFF0000FF, {0, 0, 0, 1}, {255, 0, 0, 255}},
-	    {"green", 0xFF00FF00, {0, 0, 0, 1}, {0, 255, 0, 255}},
-	    {"blue", 0xFFFF0000, {0, 0, 0, 1}, {0, 0, 255, 255}},
-	    {"halfred-on-blue", 0x800000FF, {0, 0, 1, 1}, {128, 0, 127, 255}},
+	    {"red", 0xFF0000FF, {0, 0, 0, 255}, {255, 0, 0, 255}},
+	    {"green", 0xFF00FF00, {0, 0, 0, 255}, {0, 255, 0, 255}},
+	    {"blue", 0xFFFF0000, {0, 0, 0, 255}, {0, 0, 255, 255}},
+	    {"halfred-on-blue", 0x800000FF, {0, 0, 255, 255}, {128, 0, 127, 255}},
 	};
 	for (const Case& test : cases)
 	{
@@ -168,14 +176,7 @@ TEST_F(TextDrawTest, ColourIsRedInTheLowByteAndAlphaBlendsOverTheBackground)
 		Clear(test.myBackground);
 		ASSERT_TRUE(
 		    myFont->DrawString(L"IIII", 40.0f, 10.0f, 10.0f, test.myColor, Glyphs::DrawFlags::RestoreState));
-		const std::vector<uint8_t> pixels = Read(test.myName);
-		// The stem of the first I, well inside the glyph.
-		const Pixel background = {static_cast<uint8_t>(test.myBackground[0] * 255),
-		                          static_cast<uint8_t>(test.myBackground[1] * 255),
-		                          static_cast<uint8_t>(test.myBackground[2] * 255), 255};
-		const LitBox lit = FindLit(pixels, background);
-		ASSERT_GT(lit.myCount, 0);
-		const Pixel center = PixelAt(pixels, ourWidth, lit.myLeft + 2, (lit.myTop + lit.myBottom) / 2);
+		const Pixel center = StemPixel(Read(test.myName), test.myBackground);
 		for (int channel = 0; channel < 4; ++channel)
 		{
 			EXPECT_NEAR(center[channel], test.myExpected[channel], 1) << "channel " << channel;
@@ -220,14 +221,10 @@ TEST_F(TextDrawTest, RestoreStatePutsBackTheRenderStatesTheDrawChanged)
 	}
 	// The text itself drew with its own states whatever was set: white, not red only.
 	GetContext().SetBlendState(additive);
-	Clear({0, 0, 0, 1});
+	Clear({0, 0, 0, 255});
 	ASSERT_TRUE(
 	    myFont->DrawString(L"IIII", 40.0f, 10.0f, 10.0f, 0xFFFFFFFF, Glyphs::DrawFlags::RestoreState));
-	const std::vector<uint8_t> pixels = Read("states");
-	const LitBox lit = FindLit(pixels, {0, 0, 0, 255});
-	ASSERT_GT(lit.myCount, 0);
-	EXPECT_EQ(PixelAt(pixels, ourWidth, lit.myLeft + 2, (lit.myTop + lit.myBottom) / 2),
-	          (Pixel{255, 255, 255, 255}));
+	EXPECT_EQ(StemPixel(Read("states"), {0, 0, 0, 255}), (Pixel{255, 255, 255, 255}));
 }
 
 TEST_F(TextDrawTest, BadInputDrawsNothingAndIsReported)
