@@ -10,7 +10,7 @@
 #include <string>
 #include <vector>
 
-#include "core/CoreReport.h"
+#include "platform/ReportTest.h"
 #include "platform/sh/ShProjection.h"
 
 namespace
@@ -83,6 +83,17 @@ std::vector<float> RandomTexels(size_t aCount, unsigned aSeed)
 	return values;
 }
 
+// Red, green and blue coefficients one after the other, as an atlas holds them per cube.
+using Projection = std::array<float, Sh::ourCubeCoefficientCount>;
+
+Projection Project(const std::vector<float>& someTexels, int aWidth, int aChannelCount)
+{
+	Projection coefficients{};
+	EXPECT_TRUE(Sh::ProjectCubeTexels(someTexels.data(), aWidth, aChannelCount, coefficients.data(),
+	                                  coefficients.data() + 9, coefficients.data() + 18));
+	return coefficients;
+}
+
 void ExpectCoefficients(const float* someActual, const Coefficients& someExpected, double aTolerance,
                         const std::string& aWhat)
 {
@@ -92,42 +103,7 @@ void ExpectCoefficients(const float* someActual, const Coefficients& someExpecte
 	}
 }
 
-class ShProjectionTest : public testing::Test
-{
-protected:
-	void SetUp() override
-	{
-		ourReports.clear();
-		// Refused arguments are reported at the error level; both levels are collected.
-		myPreviousHandler = CoreReport::GetCriticalHandler();
-		myPreviousErrorHandler = CoreReport::GetErrorHandler();
-		const CoreReport::Handler record = [](int, const char* aFunctionName, const char* aMessage) {
-			ourReports.push_back(std::string(aFunctionName) + ": " + aMessage);
-		};
-		CoreReport::SetCriticalHandler(record);
-		CoreReport::SetErrorHandler(record);
-	}
-
-	void TearDown() override
-	{
-		CoreReport::SetCriticalHandler(myPreviousHandler);
-		CoreReport::SetErrorHandler(myPreviousErrorHandler);
-		EXPECT_TRUE(ourReports.empty()) << "Unexpected report: " << ourReports.front();
-	}
-
-	// Expects exactly one report since the last call, naming aFunction and containing aText.
-	static void ExpectReport(const std::string& aFunction, const std::string& aText)
-	{
-		ASSERT_EQ(ourReports.size(), 1u);
-		EXPECT_EQ(ourReports[0].rfind(aFunction + ": ", 0), 0u) << ourReports[0];
-		EXPECT_NE(ourReports[0].find(aText), std::string::npos) << ourReports[0];
-		ourReports.clear();
-	}
-
-	CoreReport::Handler myPreviousHandler = nullptr;
-	CoreReport::Handler myPreviousErrorHandler = nullptr;
-	static inline std::vector<std::string> ourReports;
-};
+using ShProjectionTest = ReportTest;
 
 TEST_F(ShProjectionTest, TexelDirectionsFollowEachFaceFrame)
 {
@@ -207,19 +183,12 @@ TEST_F(ShProjectionTest, PolynomialCubeMapsGiveTheirIntegrals)
 		{
 			rgb.insert(rgb.end(), {rgba[texel], rgba[texel + 1], rgba[texel + 2]});
 		}
-		float r[9], g[9], b[9];
-		ASSERT_TRUE(Sh::ProjectCubeTexels(rgba.data(), width, 4, r, g, b));
-		ExpectCoefficients(r, red.myExpected, 1e-3, std::string("red ") + red.myName);
-		ExpectCoefficients(g, green.myExpected, 1e-3, std::string("green ") + green.myName);
-		ExpectCoefficients(b, blue.myExpected, 1e-3, std::string("blue ") + blue.myName);
-		float r3[9], g3[9], b3[9];
-		ASSERT_TRUE(Sh::ProjectCubeTexels(rgb.data(), width, 3, r3, g3, b3));
-		for (size_t k = 0; k < 9; ++k)
-		{
-			EXPECT_EQ(r3[k], r[k]);
-			EXPECT_EQ(g3[k], g[k]);
-			EXPECT_EQ(b3[k], b[k]);
-		}
+		const Projection projection = Project(rgba, width, 4);
+		ExpectCoefficients(projection.data(), red.myExpected, 1e-3, std::string("red ") + red.myName);
+		ExpectCoefficients(projection.data() + 9, green.myExpected, 1e-3,
+		                   std::string("green ") + green.myName);
+		ExpectCoefficients(projection.data() + 18, blue.myExpected, 1e-3, std::string("blue ") + blue.myName);
+		EXPECT_EQ(Project(rgb, width, 3), projection) << "three channels project as four do";
 	}
 	// The weights add up to 4 pi at any width, a single texel per face and widths too wide to keep a
 	// table for included.
@@ -227,13 +196,12 @@ TEST_F(ShProjectionTest, PolynomialCubeMapsGiveTheirIntegrals)
 	{
 		const std::vector<float> constant =
 		    MakeCube(constantWidth, cases[0].myFunction, cases[0].myFunction, cases[0].myFunction);
-		float r[9], g[9], b[9];
-		ASSERT_TRUE(Sh::ProjectCubeTexels(constant.data(), constantWidth, 4, r, g, b));
-		EXPECT_NEAR(r[0], 2.0 * ourRootPi, 1e-5) << "width " << constantWidth;
-		EXPECT_NEAR(b[0], 2.0 * ourRootPi, 1e-5) << "width " << constantWidth;
+		const Projection projection = Project(constant, constantWidth, 4);
+		EXPECT_NEAR(projection[0], 2.0 * ourRootPi, 1e-5) << "width " << constantWidth;
+		EXPECT_NEAR(projection[18], 2.0 * ourRootPi, 1e-5) << "width " << constantWidth;
 		for (size_t k = 1; k < 9; ++k)
 		{
-			EXPECT_NEAR(g[k], 0.0, 1e-5) << "width " << constantWidth << ", coefficient " << k;
+			EXPECT_NEAR(projection[9 + k], 0.0, 1e-5) << "width " << constantWidth << ", coefficient " << k;
 		}
 	}
 }
@@ -266,9 +234,7 @@ TEST_F(ShProjectionTest, SingleFaceLightsGiveTheirIntegrals)
 		                           axis == 2 ? axialSquared : crossSquared};
 		expected[6] = zonalNorm * (3.0 * squared[2] - 2.0 * std::numbers::pi / 3.0);
 		expected[8] = sectoralNorm * (squared[0] - squared[1]);
-		float r[9], g[9], b[9];
-		ASSERT_TRUE(Sh::ProjectCubeTexels(texels.data(), width, 4, r, g, b));
-		ExpectCoefficients(r, expected, 1e-3, "face " + std::to_string(face));
+		ExpectCoefficients(Project(texels, width, 4).data(), expected, 1e-3, "face " + std::to_string(face));
 	}
 }
 
@@ -300,15 +266,9 @@ TEST_F(ShProjectionTest, AtlasCubesProjectExactlyLikeSeparateCubes)
 					faces.insert(faces.end(), first, first + faceWidth * channels);
 				}
 			}
-			float r[9], g[9], b[9];
-			ASSERT_TRUE(Sh::ProjectCubeTexels(faces.data(), faceWidth, channels, r, g, b));
-			const float* actual = coefficients.data() + cube * 27;
-			for (size_t k = 0; k < 9; ++k)
-			{
-				EXPECT_EQ(actual[k], r[k]) << "cube " << cube << " red " << k;
-				EXPECT_EQ(actual[9 + k], g[k]) << "cube " << cube << " green " << k;
-				EXPECT_EQ(actual[18 + k], b[k]) << "cube " << cube << " blue " << k;
-			}
+			Projection actual;
+			std::copy_n(coefficients.begin() + cube * 27, 27, actual.begin());
+			EXPECT_EQ(actual, Project(faces, faceWidth, channels)) << "cube " << cube;
 		}
 	}
 }
@@ -318,30 +278,30 @@ TEST_F(ShProjectionTest, BadArgumentsAreReportedAndRefused)
 	const std::vector<float> texels = RandomTexels(6 * 4 * 4 * 4, 3u);
 	float r[9], g[9], b[9];
 	std::fill_n(r, 9, -5.0f);
-	const char* function = "Sh::ProjectCubeTexels";
 	EXPECT_FALSE(Sh::ProjectCubeTexels(nullptr, 4, 4, r, g, b));
-	ExpectReport(function, "texels missing");
 	EXPECT_FALSE(Sh::ProjectCubeTexels(texels.data(), 0, 4, r, g, b));
-	ExpectReport(function, "face width 0");
 	EXPECT_FALSE(Sh::ProjectCubeTexels(texels.data(), 4, 2, r, g, b));
-	ExpectReport(function, "2 channels");
 	EXPECT_FALSE(Sh::ProjectCubeTexels(texels.data(), 4, 4, r, nullptr, b));
-	ExpectReport(function, "outputs missing");
 	EXPECT_EQ(r[0], -5.0f);
+	const std::string texelsFunction = "Sh::ProjectCubeTexels: ";
+	ExpectReports({{texelsFunction, "texels missing"},
+	               {texelsFunction, "face width 0"},
+	               {texelsFunction, "2 channels"},
+	               {texelsFunction, "outputs missing"}});
 
 	std::vector<float> coefficients(27, -5.0f);
-	const char* atlasFunction = "Sh::ProjectCubeAtlas";
 	// Four 4-texel tiles per row need two tile rows (8 texels) for one cube.
 	EXPECT_FALSE(Sh::ProjectCubeAtlas(texels.data(), 16, 7, 4, 4, 1, coefficients.data()));
-	ExpectReport(atlasFunction, "16x7 atlas cannot hold 1 cubes of 4-texel faces");
 	EXPECT_FALSE(Sh::ProjectCubeAtlas(texels.data(), 3, 64, 4, 4, 1, coefficients.data()));
-	ExpectReport(atlasFunction, "3x64 atlas cannot hold");
 	EXPECT_FALSE(Sh::ProjectCubeAtlas(texels.data(), 16, 8, 4, 4, -1, coefficients.data()));
-	ExpectReport(atlasFunction, "-1 cubes");
 	EXPECT_FALSE(Sh::ProjectCubeAtlas(texels.data(), 16, 8, 5, 4, 1, coefficients.data()));
-	ExpectReport(atlasFunction, "5 channels");
 	EXPECT_FALSE(Sh::ProjectCubeAtlas(texels.data(), 16, 8, 4, 4, 1, nullptr));
-	ExpectReport(atlasFunction, "output missing");
+	const std::string atlasFunction = "Sh::ProjectCubeAtlas: ";
+	ExpectReports({{atlasFunction, "16x7 atlas cannot hold 1 cubes of 4-texel faces"},
+	               {atlasFunction, "3x64 atlas cannot hold"},
+	               {atlasFunction, "-1 cubes"},
+	               {atlasFunction, "5 channels"},
+	               {atlasFunction, "output missing"}});
 	EXPECT_EQ(coefficients[0], -5.0f);
 	EXPECT_TRUE(Sh::ProjectCubeAtlas(texels.data(), 16, 8, 4, 4, 0, coefficients.data()));
 	EXPECT_EQ(coefficients[0], -5.0f);
