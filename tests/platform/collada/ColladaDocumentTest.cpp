@@ -89,7 +89,7 @@ TEST(ColladaDocumentTest, RealDocumentsLoadWithTheirCounts)
 	}
 }
 
-TEST(ColladaDocumentTest, MaterialsLeadToImageFiles)
+TEST(ColladaDocumentTest, MaterialsLeadToImageFilesAndCamerasAndLightsKeepTheirParameters)
 {
 	Collada::Document document;
 	std::string error;
@@ -106,12 +106,7 @@ TEST(ColladaDocumentTest, MaterialsLeadToImageFiles)
 	ASSERT_TRUE(document.Load("../shared/testdata/collada/teapots.DAE", error)) << error;
 	ASSERT_EQ(document.GetImages().size(), 1u);
 	EXPECT_EQ(document.GetImages()[0].myPath, "../LWO/LWO2/MappingModes/earthSpherical.jpg");
-}
 
-TEST(ColladaDocumentTest, CamerasAndLights)
-{
-	Collada::Document document;
-	std::string error;
 	ASSERT_TRUE(document.Load("../shared/testdata/collada/cube_tristrips.dae", error)) << error;
 	const Collada::Camera* camera = document.FindCamera("PerspCamera");
 	ASSERT_NE(camera, nullptr);

@@ -116,10 +116,6 @@ TEST(ColladaGeometryTest, NodeTransformsComposeInFileOrderAndInstanceNodesResolv
 	ASSERT_EQ(a->myInstances.size(), 1u);
 	ASSERT_EQ(a->myInstances[0].myNode, document.FindNode("shared"));
 	ExpectPoint(Apply(a->myInstances[0].myNode->GetLocalMatrix(), 1, 2, 3), 2, 4, 6);
-
-	// A nested node of a real file: the Blender export's child nodes carry matrices.
-	ASSERT_TRUE(document.Load("../shared/testdata/collada/box_nested_animation.dae", error)) << error;
-	ASSERT_NE(document.GetVisualScene(), nullptr);
 }
 
 TEST(ColladaGeometryTest, SkinWeightsAndReduceInfluences)
