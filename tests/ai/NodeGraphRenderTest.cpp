@@ -94,12 +94,6 @@ protected:
 	AI::NGNode myNodes[2];
 	AI::NGEdge myEdge;
 };
-
-// A point on the segment from aFrom to aTo.
-Vector3<float> Along(const Vector3<float>& aFrom, const Vector3<float>& aTo, float aT)
-{
-	return aFrom + (aTo - aFrom) * aT;
-}
 } // namespace
 
 TEST_F(NodeGraphRenderTest, BoxesAtTheNodesAndALineBetweenThemFollowAMovedNode)
@@ -139,7 +133,7 @@ TEST_F(NodeGraphRenderTest, BoxesAtTheNodesAndALineBetweenThemFollowAMovedNode)
 	// The line between the boxes.
 	for (const float t : {0.2f, 0.35f, 0.5f, 0.65f, 0.8f})
 	{
-		const Pixel onLine = Project(Along(a, b, t));
+		const Pixel onLine = Project(a + (b - a) * t);
 		EXPECT_TRUE(IsNear(onLine, ourGreen)) << "line at t = " << t;
 	}
 	EXPECT_TRUE(IsBlackAround(Project({0.0f, 1.0f, 10.0f}))) << "nothing off the graph";
@@ -153,8 +147,8 @@ TEST_F(NodeGraphRenderTest, BoxesAtTheNodesAndALineBetweenThemFollowAMovedNode)
 	EXPECT_TRUE(IsBlackAround(Project(b))) << "the box left its old place";
 	for (const float t : {0.3f, 0.5f, 0.7f})
 	{
-		EXPECT_TRUE(IsNear(Project(Along(a, moved, t)), ourGreen)) << "new line at t = " << t;
-		EXPECT_TRUE(IsBlackAround(Project(Along(a, b, t)))) << "old line at t = " << t;
+		EXPECT_TRUE(IsNear(Project(a + (moved - a) * t), ourGreen)) << "new line at t = " << t;
+		EXPECT_TRUE(IsBlackAround(Project(a + (b - a) * t))) << "old line at t = " << t;
 	}
 }
 

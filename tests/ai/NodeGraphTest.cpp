@@ -23,11 +23,11 @@ protected:
 		EXPECT_NE(log.find(aPart), std::string::npos) << aPart << "\nnot in:\n" << log;
 	}
 
-	// The entry as the log writes a critical report.
-	static std::string Critical(int aLine, const std::string& aFunction, const std::string& aMessage)
+	// Expects the critical report entry, as the log writes it.
+	void ExpectCritical(int aLine, const std::string& aFunction, const std::string& aMessage)
 	{
-		return "\"Error Type:\"\"CRITICAL ERROR\"\n\"Line:\"" + std::to_string(aLine) + "\n\"Function:\"\"" +
-		       aFunction + "\"\n\"" + aMessage + "\n\"\n";
+		ExpectLogged("\"Error Type:\"\"CRITICAL ERROR\"\n\"Line:\"" + std::to_string(aLine) +
+		             "\n\"Function:\"\"" + aFunction + "\"\n\"" + aMessage + "\n\"\n");
 	}
 };
 
@@ -97,7 +97,7 @@ TEST_F(NodeGraphTest, ANodeHoldsTwoEdgesAndRefusesAThird)
 	node.AddEdge(&edges[1]);
 	EXPECT_EQ(TakeLog(), "");
 	node.AddEdge(&edges[2]);
-	ExpectLogged(Critical(34, "AI::NGNode::AddEdge", "Tried to connect more than 2 edges to node"));
+	ExpectCritical(34, "AI::NGNode::AddEdge", "Tried to connect more than 2 edges to node");
 	EXPECT_EQ(Slots(node), (std::vector<const AI::NGEdge*>{&edges[0], &edges[1]}));
 	EXPECT_EQ(Slots(AI::NGNode(node)), Slots(node)) << "a copy shares the edges";
 
@@ -112,7 +112,7 @@ TEST_F(NodeGraphTest, ANodeHoldsTwoEdgesAndRefusesAThird)
 
 	// An edge the node does not hold: reported, and both slots stay.
 	node.RemoveEdge(&edges[0]);
-	ExpectLogged(Critical(51, "AI::NGNode::RemoveEdge", "Tried to remove an unconnected edge from node"));
+	ExpectCritical(51, "AI::NGNode::RemoveEdge", "Tried to remove an unconnected edge from node");
 	EXPECT_EQ(Slots(node), (std::vector<const AI::NGEdge*>{&edges[2], nullptr}));
 }
 
@@ -151,11 +151,9 @@ TEST_F(NodeGraphTest, QueriesWalkAChain)
 
 	// Unconnected pairs: reported; the answer falls back to the first end and first slot.
 	EXPECT_EQ(edges[0].GetOtherNode(&nodes[2]), &nodes[0]);
-	ExpectLogged(
-	    Critical(50, "AI::NGEdge::GetOtherNode", "Tried to get other node whilst not connected to edge"));
+	ExpectCritical(50, "AI::NGEdge::GetOtherNode", "Tried to get other node whilst not connected to edge");
 	EXPECT_EQ(nodes[0].FindConnectingEdge(&nodes[2]), &edges[0]);
-	ExpectLogged(
-	    Critical(117, "AI::NGNode::FindConnectingEdge", "Tried to find connection for unconnected nodes"));
+	ExpectCritical(117, "AI::NGNode::FindConnectingEdge", "Tried to find connection for unconnected nodes");
 	// The middle node's first slot is empty now: nothing to fall back on.
 	EXPECT_EQ(nodes[1].FindConnectingEdge(&nodes[0]), nullptr);
 	ExpectLogged("Tried to find connection for unconnected nodes");

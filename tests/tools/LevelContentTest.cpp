@@ -396,18 +396,9 @@ TEST(SampleLevelTest, EveryFileIsWrittenAsTheEditorSavesIt)
 		// Every number as the savers write it, so saving after an edit changes only the edited records.
 		TiXmlDocument document;
 		ASSERT_TRUE(document.LoadFile(path)) << file;
-		std::vector<const TiXmlElement*> pending = {document.RootElement()};
 		int numbers = 0;
-		while (!pending.empty())
-		{
-			const TiXmlElement* element = pending.back();
-			pending.pop_back();
-			for (const TiXmlElement* child = element->FirstChildElement(); child;
-			     child = child->NextSiblingElement())
-			{
-				pending.push_back(child);
-			}
-			for (const TiXmlAttribute* attribute = element->FirstAttribute(); attribute;
+		const std::function<void(const TiXmlElement*)> check = [&](const TiXmlElement* anElement) {
+			for (const TiXmlAttribute* attribute = anElement->FirstAttribute(); attribute;
 			     attribute = attribute->Next())
 			{
 				std::istringstream stream(attribute->Value());
@@ -419,7 +410,13 @@ TEST(SampleLevelTest, EveryFileIsWrittenAsTheEditorSavesIt)
 					EXPECT_EQ(attribute->ValueStr(), SaverText(value)) << file << ": " << attribute->Name();
 				}
 			}
-		}
+			for (const TiXmlElement* child = anElement->FirstChildElement(); child;
+			     child = child->NextSiblingElement())
+			{
+				check(child);
+			}
+		};
+		check(document.RootElement());
 		EXPECT_EQ(numbers > 0, file.find("/levels/") != std::string::npos) << file;
 	}
 }
