@@ -1,5 +1,5 @@
 // The light-volume and decal-box models read back with the COLLADA reader: closed convex shapes
-// wound outward that contain the shape the renderer scales them to.
+// wound outward that contain the shape the renderer scales them to, the point volume closely.
 
 #include <gtest/gtest.h>
 
