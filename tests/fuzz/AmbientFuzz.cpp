@@ -2,7 +2,6 @@
 // read has counts the 3D textures can hold, blocks of its cell count, and writes back byte for byte.
 
 #include <cstdio>
-#include <cstdlib>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
@@ -34,14 +33,6 @@ public:
 	std::string myInput;
 	std::string myOutput;
 };
-
-void Require(bool aCondition)
-{
-	if (!aCondition)
-	{
-		std::abort();
-	}
-}
 } // namespace
 
 int LumoraFuzz::Ambient(const uint8_t* someData, size_t aSize)

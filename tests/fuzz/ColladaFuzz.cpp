@@ -4,7 +4,6 @@
 // is a model tree that the .al writer and reader carry over unchanged.
 
 #include <algorithm>
-#include <cstdlib>
 #include <string>
 #include <tinyxml.h>
 #include <vector>
@@ -20,10 +19,7 @@ namespace
 void WalkNode(const ::Collada::Node& aNode, int aDepth)
 {
 	// The reader refuses instance cycles; a walk deeper than any document could nest means one slipped by.
-	if (aDepth > 10000)
-	{
-		std::abort();
-	}
+	LumoraFuzz::Require(aDepth <= 10000);
 	volatile float sink = aNode.GetLocalMatrix().myMatrix[0];
 	(void)sink;
 	for (const ::Collada::Instance& instance : aNode.myInstances)
@@ -72,10 +68,7 @@ int LumoraFuzz::Collada(const uint8_t* someData, size_t aSize)
 	std::string error;
 	if (!document.LoadFromMemory(someData, aSize, error))
 	{
-		if (error.empty() || !document.GetGeometries().empty() || document.GetVisualScene() != nullptr)
-		{
-			std::abort();
-		}
+		Require(!error.empty() && document.GetGeometries().empty() && document.GetVisualScene() == nullptr);
 		return 0;
 	}
 	++ourAcceptedCount;
@@ -84,25 +77,16 @@ int LumoraFuzz::Collada(const uint8_t* someData, size_t aSize)
 		::Collada::Mesh mesh = geometry.myMesh;
 		const size_t triangles = mesh.GetTriangleCount();
 		mesh.Triangulate();
-		if (!mesh.IsTriangles() || mesh.GetTriangleCount() != triangles)
-		{
-			std::abort();
-		}
+		Require(mesh.IsTriangles() && mesh.GetTriangleCount() == triangles);
 		for (const ::Collada::PolygonSet& set : mesh.mySets)
 		{
 			for (const ::Collada::Input& input : set.myInputs)
 			{
 				const ::Collada::Source* source = mesh.FindSource(input.mySource);
-				if (source == nullptr || input.myIndices.size() != set.GetTriangleCount() * 3)
-				{
-					std::abort();
-				}
+				Require(source != nullptr && input.myIndices.size() == set.GetTriangleCount() * 3);
 				for (uint32_t index : input.myIndices)
 				{
-					if (source->Element(index) == nullptr && source->NameElement(index) == nullptr)
-					{
-						std::abort();
-					}
+					Require(source->Element(index) != nullptr || source->NameElement(index) != nullptr);
 				}
 			}
 		}
@@ -113,10 +97,7 @@ int LumoraFuzz::Collada(const uint8_t* someData, size_t aSize)
 		skin.ReduceInfluences(4, 0.0f);
 		for (const auto& influences : skin.myInfluences)
 		{
-			if (influences.size() > 4)
-			{
-				std::abort();
-			}
+			Require(influences.size() <= 4);
 		}
 	}
 	for (const auto& scene : document.GetVisualScenes())

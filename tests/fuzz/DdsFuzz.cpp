@@ -1,6 +1,5 @@
 // DDS files: any bytes load or fail with a message; what loads saves and loads back the same.
 
-#include <cstdlib>
 #include <string>
 #include <vector>
 
@@ -13,20 +12,14 @@ int LumoraFuzz::Dds(const uint8_t* someData, size_t aSize)
 	std::string error;
 	if (!::Dds::LoadFromMemory(someData, aSize, image, error))
 	{
-		if (error.empty() || !image.IsEmpty())
-		{
-			std::abort();
-		}
+		Require(!error.empty() && image.IsEmpty());
 		return 0;
 	}
 	++ourAcceptedCount;
 	std::vector<uint8_t> saved;
 	::Dds::Image again;
-	if (!::Dds::SaveToMemory(image, saved, error) ||
-	    !::Dds::LoadFromMemory(saved.data(), saved.size(), again, error) || !(again.Info() == image.Info()) ||
-	    again.Bytes() != image.Bytes())
-	{
-		std::abort();
-	}
+	Require(::Dds::SaveToMemory(image, saved, error) &&
+	        ::Dds::LoadFromMemory(saved.data(), saved.size(), again, error) && again.Info() == image.Info() &&
+	        again.Bytes() == image.Bytes());
 	return 0;
 }

@@ -9,17 +9,27 @@
 // and the sanitizer builds check the same guarantees.
 #include <cstddef>
 #include <cstdint>
+#include <cstdlib>
 
 namespace LumoraFuzz
 {
+// Ends the process where a guarantee does not hold, which a fuzzer reports with its input.
+inline void Require(bool aCondition)
+{
+	if (!aCondition)
+	{
+		std::abort();
+	}
+}
+
 int Dds(const uint8_t* someData, size_t aSize);
 int Collada(const uint8_t* someData, size_t aSize);
 int Al(const uint8_t* someData, size_t aSize);
 int Ambient(const uint8_t* someData, size_t aSize);
 // The five level files and the two catalogues, separated by zero bytes (rooms, entities,
 // lights, node graph, decals, entity types, decal types; a part left off is a missing file),
-// loaded through a headless editor facade made on the first call, with the log non-fatal.
-// Without an OpenGL context it does nothing.
+// loaded through a headless editor facade made on the first call, with the log non-fatal, then
+// saved and loaded again. Without an OpenGL context it does nothing.
 int Level(const uint8_t* someData, size_t aSize);
 
 // How many inputs the entries above accepted as valid files (the level entry counts none), so

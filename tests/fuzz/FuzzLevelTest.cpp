@@ -14,7 +14,7 @@ TEST(FuzzCorpusTest, LevelsLoadThroughTheFacadeWhateverTheirFiles)
 		GTEST_SKIP() << "No OpenGL 4.5 core context";
 	}
 	std::mt19937 random(20261125);
-	FuzzCorpus::Run({"level", &LumoraFuzz::Level, 200, false}, seeds, random);
+	FuzzCorpus::Run({"level", &LumoraFuzz::Level, 80, false}, seeds, random);
 
 	// The entry really loads each input, catalogues included: the small sample level without its
 	// entity types places no entity, and with them every one.

@@ -1,6 +1,7 @@
 // Level folders: the five level files and the two catalogues, any bytes, loaded through the
 // editor facade with the log non-fatal (the tool that checks levels runs it so): loading may
-// report and leave things out, but never crash.
+// report and leave things out, but never crash; and what the editor then saves loads again
+// with the same records.
 //
 // The facade is made once, headless, in a scratch working directory whose data/ links to the
 // repository's data folders, except data/XML, which holds the files of each input.
@@ -39,21 +40,17 @@ struct LevelState
 	fs::path myPreviousDirectory;
 };
 
+// How many point lights, spot lights, decals, path nodes and edges the facade holds.
+std::array<int, 5> Records(const Lumora::LumoraWrapper& aFacade)
+{
+	return {aFacade.GetPointLights().Count(), aFacade.GetSpotLights().Count(), aFacade.GetDecals().Count(),
+	        aFacade.GetNodes().Count(), aFacade.GetEdges().Count()};
+}
+
 LevelState& State()
 {
 	static LevelState ourState;
 	return ourState;
-}
-
-bool HasGl()
-{
-	Gpu::Device probe;
-	if (!probe.Init(16, 16))
-	{
-		return false;
-	}
-	probe.Destroy();
-	return true;
 }
 
 Lumora::LumoraWrapper* Facade()
@@ -64,10 +61,12 @@ Lumora::LumoraWrapper* Facade()
 		return state.myFacade;
 	}
 	state.myTriedFlag = true;
-	if (!HasGl())
+	Gpu::Device probe;
+	if (!probe.Init(16, 16))
 	{
 		return nullptr;
 	}
+	probe.Destroy();
 	const fs::path source = fs::path(LUMORA_FUZZ_SOURCE_ROOT) / "data";
 	state.myScratch = fs::temp_directory_path() / ("lumora-fuzz-level-" + std::to_string(::getpid()));
 	fs::remove_all(state.myScratch);
@@ -90,10 +89,7 @@ Lumora::LumoraWrapper* Facade()
 		fs::remove_all(State().myScratch, ignored);
 	});
 	Lumora::LumoraWrapper::SetFatalReportLevels(std::bitset<4>(0));
-	if (!Lumora::LumoraWrapper::Create(0, 64, 64))
-	{
-		std::abort(); // a context was there a moment ago
-	}
+	LumoraFuzz::Require(Lumora::LumoraWrapper::Create(0, 64, 64)); // a context was there a moment ago
 	state.myFacade = Lumora::LumoraWrapper::GetInstance();
 	return state.myFacade;
 }
@@ -140,5 +136,12 @@ int LumoraFuzz::Level(const uint8_t* someData, size_t aSize)
 	}
 	facade->ReloadCatalogues();
 	facade->ParseLevel(u"fuzz");
+	// What the editor saves loads again, with the same records (what the loader left out stays
+	// left out, and stays in the files).
+	const std::array<int, 5> loaded = Records(*facade);
+	facade->SaveLights(u"fuzz");
+	facade->SaveDecals(u"fuzz");
+	facade->ParseLevel(u"fuzz");
+	Require(Records(*facade) == loaded);
 	return 0;
 }

@@ -4,12 +4,12 @@
 // vertex type and index format, its layout is the type's, every index names one of its vertices,
 // every surface lies inside its indices, every texture binding names a model of the tree; and
 // the .al writer and reader carry the tree over unchanged. A broken guarantee aborts.
-#include <cstdlib>
 #include <cstring>
 #include <set>
 #include <string>
 #include <vector>
 
+#include "FuzzEntries.h"
 #include "model/AlFile.h"
 #include "model/Model.h"
 #include "model/ModelFactory.h"
@@ -18,14 +18,6 @@
 
 namespace LumoraFuzz
 {
-inline void Require(bool aCondition)
-{
-	if (!aCondition)
-	{
-		std::abort();
-	}
-}
-
 inline void CheckModel(const Zeph::Model& aModel, std::set<const Zeph::Model*>& someModels)
 {
 	someModels.insert(&aModel);
