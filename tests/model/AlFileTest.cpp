@@ -1,6 +1,7 @@
 // The binary model file as bytes: trees written and read back, a hand-written
 // version-1 file, and damaged files failing cleanly. No GPU: effects, textures and
 // buffers are the GPU suite's.
+#include <array>
 #include <cstring>
 #include <functional>
 #include <gtest/gtest.h>
@@ -88,7 +89,7 @@ std::unique_ptr<Zeph::ModelNode> Parse(const std::vector<uint8_t>& someBytes, st
 }
 } // namespace
 
-TEST(AlFileTest, ATreeWrittenAndReadBackIsTheSameTree)
+TEST(AlFileTest, ATreeWrittenAndReadBackIsTheSameTreeAndEveryTruncationFails)
 {
 	const std::unique_ptr<Zeph::ModelNode> tree(ModelTreeCheck::MakeTree());
 	std::vector<uint8_t> bytes;
@@ -111,6 +112,15 @@ TEST(AlFileTest, ATreeWrittenAndReadBackIsTheSameTree)
 	std::vector<uint8_t> again;
 	Zeph::AlFile::Encode(*read, again);
 	EXPECT_EQ(again, bytes) << "writing the read tree gives the same bytes";
+
+	// Every truncation of the file fails.
+	for (size_t length = 0; length < bytes.size(); ++length)
+	{
+		const std::vector<uint8_t> cut(bytes.begin(), bytes.begin() + static_cast<std::ptrdiff_t>(length));
+		EXPECT_EQ(Parse(cut, error), nullptr) << "cut at " << length;
+		EXPECT_FALSE(error.empty()) << "cut at " << length;
+		error.clear();
+	}
 }
 
 TEST(AlFileTest, AVersionOneFileHasNoModelFlagOnTheRootOnly)
@@ -126,17 +136,15 @@ TEST(AlFileTest, AVersionOneFileHasNoModelFlagOnTheRootOnly)
 	const Zeph::Model* model = root->GetModel();
 	ASSERT_NE(model, nullptr);
 	EXPECT_FALSE(model->IsNullObject());
-	EXPECT_EQ(model->GetModelID(), 42);
-	EXPECT_EQ(model->GetVertexType(), 2);
-	EXPECT_EQ(model->GetIndexCount(), 3);
-	EXPECT_EQ(model->GetVertexCount(), 1);
-	EXPECT_EQ(model->GetVertexStride(), 32);
+	// Model ID, vertex type, index count, vertex count and stride, in the file's order.
+	EXPECT_EQ((std::array{model->GetModelID(), model->GetVertexType(), model->GetIndexCount(),
+	                      model->GetVertexCount(), model->GetVertexStride()}),
+	          (std::array{42, 2, 3, 1, 32}));
 	float lastFloat = 0.0f;
 	std::memcpy(&lastFloat, model->GetVertexData().data() + 28, 4);
 	EXPECT_EQ(lastFloat, 7.0f);
-	EXPECT_EQ(model->GetFirstName(), "first");
-	EXPECT_EQ(model->GetTechniqueName(), "RenderAlphaTest");
-	EXPECT_EQ(model->GetThirdName(), "NULL");
+	EXPECT_EQ((std::array{model->GetFirstName(), model->GetTechniqueName(), model->GetThirdName()}),
+	          (std::array<std::string, 3>{"first", "RenderAlphaTest", "NULL"}));
 	ASSERT_EQ(model->GetSurfaces().Count(), 1);
 	EXPECT_EQ(model->GetSurfaces()[0].GetIndexCount(), 3);
 	EXPECT_EQ(model->GetSurfaces()[0].GetPrimitiveTopology(), Gpu::PrimitiveTopology::TriangleList);
@@ -156,20 +164,6 @@ TEST(AlFileTest, AVersionOneFileHasNoModelFlagOnTheRootOnly)
 	Bytes second = file;
 	second.myBytes[0] = 2;
 	EXPECT_EQ(Parse(second.myBytes, error), nullptr);
-}
-
-TEST(AlFileTest, EveryTruncationOfAFileFails)
-{
-	const std::unique_ptr<Zeph::ModelNode> tree(ModelTreeCheck::MakeTree());
-	std::vector<uint8_t> bytes;
-	Zeph::AlFile::Encode(*tree, bytes);
-	for (size_t length = 0; length < bytes.size(); ++length)
-	{
-		const std::vector<uint8_t> cut(bytes.begin(), bytes.begin() + static_cast<std::ptrdiff_t>(length));
-		std::string error;
-		EXPECT_EQ(Parse(cut, error), nullptr) << "cut at " << length;
-		EXPECT_FALSE(error.empty()) << "cut at " << length;
-	}
 }
 
 TEST(AlFileTest, DamagedFilesFailWithTheirReason)

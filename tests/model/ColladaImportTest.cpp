@@ -3,25 +3,24 @@
 // documents pin the vertex numbering, the winding, the texture coordinates, the
 // mirror at the root, the skin words, cameras, lights and material textures.
 #include <array>
-#include <cmath>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <gtest/gtest.h>
+#include <iterator>
 #include <numbers>
+#include <sstream>
 #include <tuple>
 #include <vector>
 
 #include "engine/Camera.h"
 #include "engine/EngineFixture.h"
-#include "model/ColladaMeshFactory.h"
 #include "model/Model.h"
 #include "model/ModelFactory.h"
 #include "model/ModelLight.h"
 #include "model/ModelNode.h"
 #include "model/TransformationNode.h"
 #include "model/VertexTypes.h"
-#include "platform/dds/DdsFile.h"
 
 namespace
 {
@@ -102,17 +101,9 @@ std::string Document(const std::string& aSources, const std::string& aSets, cons
 
 std::string Source(const std::string& anId, int aStride, const std::string& someValues)
 {
-	int count = 0;
-	for (size_t at = 0; at < someValues.size();)
-	{
-		const size_t next = someValues.find_first_not_of(' ', at);
-		if (next == std::string::npos)
-		{
-			break;
-		}
-		++count;
-		at = someValues.find(' ', next);
-	}
+	std::istringstream values(someValues);
+	const auto count = static_cast<int>(
+	    std::distance(std::istream_iterator<std::string>(values), std::istream_iterator<std::string>()));
 	return "<source id=\"" + anId + "\"><float_array id=\"" + anId + "a\" count=\"" + std::to_string(count) +
 	       "\">" + someValues + "</float_array><technique_common><accessor source=\"#" + anId +
 	       "a\" count=\"" + std::to_string(count / aStride) + "\" stride=\"" + std::to_string(aStride) +
@@ -398,23 +389,17 @@ TEST_F(ColladaImportTest, TheSampleModelsImportAsLitModelsWithTheirTextures)
 		SCOPED_TRACE(name);
 		Zeph::ModelNode* root = factory.GetModel(name);
 		ASSERT_NE(root, nullptr) << TakeLog();
+		TreeContents contents;
+		Collect(*root, contents);
 		int models = 0;
-		std::vector<const Zeph::ModelNode*> pending = {root};
-		while (!pending.empty())
+		for (const auto& [node, model] : contents.myModels)
 		{
-			const Zeph::ModelNode* node = pending.back();
-			pending.pop_back();
-			for (int child = 0; child < node->GetChildren().Count(); ++child)
-			{
-				pending.push_back(node->GetChildren()[child]);
-			}
-			const Zeph::Model* model = node->GetModel();
-			if (model == nullptr || model->IsNullObject())
+			if (model->IsNullObject())
 			{
 				continue;
 			}
 			++models;
-			EXPECT_EQ(model->GetVertexType(), 4);
+			EXPECT_EQ(model->GetVertexType(), 4) << node;
 			ASSERT_GT(model->GetSurfaces().Count(), 0);
 			for (int surface = 0; surface < model->GetSurfaces().Count(); ++surface)
 			{

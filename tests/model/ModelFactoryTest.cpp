@@ -75,7 +75,7 @@ TEST_F(ModelFactoryTest, CreateAABBBuildsTheBoxOnceForAName)
 	EXPECT_EQ(TakeLog().find("CRITICAL"), std::string::npos);
 }
 
-TEST_F(ModelFactoryTest, UnknownNamesReportAndFallBack)
+TEST_F(ModelFactoryTest, UnknownNamesAndTexturesReportAndFallBack)
 {
 	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	Zeph::ModelFactory& factory = Zeph::Engine::GetInstance()->GetModelFactory();
@@ -97,11 +97,8 @@ TEST_F(ModelFactoryTest, UnknownNamesReportAndFallBack)
 		EXPECT_NE(log.find("Zeph::ModelFactory::LoadModel"), std::string::npos) << log;
 	}
 	EXPECT_EQ(factory.GetCount(), baseline);
-}
 
-TEST_F(ModelFactoryTest, SurfaceTextureFromAnArtPathIsLookedUpFromItsDataFolder)
-{
-	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
+	// A surface texture from an art path is looked up from its data folder.
 	struct Case
 	{
 		const char* myPath;

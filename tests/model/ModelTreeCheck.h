@@ -3,6 +3,7 @@
 // builder of a tree that uses every field the file stores.
 #include <gtest/gtest.h>
 #include <string>
+#include <tuple>
 
 #include "model/Model.h"
 #include "model/ModelNode.h"
@@ -44,17 +45,14 @@ inline void ExpectSameTransformation(const Zeph::TransformationNode* anExpected,
 	{
 		const auto* other = dynamic_cast<const Zeph::TransformationNodeCurves*>(anActual);
 		ASSERT_NE(other, nullptr) << aWhere << ": not read back as curves";
-		EXPECT_EQ(curves->GetFirstParameter(), other->GetFirstParameter()) << aWhere;
-		EXPECT_EQ(curves->GetSecondParameter(), other->GetSecondParameter()) << aWhere;
-		EXPECT_EQ(curves->GetThirdParameter(), other->GetThirdParameter()) << aWhere;
-		EXPECT_EQ(curves->GetFourthParameter(), other->GetFourthParameter()) << aWhere;
-		EXPECT_EQ(curves->GetRotationAxis().x, other->GetRotationAxis().x) << aWhere;
-		EXPECT_EQ(curves->GetRotationAxis().y, other->GetRotationAxis().y) << aWhere;
-		EXPECT_EQ(curves->GetRotationAxis().z, other->GetRotationAxis().z) << aWhere;
-		EXPECT_EQ(curves->GetTranslation().x, other->GetTranslation().x) << aWhere;
-		EXPECT_EQ(curves->GetTranslation().y, other->GetTranslation().y) << aWhere;
-		EXPECT_EQ(curves->GetTranslation().z, other->GetTranslation().z) << aWhere;
-		EXPECT_EQ(curves->GetAngle(), other->GetAngle()) << aWhere;
+		const auto fields = [](const Zeph::TransformationNodeCurves& aNode) {
+			const Vector3<float>& axis = aNode.GetRotationAxis();
+			const Vector3<float>& translation = aNode.GetTranslation();
+			return std::tuple(aNode.GetFirstParameter(), aNode.GetSecondParameter(),
+			                  aNode.GetThirdParameter(), aNode.GetFourthParameter(), axis.x, axis.y, axis.z,
+			                  translation.x, translation.y, translation.z, aNode.GetAngle());
+		};
+		EXPECT_EQ(fields(*curves), fields(*other)) << aWhere << ": parameters, axis, translation, angle";
 		for (int slot = 0; slot < Zeph::TransformationNodeCurves::CURVE_SLOT_COUNT; ++slot)
 		{
 			const Zeph::AnimationCurve* curve = curves->GetCurve(slot);
@@ -79,18 +77,16 @@ inline void ExpectSameTransformation(const Zeph::TransformationNode* anExpected,
 inline void ExpectSameModel(const Zeph::Model& anExpected, const Zeph::Model& anActual,
                             const std::string& aWhere)
 {
-	EXPECT_EQ(anExpected.IsNullObject(), anActual.IsNullObject()) << aWhere;
-	EXPECT_EQ(anExpected.GetModelID(), anActual.GetModelID()) << aWhere;
-	EXPECT_EQ(anExpected.GetVertexType(), anActual.GetVertexType()) << aWhere;
-	EXPECT_EQ(anExpected.GetIndexCount(), anActual.GetIndexCount()) << aWhere;
-	EXPECT_EQ(anExpected.GetIndexFormat(), anActual.GetIndexFormat()) << aWhere;
+	const auto fields = [](const Zeph::Model& aModel) {
+		return std::tuple(aModel.IsNullObject(), aModel.GetModelID(), aModel.GetVertexType(),
+		                  aModel.GetIndexCount(), aModel.GetIndexFormat(), aModel.GetVertexCount(),
+		                  aModel.GetVertexStride(), aModel.GetFirstName(), aModel.GetTechniqueName(),
+		                  aModel.GetThirdName());
+	};
+	EXPECT_EQ(fields(anExpected), fields(anActual))
+	    << aWhere << ": null flag, ID, type, counts, format, names";
 	EXPECT_TRUE(std::ranges::equal(anExpected.GetIndexData(), anActual.GetIndexData())) << aWhere;
-	EXPECT_EQ(anExpected.GetVertexCount(), anActual.GetVertexCount()) << aWhere;
-	EXPECT_EQ(anExpected.GetVertexStride(), anActual.GetVertexStride()) << aWhere;
 	EXPECT_TRUE(std::ranges::equal(anExpected.GetVertexData(), anActual.GetVertexData())) << aWhere;
-	EXPECT_EQ(anExpected.GetFirstName(), anActual.GetFirstName()) << aWhere;
-	EXPECT_EQ(anExpected.GetTechniqueName(), anActual.GetTechniqueName()) << aWhere;
-	EXPECT_EQ(anExpected.GetThirdName(), anActual.GetThirdName()) << aWhere;
 
 	ASSERT_EQ(anExpected.GetSurfaces().Count(), anActual.GetSurfaces().Count()) << aWhere;
 	for (int index = 0; index < anExpected.GetSurfaces().Count(); ++index)
