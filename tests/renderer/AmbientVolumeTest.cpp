@@ -61,7 +61,7 @@ Zeph::AmbientVolume UniformVolume(float aLevel)
 }
 } // namespace
 
-TEST(AmbientVolumeFileTest, WrittenFileReadsBackUnchangedAndLeavesNoTemporary)
+TEST(AmbientVolumeFileTest, AWrittenFileReadsBackUnchangedLeavesNoTemporaryAndDamagedOnesAreRefused)
 {
 	TestSupport::ScratchDir scratch;
 	const std::string path = scratch.File("levels/a/ambient.sh");
@@ -94,6 +94,41 @@ TEST(AmbientVolumeFileTest, WrittenFileReadsBackUnchangedAndLeavesNoTemporary)
 	EXPECT_FALSE(Zeph::WriteAmbientVolume(path, incomplete, problem));
 	ASSERT_EQ(Zeph::ReadAmbientVolume(path, read, problem), Zeph::AmbientVolumeRead::OK)
 	    << "a refused write leaves the old file";
+
+	// Damaged copies of the file are refused with their reason.
+	const auto withCounts = [&](int anX, int aY, int aZ) {
+		std::string damaged = bytes;
+		const int counts[3] = {anX, aY, aZ};
+		damaged.replace(24, 12, reinterpret_cast<const char*>(counts), 12);
+		return damaged;
+	};
+	const struct
+	{
+		const char* myName;
+		std::string myBytes;
+		const char* myReason;
+	} cases[] = {
+	    {"short", bytes.substr(0, 20), "header"},
+	    {"cut", bytes.substr(0, bytes.size() - 1), "bytes"},
+	    {"longer", bytes + "x", "bytes"},
+	    {"zero", withCounts(3, 0, 2), "probe counts"},
+	    {"negative", withCounts(-3, -2, 2), "probe counts"},
+	    {"huge", withCounts(4096, 1, 1), "probe counts"},
+	    {"swapped", withCounts(2, 2, 2), "bytes"},
+	};
+	for (const auto& test : cases)
+	{
+		const std::string file = scratch.File(std::string(test.myName) + ".sh");
+		std::ofstream(file, std::ios::binary) << test.myBytes;
+		Zeph::AmbientVolume volume;
+		std::string reason;
+		EXPECT_EQ(Zeph::ReadAmbientVolume(file, volume, reason), Zeph::AmbientVolumeRead::DAMAGED)
+		    << test.myName;
+		EXPECT_NE(reason.find(test.myReason), std::string::npos) << test.myName << ": " << reason;
+		EXPECT_NE(reason.find(file), std::string::npos) << "the file is named";
+	}
+	EXPECT_EQ(Zeph::ReadAmbientVolume(scratch.File("missing.sh"), read, problem),
+	          Zeph::AmbientVolumeRead::CANNOT_OPEN);
 }
 
 TEST(AmbientVolumeFileTest, AWriteTheDiskRefusesKeepsTheOldFileByteForByteAndSaysWhy)
@@ -189,71 +224,23 @@ TEST(AmbientVolumeFileTest, TheNextWriteRemovesTemporariesThatKilledWritersLeft)
 	}
 }
 
-TEST(AmbientVolumeFileTest, DamagedFilesAreRefusedWithTheirReason)
-{
-	TestSupport::ScratchDir scratch;
-	const std::string good = scratch.File("good.sh");
-	std::string written;
-	ASSERT_TRUE(Zeph::WriteAmbientVolume(good, MakeVolume(), written)) << written;
-	const std::string bytes = TestSupport::ReadWholeFile(good);
-	const auto withCounts = [&](int anX, int aY, int aZ) {
-		std::string damaged = bytes;
-		const int counts[3] = {anX, aY, aZ};
-		damaged.replace(24, 12, reinterpret_cast<const char*>(counts), 12);
-		return damaged;
-	};
-	const struct
-	{
-		const char* myName;
-		std::string myBytes;
-		const char* myReason;
-	} cases[] = {
-	    {"short", bytes.substr(0, 20), "header"},
-	    {"cut", bytes.substr(0, bytes.size() - 1), "bytes"},
-	    {"longer", bytes + "x", "bytes"},
-	    {"zero", withCounts(3, 0, 2), "probe counts"},
-	    {"negative", withCounts(-3, -2, 2), "probe counts"},
-	    {"huge", withCounts(4096, 1, 1), "probe counts"},
-	    {"swapped", withCounts(2, 2, 2), "bytes"},
-	};
-	for (const auto& test : cases)
-	{
-		const std::string path = scratch.File(std::string(test.myName) + ".sh");
-		std::ofstream(path, std::ios::binary) << test.myBytes;
-		Zeph::AmbientVolume volume;
-		std::string problem;
-		EXPECT_EQ(Zeph::ReadAmbientVolume(path, volume, problem), Zeph::AmbientVolumeRead::DAMAGED)
-		    << test.myName;
-		EXPECT_NE(problem.find(test.myReason), std::string::npos) << test.myName << ": " << problem;
-		EXPECT_NE(problem.find(path), std::string::npos) << "the file is named";
-	}
-	Zeph::AmbientVolume volume;
-	std::string problem;
-	EXPECT_EQ(Zeph::ReadAmbientVolume(scratch.File("missing.sh"), volume, problem),
-	          Zeph::AmbientVolumeRead::CANNOT_OPEN);
-}
-
 TEST_F(FrameTest, SetShLightsTheFrameAndADamagedOrMissingFileLeavesNoVolume)
 {
-	if (!Start())
-	{
-		return;
-	}
-	TestSupport::ScratchDir scratch;
+	LUMORA_RETURN_UNLESS(Start());
 	Place("data/models/room_small.dae", {0.0f, 0.0f, 0.0f});
 	Look({1.6f, 1.7f, -1.7f}, {-0.3f, 0.7f, 0.6f});
 	const Pixel floor = Project({0.5f, 0.0f, 0.5f});
 	Render("ambient-none");
 	const float dark = Luminance(myLit, floor);
 
-	const std::string baked = scratch.File("baked/ambient.sh");
+	const std::string baked = myScratch.File("baked/ambient.sh");
 	std::string problem;
 	ASSERT_TRUE(Zeph::WriteAmbientVolume(baked, UniformVolume(0.5f), problem)) << problem;
-	const std::string damaged = scratch.File("damaged/ambient.sh");
-	std::filesystem::create_directories(scratch.Path() / "damaged");
+	const std::string damaged = myScratch.File("damaged/ambient.sh");
+	std::filesystem::create_directories(myScratch.Path() / "damaged");
 	std::ofstream(damaged, std::ios::binary) << TestSupport::ReadWholeFile(baked).substr(0, 50);
 	// Each time from a lit frame: the previous level's light must not stay.
-	for (const std::string& next : {damaged, scratch.File("unbaked/ambient.sh")})
+	for (const std::string& next : {damaged, myScratch.File("unbaked/ambient.sh")})
 	{
 		SCOPED_TRACE(next);
 		Renderer().SetSH(baked);

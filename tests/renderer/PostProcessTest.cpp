@@ -4,6 +4,7 @@
 #include <array>
 #include <cmath>
 #include <cstdlib>
+#include <cstring>
 #include <gtest/gtest.h>
 #include <memory>
 #include <numbers>
@@ -336,7 +337,7 @@ TEST_F(PostProcessTest, SsaoSampleDirectionsAreUnitRepeatableAndSpread)
 	}
 }
 
-TEST_F(PostProcessTest, ColorGradingWithAnIdentityLookupKeepsColours)
+TEST_F(PostProcessTest, ColorGradingWithAnIdentityLookupKeepsColoursAndAMissingOrFlatOneIsReported)
 {
 	Dds::ImageInfo info;
 	info.myWidth = info.myHeight = info.myDepth = 16;
@@ -345,19 +346,14 @@ TEST_F(PostProcessTest, ColorGradingWithAnIdentityLookupKeepsColours)
 	Dds::Image image;
 	std::string error;
 	ASSERT_TRUE(image.Init(info, error)) << error;
+	// x, y and z of each texel, row by row and slice by slice, as red, green and blue.
 	uint8_t* texel = image.Data(0, 0);
-	for (int z = 0; z < 16; ++z)
+	for (int index = 0; index < 16 * 16 * 16; ++index, texel += 4)
 	{
-		for (int y = 0; y < 16; ++y)
-		{
-			for (int x = 0; x < 16; ++x, texel += 4)
-			{
-				texel[0] = static_cast<uint8_t>(x * 17);
-				texel[1] = static_cast<uint8_t>(y * 17);
-				texel[2] = static_cast<uint8_t>(z * 17);
-				texel[3] = 255;
-			}
-		}
+		const uint8_t rgba[4] = {static_cast<uint8_t>(index % 16 * 17),
+		                         static_cast<uint8_t>(index / 16 % 16 * 17),
+		                         static_cast<uint8_t>(index / 256 * 17), 255};
+		std::memcpy(texel, rgba, 4);
 	}
 	const std::string lookup = myScratch.File("identity.dds");
 	ASSERT_TRUE(Dds::SaveToFile(lookup, image, error)) << error;
@@ -385,10 +381,8 @@ TEST_F(PostProcessTest, ColorGradingWithAnIdentityLookupKeepsColours)
 			EXPECT_NEAR(pixels[at], colours[at], 2) << file << ", byte " << at;
 		}
 	}
-}
 
-TEST_F(PostProcessTest, ColorGradingReportsAMissingOrFlatLookup)
-{
+	// A missing or flat lookup is reported.
 	Zeph::ColorGradingManager grading;
 	EXPECT_FALSE(grading.Init(4, 4, &myHelper, nullptr, myScratch.File("no-such-lookup.dds")));
 	std::string log = TakeLog();
@@ -407,16 +401,13 @@ TEST_F(PostProcessTest, OutlineGlowsAroundTheMaskOnly)
 {
 	Zeph::OutlineManager outline;
 	ASSERT_TRUE(outline.Init(64, 64, &myHelper, nullptr)) << TakeLog();
+	const uint8_t orange[4] = {255, 140, 26, 255};
 	std::vector<uint8_t> mask(64 * 64 * 4, 0);
 	for (int y = 24; y < 40; ++y)
 	{
 		for (int x = 24; x < 40; ++x)
 		{
-			const size_t at = static_cast<size_t>(y * 64 + x) * 4;
-			mask[at] = 255;
-			mask[at + 1] = 140;
-			mask[at + 2] = 26;
-			mask[at + 3] = 255;
+			std::memcpy(&mask[static_cast<size_t>(y * 64 + x) * 4], orange, 4);
 		}
 	}
 	Zeph::Texture* destination = Target(64, 64, Format::R8G8B8A8_UNORM);

@@ -6,16 +6,15 @@
 // fatal levels, so nothing here may be a severe or critical report. The bake writes
 // "data/Cubemaps/<level>/", so each test
 // runs in a scratch directory whose data/ links the repository's folders, except Cubemaps,
-// which holds copies of the two cube maps the renderer reads. Pictures of the baked cubes go
-// to /tmp/lumora-bake-tests/.
+// which holds copies of the two cube maps the renderer reads.
 #include <algorithm>
 #include <array>
 #include <cmath>
 #include <cstring>
 #include <filesystem>
 #include <gtest/gtest.h>
-#include <limits>
 #include <memory>
+#include <numeric>
 #include <string>
 #include <vector>
 
@@ -38,28 +37,18 @@ namespace fs = std::filesystem;
 constexpr int ourFaceSize = 256;
 constexpr int ourMipCount = 9;
 
+using Rgb = std::array<double, 3>;
+using Direction = std::array<double, 3>;
+
+// Infinities and NaNs (exponent 31) read as values past 65504, which fail every bound below.
 float HalfToFloat(uint16_t aHalf)
 {
 	const int exponent = (aHalf >> 10) & 31;
 	const int mantissa = aHalf & 1023;
-	float value = 0.0f;
-	if (exponent == 0)
-	{
-		value = std::ldexp(static_cast<float>(mantissa), -24);
-	}
-	else if (exponent == 31)
-	{
-		value =
-		    mantissa == 0 ? std::numeric_limits<float>::infinity() : std::numeric_limits<float>::quiet_NaN();
-	}
-	else
-	{
-		value = std::ldexp(static_cast<float>(mantissa + 1024), exponent - 25);
-	}
+	const float value = exponent == 0 ? std::ldexp(static_cast<float>(mantissa), -24)
+	                                  : std::ldexp(static_cast<float>(mantissa + 1024), exponent - 25);
 	return (aHalf & 0x8000) != 0 ? -value : value;
 }
-
-using Rgb = std::array<double, 3>;
 
 // A baked cube file: RGBA halves, faces +X, -X, +Y, -Y, +Z, -Z, each with its mips.
 struct CubeFile
@@ -97,32 +86,25 @@ struct CubeFile
 	}
 };
 
-// The direction through (a, b) of a face, a to the right and b down, both -1..1, in Direct3D's
+// The point through (a, b) of a face, a to the right and b down, both -1..1, in Direct3D's
 // cube layout (the face's own axis component is +-1).
-std::array<double, 3> FacePoint(int aFace, double anA, double aB)
+Direction FacePoint(int aFace, double anA, double aB)
 {
-	switch (aFace)
-	{
-	case 0:
-		return {1.0, -aB, -anA};
-	case 1:
-		return {-1.0, -aB, anA};
-	case 2:
-		return {anA, 1.0, aB};
-	case 3:
-		return {anA, -1.0, -aB};
-	case 4:
-		return {anA, -aB, 1.0};
-	default:
-		return {-anA, -aB, -1.0};
-	}
+	const Direction points[6] = {{1.0, -aB, -anA}, {-1.0, -aB, anA}, {anA, 1.0, aB},
+	                             {anA, -1.0, -aB}, {anA, -aB, 1.0},  {-anA, -aB, -1.0}};
+	return points[aFace];
+}
+
+double Length(const Direction& aPoint)
+{
+	return std::sqrt(aPoint[0] * aPoint[0] + aPoint[1] * aPoint[1] + aPoint[2] * aPoint[2]);
 }
 
 // Mip 0 reduced to a coarser cube for the reference integrals: per texel its unit direction,
 // its solid angle and its mean colour.
 struct Radiance
 {
-	std::vector<std::array<double, 3>> myDirections;
+	std::vector<Direction> myDirections;
 	std::vector<double> mySolidAngles;
 	std::vector<Rgb> myColors;
 
@@ -135,10 +117,9 @@ struct Radiance
 			{
 				for (int x = 0; x < aSize; ++x)
 				{
-					const std::array<double, 3> point =
+					const Direction point =
 					    FacePoint(face, (2.0 * x + 1.0) / aSize - 1.0, (2.0 * y + 1.0) / aSize - 1.0);
-					const double length =
-					    std::sqrt(point[0] * point[0] + point[1] * point[1] + point[2] * point[2]);
+					const double length = Length(point);
 					myDirections.push_back({point[0] / length, point[1] / length, point[2] / length});
 					mySolidAngles.push_back(4.0 / (aSize * aSize) / (length * length * length));
 					Rgb color{};
@@ -160,13 +141,13 @@ struct Radiance
 	}
 
 	// The radiance averaged over the sphere with the weight max(0, cos)^aPower around aNormal.
-	Rgb Lobe(const std::array<double, 3>& aNormal, double aPower) const
+	Rgb Lobe(const Direction& aNormal, double aPower) const
 	{
 		Rgb sum{};
 		double total = 0.0;
 		for (size_t texel = 0; texel < myDirections.size(); ++texel)
 		{
-			const std::array<double, 3>& direction = myDirections[texel];
+			const Direction& direction = myDirections[texel];
 			const double cosine =
 			    aNormal[0] * direction[0] + aNormal[1] * direction[1] + aNormal[2] * direction[2];
 			if (cosine <= 0.0)
@@ -268,37 +249,16 @@ protected:
 		return loaded;
 	}
 
-	// Every mip of the six faces, side by side, each scaled (nearest) to aTile pixels and
-	// tone-mapped x / (1 + x), one row of faces per mip from mip 0 to aLastMip.
-	static void SavePicture(const CubeFile& aCube, const std::string& aName, int aTile = 128,
-	                        int aLastMip = ourMipCount - 1)
+	// Every file and folder under data/Cubemaps, sorted.
+	static std::vector<std::string> CubemapFiles()
 	{
-		const int tile = aTile;
-		const int width = tile * Zeph::DynamicCubemap::ourFaceCount;
-		std::vector<uint8_t> pixels(static_cast<size_t>(width) * tile * (aLastMip + 1) * 4, 255);
-		for (int mip = 0; mip <= aLastMip; ++mip)
+		std::vector<std::string> paths;
+		for (const fs::directory_entry& entry : fs::recursive_directory_iterator("data/Cubemaps"))
 		{
-			const int size = aCube.Size(mip);
-			for (int face = 0; face < Zeph::DynamicCubemap::ourFaceCount; ++face)
-			{
-				for (int y = 0; y < tile; ++y)
-				{
-					for (int x = 0; x < tile; ++x)
-					{
-						const Rgb texel = aCube.Texel(face, mip, x * size / tile, y * size / tile);
-						uint8_t* pixel =
-						    &pixels[(static_cast<size_t>(mip * tile + y) * width + face * tile + x) * 4];
-						for (int channel = 0; channel < 3; ++channel)
-						{
-							const double mapped =
-							    std::pow(texel[channel] / (1.0 + texel[channel]), 1.0 / 2.2);
-							pixel[channel] = static_cast<uint8_t>(std::clamp(mapped, 0.0, 1.0) * 255.0 + 0.5);
-						}
-					}
-				}
-			}
+			paths.push_back(entry.path().string());
 		}
-		Gpu::SavePng("/tmp/lumora-bake-tests/" + aName + ".png", width, tile * (aLastMip + 1), pixels.data());
+		std::sort(paths.begin(), paths.end());
+		return paths;
 	}
 
 	// room_small at the origin lit by four lights, none in the middle of anything, so that no
@@ -309,23 +269,11 @@ protected:
 	void LightTheSmallRoom()
 	{
 		Place("data/models/room_small.dae", {0.0f, 0.0f, 0.0f});
-		const struct
-		{
-			Vector3<float> myPosition;
-			float myFalloff;
-			Vector4<float> myColor;
-		} lights[] = {{{1.6f, 1.8f, -0.5f}, 1.0f, {8.0f, 0.0f, 0.0f, 1.0f}},
-		              {{1.0f, 2.7f, -1.0f}, 1.2f, {0.0f, 0.0f, 6.0f, 1.0f}},
-		              {{0.6f, 0.3f, 0.4f}, 3.0f, {0.0f, 8.0f, 0.0f, 1.0f}},
-		              {{-1.5f, 0.5f, 1.3f}, 1.0f, {0.0f, 6.0f, 0.0f, 1.0f}}};
-		for (const auto& light : lights)
-		{
-			Zeph::PointLightData data;
-			data.myPosition = light.myPosition;
-			data.myFalloff = light.myFalloff;
-			data.myColor = light.myColor;
-			myPointLights.push_back(data);
-		}
+		myPointLights = {
+		    {.myFalloff = 1.0f, .myPosition = {1.6f, 1.8f, -0.5f}, .myColor = {8.0f, 0.0f, 0.0f, 1.0f}},
+		    {.myFalloff = 1.2f, .myPosition = {1.0f, 2.7f, -1.0f}, .myColor = {0.0f, 0.0f, 6.0f, 1.0f}},
+		    {.myFalloff = 3.0f, .myPosition = {0.6f, 0.3f, 0.4f}, .myColor = {0.0f, 8.0f, 0.0f, 1.0f}},
+		    {.myFalloff = 1.0f, .myPosition = {-1.5f, 0.5f, 1.3f}, .myColor = {0.0f, 6.0f, 0.0f, 1.0f}}};
 		AddRoom("small", {0.0f, 0.0f, 0.0f});
 	}
 
@@ -346,39 +294,9 @@ TEST(BakeProgressTest, IsTheTruncatedPercentageOfDoneSteps)
 	EXPECT_EQ(Zeph::BakeProgress(0, 0), 0) << "nothing to do";
 }
 
-TEST_F(ReflectionBakeTest, NoRoomsWritesNothingAndResetsTheProgress)
+TEST_F(ReflectionBakeTest, ProgressFollowsTheRoomsFailedSavesAreNotTheBakesToReportAndNoRoomsBakeNothing)
 {
-	if (!Start())
-	{
-		return;
-	}
-	Place("data/models/room_small.dae", {0.0f, 0.0f, 0.0f});
-	AddRoom("small", {0.0f, 0.0f, 0.0f});
-	Bake("first");
-	ASSERT_EQ(Renderer().GetBakingProgress(), 100);
-
-	myRooms.RemoveAll();
-	Bake("empty");
-	EXPECT_EQ(Renderer().GetBakingProgress(), 0);
-	EXPECT_FALSE(fs::exists("data/Cubemaps/empty"));
-	std::vector<std::string> written;
-	for (const fs::directory_entry& entry : fs::recursive_directory_iterator("data/Cubemaps"))
-	{
-		written.push_back(entry.path().string());
-	}
-	std::sort(written.begin(), written.end());
-	EXPECT_EQ(written,
-	          (std::vector<std::string>{"data/Cubemaps/cubemap.dds", "data/Cubemaps/first",
-	                                    "data/Cubemaps/first/small.dds", "data/Cubemaps/normaltest.dds"}));
-	EXPECT_EQ(Renderer().GetRTC().GetPointLights().Count(), 0) << "the bake empties the collector";
-}
-
-TEST_F(ReflectionBakeTest, ProgressIsStoredAfterEachRoomAndFailedSavesAreNotTheBakesToReport)
-{
-	if (!Start())
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(Start());
 	Place("data/models/room_small.dae", {0.0f, 0.0f, 0.0f});
 	AddRoom("west", {-4.0f, 0.0f, 0.0f});
 	AddRoom("middle", {0.0f, 0.0f, 0.0f});
@@ -405,54 +323,30 @@ TEST_F(ReflectionBakeTest, ProgressIsStoredAfterEachRoomAndFailedSavesAreNotTheB
 	EXPECT_EQ(log.find("SEVERE"), std::string::npos) << log;
 	CubeFile west;
 	EXPECT_TRUE(Load(CubePath("three", "west"), west));
+
+	// Without rooms the progress goes back to 0, nothing is written, and the queued scene is let go.
+	const std::vector<std::string> before = CubemapFiles();
+	myRooms.RemoveAll();
+	myPointLights.push_back({});
+	Bake("empty");
+	EXPECT_EQ(Renderer().GetBakingProgress(), 0);
+	EXPECT_EQ(CubemapFiles(), before);
+	EXPECT_EQ(Renderer().GetRTC().GetPointLights().Count(), 0) << "the bake empties the collector";
 }
 
-TEST_F(ReflectionBakeTest, ACubemapTheDiskWillNotTakeLeavesTheOldOneWhole)
+TEST_F(ReflectionBakeTest, ALitRoomsCubeShowsItsLightsFollowsTheLobesLoadsAndOutlivesAFullDisk)
 {
-	if (!Start())
-	{
-		return;
-	}
-	LightTheSmallRoom();
-	Bake("kept");
-	const std::string path = CubePath("kept", "small");
-	const std::string before = TestSupport::ReadWholeFile(path);
-	ASSERT_GT(before.size(), 4000000u);
-	TakeLog();
-
-	myPointLights.clear();
-	{
-		// Room for the log, not for a 4 MB cube.
-		TestSupport::FileSizeLimit full(fs::file_size(myLogPath) + 65536);
-		Bake("kept");
-	}
-	EXPECT_EQ(Renderer().GetBakingProgress(), 100);
-	EXPECT_NE(TakeLog().find(path), std::string::npos) << "the save's error entry names the file";
-	EXPECT_TRUE(TestSupport::ReadWholeFile(path) == before) << "the old cubemap was replaced";
-	EXPECT_EQ(std::distance(fs::directory_iterator("data/Cubemaps/kept"), fs::directory_iterator()), 1)
-	    << "no temporary is left beside it";
-}
-
-TEST_F(ReflectionBakeTest, LightLandsOnTheFacesItShouldAndTheMipsFollowTheLobes)
-{
-	if (!Start())
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(Start());
 	LightTheSmallRoom();
 	Bake("lit");
+	const std::string path = CubePath("lit", "small");
 	CubeFile cube;
-	ASSERT_TRUE(Load(CubePath("lit", "small"), cube));
-	SavePicture(cube, "lit-small");
-	SavePicture(cube, "lit-small-mip0", ourFaceSize, 0);
-
+	ASSERT_TRUE(Load(path, cube));
 	const Dds::ImageInfo& info = cube.myImage.Info();
 	EXPECT_TRUE(info.IsCube());
-	EXPECT_EQ(info.myArraySize, 6u);
-	EXPECT_EQ(info.myMipLevels, static_cast<uint32_t>(ourMipCount));
-	EXPECT_EQ(info.myWidth, static_cast<uint32_t>(ourFaceSize));
-	EXPECT_EQ(info.myHeight, static_cast<uint32_t>(ourFaceSize));
 	EXPECT_EQ(info.myFormat, Dds::Format::R16G16B16A16_FLOAT);
+	EXPECT_EQ((std::array{info.myArraySize, info.myMipLevels, info.myWidth, info.myHeight}),
+	          (std::array<uint32_t, 4>{6, ourMipCount, ourFaceSize, ourFaceSize}));
 
 	// The room's walls are grey and the light the ambient pass adds is grey too, so each light
 	// shows as its channel above the smaller of the other two. The red light is before the +X
@@ -490,14 +384,11 @@ TEST_F(ReflectionBakeTest, LightLandsOnTheFacesItShouldAndTheMipsFollowTheLobes)
 		const Radiance& radiance = mip == 1 ? full : mip == 2 ? half : quarter;
 		const double power = std::pow(8192.0, (8 - mip) * 0.125);
 		const int size = cube.Size(mip);
-		std::vector<int> samples;
-		for (int sample = 0; sample < size; ++sample)
+		std::vector<int> samples = {0, size / 4, size / 2, size * 3 / 4, size - 1};
+		if (size <= 16)
 		{
-			samples.push_back(sample);
-		}
-		if (size > 16)
-		{
-			samples = {0, size / 4, size / 2, size * 3 / 4, size - 1};
+			samples.resize(static_cast<size_t>(size));
+			std::iota(samples.begin(), samples.end(), 0);
 		}
 		double worst = 0.0;
 		double brightest = 0.0;
@@ -507,10 +398,9 @@ TEST_F(ReflectionBakeTest, LightLandsOnTheFacesItShouldAndTheMipsFollowTheLobes)
 			{
 				for (int x : samples)
 				{
-					std::array<double, 3> normal =
+					Direction normal =
 					    FacePoint(face, (2.0 * x + 1.0) / size - 1.0, (2.0 * y + 1.0) / size - 1.0);
-					const double length =
-					    std::sqrt(normal[0] * normal[0] + normal[1] * normal[1] + normal[2] * normal[2]);
+					const double length = Length(normal);
 					for (double& component : normal)
 					{
 						component /= length;
@@ -529,24 +419,12 @@ TEST_F(ReflectionBakeTest, LightLandsOnTheFacesItShouldAndTheMipsFollowTheLobes)
 		EXPECT_LT(worst, 0.05 * brightest)
 		    << "mip " << mip << ": worst difference " << worst << " of " << brightest;
 	}
-}
 
-TEST_F(ReflectionBakeTest, TheCubemapContainerLoadsABakedRoom)
-{
-	if (!Start())
-	{
-		return;
-	}
-	LightTheSmallRoom();
-	Bake("loaded");
-	CubeFile file;
-	ASSERT_TRUE(Load(CubePath("loaded", "small"), file));
-
+	// The cube container gives the room the file's texels, beside the fallback it keeps.
 	Zeph::CubemapContainer& container = Zeph::Engine::GetInstance()->GetCubemapContainer();
-	Zeph::DynamicCubemap* fallback = container.GetCubemap(-1, "");
-	Zeph::DynamicCubemap* room = container.GetCubemap(0, CubePath("loaded", "small"));
+	Zeph::DynamicCubemap* room = container.GetCubemap(0, path);
 	ASSERT_NE(room, nullptr);
-	EXPECT_NE(room, fallback);
+	EXPECT_NE(room, container.GetCubemap(-1, ""));
 	ASSERT_NE(room->GetTexture(), nullptr);
 	EXPECT_NE(room->GetCubeShaderResourceView(), nullptr);
 	EXPECT_EQ(room->GetTexture()->GetMipLevels(), ourMipCount);
@@ -554,16 +432,29 @@ TEST_F(ReflectionBakeTest, TheCubemapContainerLoadsABakedRoom)
 	{
 		std::vector<float> texels;
 		ASSERT_TRUE(Gpu::ReadTexture(*room->GetTexture(), mip, 0, 6, texels));
-		const int size = file.Size(mip);
+		const int size = cube.Size(mip);
 		for (int face = 0; face < 6; ++face)
 		{
-			const Rgb expected = file.Texel(face, mip, size / 2, size / 2);
+			const Rgb expected = cube.Texel(face, mip, size / 2, size / 2);
 			const size_t at = ((static_cast<size_t>(face) * size + size / 2) * size + size / 2) * 4;
-			for (int channel = 0; channel < 3; ++channel)
-			{
-				EXPECT_FLOAT_EQ(texels[at + channel], static_cast<float>(expected[channel]))
-				    << "face " << face << " mip " << mip;
-			}
+			EXPECT_EQ((Rgb{texels[at], texels[at + 1], texels[at + 2]}), expected)
+			    << "face " << face << " mip " << mip;
 		}
 	}
+
+	// The same room baked again without its lights onto a disk with room for the log only: the
+	// save's error entry names the file, the bake finishes, the old cube stays whole.
+	const std::string before = TestSupport::ReadWholeFile(path);
+	ASSERT_GT(before.size(), 4000000u);
+	TakeLog();
+	myPointLights.clear();
+	{
+		TestSupport::FileSizeLimit full(fs::file_size(myLogPath) + 65536);
+		Bake("lit");
+	}
+	EXPECT_EQ(Renderer().GetBakingProgress(), 100);
+	EXPECT_NE(TakeLog().find(path), std::string::npos) << "the save's error entry names the file";
+	EXPECT_TRUE(TestSupport::ReadWholeFile(path) == before) << "the old cubemap was replaced";
+	EXPECT_EQ(std::distance(fs::directory_iterator("data/Cubemaps/lit"), fs::directory_iterator()), 1)
+	    << "no temporary is left beside it";
 }

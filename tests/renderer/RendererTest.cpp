@@ -1,5 +1,5 @@
 // The renderer with a GPU (headless, 160 x 90): instances drawn through the
-// collector, room boxes and lines over the frame, read back from the back buffer.
+// collector, a room box drawn as lines over the frame, read back from the back buffer.
 // Every frame is saved under /tmp/lumora-renderer-tests/ to be looked at.
 #include <algorithm>
 #include <cmath>
@@ -11,7 +11,6 @@
 
 #include "engine/Camera.h"
 #include "engine/CameraInstance.h"
-#include "engine/DebugLine.h"
 #include "engine/Instance.h"
 #include "engine/Room.h"
 #include "engine/ViewFixture.h"
@@ -70,7 +69,7 @@ protected:
 
 } // namespace
 
-TEST_F(RendererTest, LateInstanceOfABoxIsDrawnWhereTheCameraSeesIt)
+TEST_F(RendererTest, ALateBoxIsDrawnWhereTheCameraSeesItAndSubmittedBoxesKeepTheirPreviousWorld)
 {
 	LUMORA_RETURN_UNLESS(Start());
 	Zeph::ModelNode* box = Factory().CreateAABB("red box", {1.0f, 1.0f, 1.0f}, {0.5f, 0.0f, 0.0f, 1.0f},
@@ -99,14 +98,8 @@ TEST_F(RendererTest, LateInstanceOfABoxIsDrawnWhereTheCameraSeesIt)
 	// The frame emptied the queues: the next one draws nothing.
 	RenderAndRead("box-next-frame");
 	EXPECT_TRUE(IsBlack(ourWidth / 2, ourHeight / 2));
-}
 
-TEST_F(RendererTest, SubmittingKeepsEachInstancesPreviousWorldMatrix)
-{
-	LUMORA_RETURN_UNLESS(Start());
-	Zeph::ModelNode* box = Factory().CreateAABB("box", {1.0f, 1.0f, 1.0f}, {1.0f, 1.0f, 1.0f, 1.0f},
-	                                            Gpu::PrimitiveTopology::TriangleList);
-	ASSERT_NE(box, nullptr) << TakeLog();
+	// Submitting keeps each instance's previous world matrix.
 	Zeph::Instance first(box);
 	Zeph::Instance second(box);
 	first.SetPosition({1.0f, 0.0f, 10.0f});
@@ -188,30 +181,4 @@ TEST_F(RendererTest, RoomBoxIsDrawnAsLinesOverTheFrameAndSharedByEqualBounds)
 	                               Gpu::PrimitiveTopology::TriangleList),
 	          other.GetDebugInstance()->GetModelNode());
 	EXPECT_EQ(Factory().GetCount(), baseline + 2u);
-}
-
-TEST_F(RendererTest, MovedDebugLineIsDrawnAtItsNewEnds)
-{
-	LUMORA_RETURN_UNLESS(Start());
-	const Vector4<float> green(0.0f, 1.0f, 0.0f, 0.0f);
-	Zeph::DebugLine line;
-	ASSERT_TRUE(line.Init({{-1.0f, 0.5f, 10.0f}, green}, {{1.0f, 0.5f, 10.0f}, green})) << TakeLog();
-	line.Render();
-	RenderAndRead("line-before");
-	const Pixel oldMiddle = Project({0.0f, 0.5f, 10.0f});
-	ASSERT_TRUE(LitNear(oldMiddle, 1) > 0) << "the line as made";
-
-	line.SetVertexPosition(0, {-1.0f, -0.5f, 10.0f});
-	line.SetVertexPosition(1, {1.0f, -0.8f, 10.0f});
-	line.Render();
-	RenderAndRead("line-after");
-	for (const float t : {0.1f, 0.3f, 0.5f, 0.7f, 0.9f})
-	{
-		const Vector3<float> onNew(-1.0f + 2.0f * t, -0.5f - 0.3f * t, 10.0f);
-		const Vector3<float> onOld(-1.0f + 2.0f * t, 0.5f, 10.0f);
-		EXPECT_TRUE(LitNear(Project(onNew), 1) > 0) << "new line at t = " << t;
-		EXPECT_EQ(LitNear(Project(onOld), -1), 0) << "old line at t = " << t;
-	}
-	line.Destroy();
-	EXPECT_EQ(line.GetInstance(), nullptr);
 }
