@@ -247,8 +247,9 @@ constexpr MaterialChannel ourMaterialChannels[] = {
 class Converter
 {
 public:
-	Converter(const Collada::Document& aDocument, std::vector<AlTextureBinding>& someBindings)
-	    : myDocument(aDocument), myBindings(someBindings)
+	Converter(const Collada::Document& aDocument, std::vector<AlTextureBinding>& someBindings,
+	          size_t aModelByteLimit)
+	    : myDocument(aDocument), myBindings(someBindings), myModelByteLimit(aModelByteLimit)
 	{
 	}
 
@@ -487,6 +488,16 @@ private:
 				indexCount += position->myIndices.size();
 			}
 		}
+		// Every instance of a geometry is a model of its own: a document that instances a large
+		// geometry many times could ask for far more memory (and time) than it is long. The
+		// corners bound what each model holds, an index and at most one vertex each.
+		myModelBytes += indexCount * (sizeof(uint32_t) + static_cast<size_t>(stride));
+		if (myModelBytes > myModelByteLimit)
+		{
+			myError = "the scene's models would take more than " + std::to_string(myModelByteLimit) +
+			          " bytes (at an instance of geometry \"" + aGeometry.myId + "\")";
+			return false;
+		}
 		std::vector<uint32_t> indices;
 		indices.reserve(indexCount);
 		std::vector<CornerKey> keys;
@@ -650,15 +661,18 @@ private:
 	std::vector<AlTextureBinding> myPendingBindings; // of the model being built
 	std::string myError;
 	int myNodeCount = 0;
+	size_t myModelBytes = 0;
+	size_t myModelByteLimit;
 };
 } // namespace
 
 namespace ColladaImport
 {
 std::unique_ptr<ModelNode> Convert(const Collada::Document& aDocument,
-                                   std::vector<AlTextureBinding>& someBindings, std::string& anError)
+                                   std::vector<AlTextureBinding>& someBindings, std::string& anError,
+                                   size_t aModelByteLimit)
 {
-	Converter converter(aDocument, someBindings);
+	Converter converter(aDocument, someBindings, aModelByteLimit);
 	std::unique_ptr<ModelNode> root = converter.Run(anError);
 	if (!root)
 	{

@@ -19,6 +19,7 @@
 // set to match). The root's matrix is mirrored in x (diag(-1, 1, 1, 1)), which is
 // what the reversed winding goes with. Models get no effect here; someBindings
 // receives the texture bindings of the bound materials, to be made once they have one.
+#include <cstddef>
 #include <memory>
 #include <string>
 #include <vector>
@@ -36,9 +37,15 @@ class ModelNode;
 
 namespace ColladaImport
 {
-// Null, with anError saying which geometry of the document has a layout that no
-// vertex type draws, when any model of the scene has one.
+// The most vertex and index bytes the models of one scene may take together: each instance
+// of a geometry is a model of its own, so a short document could otherwise ask for far more.
+constexpr size_t ourMaxModelBytes = size_t(1) << 30;
+
+// Null, with anError saying what of the document cannot be converted: a geometry whose layout
+// no vertex type draws, a scene that expands past 65,535 nodes or past aModelByteLimit bytes of
+// vertices and indices.
 std::unique_ptr<ModelNode> Convert(const Collada::Document& aDocument,
-                                   std::vector<AlTextureBinding>& someBindings, std::string& anError);
+                                   std::vector<AlTextureBinding>& someBindings, std::string& anError,
+                                   size_t aModelByteLimit = ourMaxModelBytes);
 } // namespace ColladaImport
 } // namespace Zeph
