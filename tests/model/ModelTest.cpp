@@ -62,32 +62,29 @@ struct Tree
 {
 	Tree()
 	{
-		root = new Zeph::ModelNode();
-		auto* first = new Zeph::ModelNode();
-		auto* grandchild = new Zeph::ModelNode();
-		auto* second = new Zeph::ModelNode();
-		firstModel = new Zeph::Model();
-		childModel = new Zeph::Model();
 		firstModel->AddChildModel(childModel);
-		grandchildModel = new Zeph::Model();
-		nullModel = new Zeph::Model();
 		nullModel->SetIsNullObject(true);
-		first->SetModel(firstModel);
-		grandchild->SetModel(grandchildModel);
-		second->SetModel(nullModel);
-		first->AddChild(grandchild);
+		Zeph::ModelNode* first = Node(firstModel);
+		first->AddChild(Node(grandchildModel));
 		root->AddChild(first);
-		root->AddChild(second);
+		root->AddChild(Node(nullModel));
 	}
 	~Tree() { delete root; }
 	Tree(const Tree&) = delete;
 	Tree& operator=(const Tree&) = delete;
 
-	Zeph::ModelNode* root;
-	Zeph::Model* firstModel;
-	Zeph::Model* childModel;
-	Zeph::Model* grandchildModel;
-	Zeph::Model* nullModel;
+	static Zeph::ModelNode* Node(Zeph::Model* aModel)
+	{
+		auto* node = new Zeph::ModelNode();
+		node->SetModel(aModel);
+		return node;
+	}
+
+	Zeph::ModelNode* root = new Zeph::ModelNode();
+	Zeph::Model* firstModel = new Zeph::Model();
+	Zeph::Model* childModel = new Zeph::Model();
+	Zeph::Model* grandchildModel = new Zeph::Model();
+	Zeph::Model* nullModel = new Zeph::Model();
 };
 } // namespace
 
