@@ -120,8 +120,7 @@ TEST_F(CommandLineTest, BakeDescribeAndRenderTheSmallLevelAndKeepItsVolumeOnAFul
 
 	// A fixed camera: the info line prints its position.
 	const ToolRun render =
-	    RunTool(myScratch.Path(),
-	            "render sample_small --out frame.png --size 160x90 --camera 0,1.5,-3.5 --pitch 0.15");
+	    Run("render sample_small --out frame.png --size 160x90 --camera 0,1.5,-3.5 --pitch 0.15");
 	ASSERT_EQ(render.myStatus, 0) << render.myOutput << render.myErrors;
 	int width = 0;
 	int height = 0;
@@ -180,7 +179,7 @@ TEST_F(CommandLineTest, BadInputGetsOneClearLineAndAFailingExit)
 
 	// A light without its falloff value and a cut-off ambient.sh: check lists both, with
 	// the file and the element; render and bake refuse with the first and end cleanly.
-	Edit("data/XML/levels/sample_small/lights.xml", "<falloff value=", "<falloff novalue=");
+	Edit("data/XML/levels/sample_small/lights.xml", "<falloff value=\"4\" />", "<falloff />");
 	TestSupport::WriteWholeFile(myScratch.File("data/XML/levels/sample_small/ambient.sh"),
 	                            std::string(20, '\1'));
 	const ToolRun check = Run("check sample_small");
