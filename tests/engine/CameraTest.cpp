@@ -60,15 +60,11 @@ TEST(CameraTest, YawTurnsAboutUpAndPitchIsRefusedNearVertical)
 {
 	Zeph::Camera lens(1.0f);
 	const float quarter = std::numbers::pi_v<float> / 2.0f;
+	for (const float yaw : {quarter, -quarter})
 	{
 		Zeph::CameraInstance camera(&lens);
-		camera.Yaw(quarter);
-		EXPECT_VEC3_NEAR(camera.GetForward(), -1.0f, 0.0f, 0.0f);
-	}
-	{
-		Zeph::CameraInstance camera(&lens);
-		camera.Yaw(-quarter);
-		EXPECT_VEC3_NEAR(camera.GetForward(), 1.0f, 0.0f, 0.0f);
+		camera.Yaw(yaw);
+		EXPECT_VEC3_NEAR(camera.GetForward(), yaw > 0.0f ? -1.0f : 1.0f, 0.0f, 0.0f);
 	}
 	{
 		Zeph::CameraInstance camera(&lens);

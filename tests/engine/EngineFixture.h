@@ -5,7 +5,9 @@
 // report fails the test unless the test took it with TakeLog().
 
 #include <bitset>
+#include <cstdlib>
 #include <cstring>
+#include <gmock/gmock-matchers.h>
 #include <gtest/gtest.h>
 #include <string>
 #include <vector>
@@ -159,11 +161,40 @@ protected:
 		return true;
 	}
 
-	// A 4x4 RGBA8 DDS texture of one colour (black when none is given) in the scratch
-	// directory; its path.
-	std::string WriteSolidTexture(const std::string& aName, const uint8_t* aColor = nullptr)
+	// Whether somePixels (read back top row first, RGBA) hold DrawFrame's picture: the quad's
+	// colour inside it, the clear colour around it, both sRGB-encoded.
+	static testing::AssertionResult IsAcceptanceFrame(const std::vector<uint8_t>& somePixels, int aWidth,
+	                                                  int aHeight)
 	{
-		const Dds::ImageInfo info{.myWidth = 4, .myHeight = 4, .myFormat = Dds::Format::R8G8B8A8_UNORM};
+		// Clip y 0.9..0.2 is rows 0.05..0.4 of the height from the top, x -0.5..0.5 the middle half:
+		// the quad's centre and a point near its top-left corner; then the corners, a point below
+		// the quad and one above it.
+		const int points[6][2] = {
+		    {aWidth / 2, aHeight * 9 / 40}, {aWidth / 4 + 2, aHeight / 20 + 2}, {0, 0},
+		    {aWidth - 1, aHeight - 1},      {aWidth / 2, aHeight * 3 / 4},      {aWidth / 2, aHeight / 40}};
+		for (int point = 0; point < 6; ++point)
+		{
+			const float* color = point < 2 ? ourQuadColor : ourClearColor;
+			const size_t at = (static_cast<size_t>(points[point][1] * aWidth + points[point][0])) * 4;
+			for (size_t channel = 0; channel < 3; ++channel)
+			{
+				if (at + 3 >= somePixels.size() ||
+				    std::abs(somePixels[at + channel] - TestSupport::SrgbEncoded(color[channel])) > 1)
+				{
+					return testing::AssertionFailure() << "channel " << channel << " at (" << points[point][0]
+					                                   << ", " << points[point][1] << ")";
+				}
+			}
+		}
+		return testing::AssertionSuccess();
+	}
+
+	// A 4x4 DDS texture (RGBA8 unless told) in the scratch directory, of one colour where
+	// one is given (black otherwise); its path.
+	std::string WriteSolidTexture(const std::string& aName, const uint8_t* aColor = nullptr,
+	                              Dds::Format aFormat = Dds::Format::R8G8B8A8_UNORM)
+	{
+		const Dds::ImageInfo info{.myWidth = 4, .myHeight = 4, .myFormat = aFormat};
 		Dds::Image image;
 		std::string error;
 		EXPECT_TRUE(image.Init(info, error)) << error;

@@ -22,12 +22,17 @@ template <typename T> T Next(FI_File& aFile, T aStart = T())
 	EXPECT_TRUE(aFile.Read(aStart));
 	return aStart;
 }
+
+class FI_FileTest : public testing::Test
+{
+protected:
+	ScratchDir myScratch;
+};
 } // namespace
 
-TEST(FI_FileTest, TextModeQuotesStringsWritesNumbersBareAndReadsThemBack)
+TEST_F(FI_FileTest, TextModeQuotesStringsWritesNumbersBareReadsThemBackAndSkipsCommentLines)
 {
-	ScratchDir scratch;
-	const std::string name = scratch.File("text.txt");
+	const std::string name = myScratch.File("text.txt");
 	{
 		FI_File file;
 		ASSERT_TRUE(file.Open(name, WRITE));
@@ -48,16 +53,12 @@ TEST(FI_FileTest, TextModeQuotesStringsWritesNumbersBareAndReadsThemBack)
 	EXPECT_TRUE(file.NewLine()) << "skips the rest of the line";
 	EXPECT_DOUBLE_EQ(Next<double>(file), 2.5);
 	EXPECT_TRUE(file.Close());
-}
 
-TEST(FI_FileTest, ReadWordSkipsCommentLines)
-{
-	ScratchDir scratch;
-	const std::string name = scratch.File("words.txt");
-	WriteWholeFile(name, "// a comment with SURF in it\n//another\n  SURF next\n//trailing");
+	// ReadWord passes over comment lines.
+	const std::string words = myScratch.File("words.txt");
+	WriteWholeFile(words, "// a comment with SURF in it\n//another\n  SURF next\n//trailing");
 
-	FI_File file;
-	ASSERT_TRUE(file.Open(name, READ));
+	ASSERT_TRUE(file.Open(words, READ));
 	const auto nextWord = [&file] {
 		std::string word;
 		EXPECT_TRUE(file.ReadWord(word));
@@ -68,10 +69,9 @@ TEST(FI_FileTest, ReadWordSkipsCommentLines)
 	EXPECT_EQ(nextWord(), "") << "a file ending in a comment has no further word";
 }
 
-TEST(FI_FileTest, BinaryWritesRawLittleEndianBytesAndReadsThemBack)
+TEST_F(FI_FileTest, BinaryWritesRawLittleEndianBytesAndReadsThemBack)
 {
-	ScratchDir scratch;
-	const std::string name = scratch.File("values.bin");
+	const std::string name = myScratch.File("values.bin");
 	const unsigned char shortBytes[] = {0xfe, 0xca};
 	const std::string withNul("x\0y\"z", 5);
 	{
@@ -101,10 +101,9 @@ TEST(FI_FileTest, BinaryWritesRawLittleEndianBytesAndReadsThemBack)
 	EXPECT_TRUE(file.Close()) << "every read stayed inside the file";
 }
 
-TEST(FI_FileTest, CorruptLengthFailsAtCloseAndAReopenStartsClean)
+TEST_F(FI_FileTest, CorruptLengthFailsAtCloseAndAReopenStartsClean)
 {
-	ScratchDir scratch;
-	const std::string name = scratch.File("corrupt.bin");
+	const std::string name = myScratch.File("corrupt.bin");
 	WriteWholeFile(name, std::string("\xff\xff\xff\x7f"
 	                                 "abc",
 	                                 7));
@@ -125,10 +124,9 @@ TEST(FI_FileTest, CorruptLengthFailsAtCloseAndAReopenStartsClean)
 	EXPECT_TRUE(file.Close());
 }
 
-TEST(FI_FileTest, OperationsWithoutTheirFlagAreRefusedAndTouchNothing)
+TEST_F(FI_FileTest, OperationsWithoutTheirFlagAreRefusedAndTouchNothing)
 {
-	ScratchDir scratch;
-	const std::string name = scratch.File("flags.txt");
+	const std::string name = myScratch.File("flags.txt");
 	WriteWholeFile(name, "\"kept\" 5\n");
 	std::string text;
 	int number = 7;
@@ -156,22 +154,21 @@ TEST(FI_FileTest, OperationsWithoutTheirFlagAreRefusedAndTouchNothing)
 	EXPECT_FALSE(unopened.Write("x") || unopened.Read(text) || unopened.NewLine());
 }
 
-TEST(FI_FileTest, OpenReportsBadFlagsAndUnopenableFiles)
+TEST_F(FI_FileTest, OpenReportsBadFlagsAndUnopenableFiles)
 {
-	ScratchDir scratch;
-	WriteWholeFile(scratch.File("plain"), "x");
-	const std::string missing = scratch.File("missing.txt");
-	const std::string underFile = scratch.File("plain/log.txt");
+	WriteWholeFile(myScratch.File("plain"), "x");
+	const std::string missing = myScratch.File("missing.txt");
+	const std::string underFile = myScratch.File("plain/log.txt");
 	const struct
 	{
 		std::string name;
 		int flags;
 		std::string error;
 	} cases[] = {
-	    {scratch.File("a.txt"), APPEND, "error: can't have append without read access.\n\n"},
-	    {scratch.File("a.txt"), READ | APPEND, "error: can't have append without read access.\n\n"},
-	    {scratch.File("a.txt"), 0, "error: must have at least read or write access.\n\n"},
-	    {scratch.File("a.txt"), BINARY, "error: must have at least read or write access.\n\n"},
+	    {myScratch.File("a.txt"), APPEND, "error: can't have append without read access.\n\n"},
+	    {myScratch.File("a.txt"), READ | APPEND, "error: can't have append without read access.\n\n"},
+	    {myScratch.File("a.txt"), 0, "error: must have at least read or write access.\n\n"},
+	    {myScratch.File("a.txt"), BINARY, "error: must have at least read or write access.\n\n"},
 	    {missing, READ, "error: unable to open file:" + missing + "\n\n"},
 	    {underFile, WRITE, "error: unable to open file:" + underFile + "\n\n"},
 	};
@@ -183,22 +180,21 @@ TEST(FI_FileTest, OpenReportsBadFlagsAndUnopenableFiles)
 		EXPECT_EQ(testing::internal::GetCapturedStderr(), test.error);
 		EXPECT_FALSE(file.Write("lost")) << "nothing is written after a failed open";
 	}
-	EXPECT_FALSE(std::filesystem::exists(scratch.File("a.txt")));
+	EXPECT_FALSE(std::filesystem::exists(myScratch.File("a.txt")));
 }
 
-TEST(FI_FileTest, OpenResolvesCaseCreatesDirectoriesAndAppends)
+TEST_F(FI_FileTest, OpenResolvesCaseCreatesDirectoriesAndAppends)
 {
-	ScratchDir scratch;
-	std::filesystem::create_directories(scratch.Path() / "data/Shaders");
-	WriteWholeFile(scratch.File("data/Shaders/x.fx"), "\"shader\"");
+	std::filesystem::create_directories(myScratch.Path() / "data/Shaders");
+	WriteWholeFile(myScratch.File("data/Shaders/x.fx"), "\"shader\"");
 	FI_File file;
 	std::string text;
-	ASSERT_TRUE(file.Open(scratch.File("DATA/shaders/X.FX"), READ));
+	ASSERT_TRUE(file.Open(myScratch.File("DATA/shaders/X.FX"), READ));
 	EXPECT_TRUE(file.Read(text));
 	EXPECT_EQ(text, "shader");
 
-	const std::string written = scratch.File("data/Shaders/Misc/new.txt");
-	ASSERT_TRUE(file.Open(scratch.File("Data/shaders/Misc/new.txt"), WRITE));
+	const std::string written = myScratch.File("data/Shaders/Misc/new.txt");
+	ASSERT_TRUE(file.Open(myScratch.File("Data/shaders/Misc/new.txt"), WRITE));
 	EXPECT_TRUE(file.WriteWord("first "));
 	ASSERT_TRUE(file.Close());
 	ASSERT_TRUE(file.Open(written, WRITE | APPEND));
@@ -210,7 +206,7 @@ TEST(FI_FileTest, OpenResolvesCaseCreatesDirectoriesAndAppends)
 	EXPECT_EQ(ReadWholeFile(written), "") << "plain write truncates";
 }
 
-TEST(FI_FileTest, WritesFlushAndCloseReportADiskThatRefusesThem)
+TEST_F(FI_FileTest, WritesFlushAndCloseReportADiskThatRefusesThem)
 {
 	// /dev/full refuses every byte, as a full disk does, whoever writes (root included).
 	if (!std::filesystem::exists("/dev/full"))

@@ -20,50 +20,27 @@ protected:
 	// The log since the last take holds an ERROR entry naming aText and no critical one.
 	void ExpectLoggedError(const std::string& aText)
 	{
-		const std::string log = TakeLog();
-		EXPECT_NE(log.find("\"ERROR\""), std::string::npos) << log;
-		EXPECT_NE(log.find(aText), std::string::npos) << log;
-		EXPECT_EQ(log.find("CRITICAL"), std::string::npos) << log;
+		EXPECT_THAT(TakeLog(), testing::AllOf(testing::HasSubstr("\"ERROR\""), testing::HasSubstr(aText),
+		                                      testing::Not(testing::HasSubstr("CRITICAL"))));
 	}
 };
 
 // Error entries carry the tag as a quoted item; a bare search for ERROR would also
 // match "CRITICAL ERROR".
-TEST_F(FailurePolicyTest, ASetUpStepThatFailsReturnsFalseAndAFreshStartSucceeds)
+TEST_F(FailurePolicyTest, AFailedSetUpStepAndResourcesThatCannotBeMadeAreErrorsAndTheEditorGoesOn)
 {
 	// The back buffer is larger than any GL texture: the swap-chain step fails, not the device.
 	Gpu::WindowHandle window = 0;
-	if (!Zeph::Engine::Create(window, 40000, 40000))
-	{
-		ExpectLoggedError("back buffer");
-	}
-	else
-	{
-		ADD_FAILURE() << "a 40000 x 40000 back buffer was accepted";
-	}
+	EXPECT_FALSE(Zeph::Engine::Create(window, 40000, 40000)) << "a 40000 x 40000 back buffer was accepted";
+	ExpectLoggedError("back buffer");
+	// A fresh start succeeds.
 	Zeph::Engine::ShutDown();
-	ASSERT_TRUE(CreateEngine(64, 64));
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	EXPECT_TRUE(DrawFrame());
-}
-
-TEST_F(FailurePolicyTest, ResourcesThatCannotBeMadeAreNullAndTheEditorGoesOn)
-{
-	if (!CreateEngine(64, 64))
-	{
-		return;
-	}
 	Zeph::Engine* engine = Zeph::Engine::GetInstance();
 
 	// A DDS the reader understands but GL cannot sample: a depth-stencil format.
-	Dds::ImageInfo info;
-	info.myWidth = 4;
-	info.myHeight = 4;
-	info.myFormat = Dds::Format::D24_UNORM_S8_UINT;
-	Dds::Image image;
-	std::string error;
-	ASSERT_TRUE(image.Init(info, error)) << error;
-	const std::string depthTexture = myScratch.File("depth.dds");
-	ASSERT_TRUE(Dds::SaveToFile(depthTexture, image, error)) << error;
+	const std::string depthTexture = WriteSolidTexture("depth.dds", nullptr, Dds::Format::D24_UNORM_S8_UINT);
 	EXPECT_EQ(engine->GetTextureContainer().GetTexture(depthTexture, false), nullptr);
 	ExpectLoggedError("has no GL texture form");
 	// Nothing was stored, so the next request tries again (and fails the same way).
@@ -95,10 +72,7 @@ using FailurePolicyDeathTest = FailurePolicyTest;
 // facade's levels; the effect layer's account of the damage comes first, as an error.
 TEST_F(FailurePolicyDeathTest, ADamagedCompiledEffectEndsWithTheEnginesOwnReport)
 {
-	if (!CreateEngine(64, 64))
-	{
-		return;
-	}
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	const std::string source = myScratch.File("Damaged.fx");
 	TestSupport::WriteWholeFile(source, "technique Render {}");
 	TestSupport::WriteWholeFile(source + "al", std::string("FXAL\x01\x00garbage", 13));
@@ -110,13 +84,11 @@ TEST_F(FailurePolicyDeathTest, ADamagedCompiledEffectEndsWithTheEnginesOwnReport
 	    },
 	    "");
 	const std::string log = TakeLog();
-	const size_t error = log.find("\"ERROR\"");
 	const size_t critical = log.find("\"CRITICAL ERROR\"");
-	ASSERT_NE(error, std::string::npos) << log;
 	ASSERT_NE(critical, std::string::npos) << log;
-	EXPECT_LT(error, critical) << log;
-	EXPECT_NE(log.find("\"Zeph::Effect::Init\"", critical), std::string::npos) << log;
-	EXPECT_NE(log.find("Cant Create Effect", critical), std::string::npos) << log;
-	EXPECT_NE(log.find("Critical Error Message", critical), std::string::npos) << log;
+	EXPECT_THAT(log.substr(0, critical), testing::HasSubstr("\"ERROR\""));
+	EXPECT_THAT(log.substr(critical), testing::AllOf(testing::HasSubstr("\"Zeph::Effect::Init\""),
+	                                                 testing::HasSubstr("Cant Create Effect"),
+	                                                 testing::HasSubstr("Critical Error Message")));
 }
 } // namespace

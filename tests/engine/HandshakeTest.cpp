@@ -16,6 +16,35 @@ TEST_F(EngineTest, TwoThreadsTakingTurnsCreateTexturesAndDrawWithoutErrors)
 	engine->ReleaseContext();
 
 	constexpr int rounds = 8;
+	// One turn's drawing, on the context the turn made current: a new target cleared, a quad of
+	// the turn's colour drawn through an effect, and read back.
+	const auto drawTurn = [&](int anId, int aRound) {
+		Gpu::Context& context = engine->GetContext();
+		Zeph::Effect* effect = engine->GetEffectContainer().GetEffect("Data/Shaders/Misc/Vertex_PosCol.fx");
+		Zeph::Texture target(32, 32, Dds::Format::R8G8B8A8_UNORM);
+		Fx::Pass* pass = effect != nullptr ? effect->GetTechnique()->GetPassByIndex(0) : nullptr;
+		if (pass == nullptr || target.GetRenderTargetView() == nullptr)
+		{
+			return false;
+		}
+		const Matrix44<float> identity;
+		effect->SetWorldMatrix(identity);
+		effect->SetViewMatrix(identity);
+		effect->SetProjectionMatrix(identity);
+		const float black[4] = {0.0f, 0.0f, 0.0f, 1.0f};
+		const float color[4] = {static_cast<float>(anId), static_cast<float>(aRound) / rounds, 0.5f, 1.0f};
+		context.ClearRenderTargetView(*target.GetRenderTargetView(), black);
+		Gpu::RenderTargetView* const targets[] = {target.GetRenderTargetView()};
+		context.SetRenderTargets(targets, nullptr);
+		context.SetViewport({.myWidth = 32.0f, .myHeight = 32.0f});
+		std::vector<uint8_t> pixels;
+		const bool drawnFlag = DrawQuad(context, *pass, -1.0f, -1.0f, 1.0f, 1.0f, color) &&
+		                       Gpu::ReadRenderTarget(context, *target.GetRenderTargetView(), pixels) &&
+		                       pixels[0] == (anId == 0 ? 0 : 255) &&
+		                       std::abs(pixels[1] - static_cast<int>(std::lround(color[1] * 255.0f))) <= 1;
+		context.SetRenderTargets({}, nullptr);
+		return drawnFlag;
+	};
 	std::atomic<int> turn = 0;
 	std::atomic<int> failures = 0;
 	auto work = [&](int anId) {
@@ -25,47 +54,9 @@ TEST_F(EngineTest, TwoThreadsTakingTurnsCreateTexturesAndDrawWithoutErrors)
 			{
 				std::this_thread::yield();
 			}
-			if (!engine->MakeContextCurrent())
+			if (!engine->MakeContextCurrent() || !drawTurn(anId, round))
 			{
 				++failures;
-			}
-			else
-			{
-				Gpu::Context& context = engine->GetContext();
-				Zeph::Effect* effect =
-				    engine->GetEffectContainer().GetEffect("Data/Shaders/Misc/Vertex_PosCol.fx");
-				Zeph::Texture target(32, 32, Dds::Format::R8G8B8A8_UNORM);
-				if (effect == nullptr || target.GetRenderTargetView() == nullptr)
-				{
-					++failures;
-				}
-				else
-				{
-					Matrix44<float> identity;
-					effect->SetWorldMatrix(identity);
-					effect->SetViewMatrix(identity);
-					effect->SetProjectionMatrix(identity);
-					const float black[4] = {0.0f, 0.0f, 0.0f, 1.0f};
-					const float color[4] = {static_cast<float>(anId), static_cast<float>(round) / rounds,
-					                        0.5f, 1.0f};
-					context.ClearRenderTargetView(*target.GetRenderTargetView(), black);
-					Gpu::RenderTargetView* const targets[] = {target.GetRenderTargetView()};
-					context.SetRenderTargets(targets, nullptr);
-					Gpu::Viewport viewport;
-					viewport.myWidth = 32.0f;
-					viewport.myHeight = 32.0f;
-					context.SetViewport(viewport);
-					Fx::Pass* pass = effect->GetTechnique()->GetPassByIndex(0);
-					std::vector<uint8_t> pixels;
-					if (pass == nullptr || !DrawQuad(context, *pass, -1.0f, -1.0f, 1.0f, 1.0f, color) ||
-					    !Gpu::ReadRenderTarget(context, *target.GetRenderTargetView(), pixels) ||
-					    pixels[0] != (anId == 0 ? 0 : 255) ||
-					    std::abs(pixels[1] - static_cast<int>(std::lround(color[1] * 255.0f))) > 1)
-					{
-						++failures;
-					}
-					context.SetRenderTargets({}, nullptr);
-				}
 			}
 			engine->ReleaseContext();
 			turn.store(1 - anId, std::memory_order_release);

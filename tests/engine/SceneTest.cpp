@@ -10,12 +10,9 @@
 
 namespace
 {
-void ExpectMatrix(const Matrix44<float>& aMatrix, const std::vector<float>& someExpected)
+std::vector<float> Elements(const Matrix44<float>& aMatrix)
 {
-	for (int i = 0; i < 16; ++i)
-	{
-		EXPECT_FLOAT_EQ(aMatrix.myMatrix[i], someExpected[static_cast<size_t>(i)]) << "element " << i;
-	}
+	return {aMatrix.myMatrix, aMatrix.myMatrix + 16};
 }
 
 std::vector<float> Components(const Vector3<float>& aVector)
@@ -41,24 +38,21 @@ public:
 };
 } // namespace
 
-TEST(InstanceTest, ScaleReplacesTheMatrixAndPositionRestoresTheTranslation)
+TEST(InstanceTest, ScaleReplacesTheMatrixPositionRestoresTheTranslationAndThePreviousOrientationIsKept)
 {
 	Zeph::ModelNode model;
 	Zeph::Instance instance(&model);
 	instance.SetPosition({4.0f, 5.0f, 6.0f});
 	instance.SetScale(2.0f, 2.0f, 2.0f);
 	// The translation is gone while the position member still holds it.
-	ExpectMatrix(instance.GetOrientation(), {2, 0, 0, 0, 0, 2, 0, 0, 0, 0, 2, 0, 0, 0, 0, 1});
+	EXPECT_EQ(Elements(instance.GetOrientation()),
+	          (std::vector<float>{2, 0, 0, 0, 0, 2, 0, 0, 0, 0, 2, 0, 0, 0, 0, 1}));
 	EXPECT_EQ(Components(instance.GetPosition()), (std::vector{4.0f, 5.0f, 6.0f}));
 
 	instance.SetPosition({1.0f, 2.0f, 3.0f});
-	ExpectMatrix(instance.GetOrientation(), {2, 0, 0, 0, 0, 2, 0, 0, 0, 0, 2, 0, 1, 2, 3, 1});
-}
+	EXPECT_EQ(Elements(instance.GetOrientation()),
+	          (std::vector<float>{2, 0, 0, 0, 0, 2, 0, 0, 0, 0, 2, 0, 1, 2, 3, 1}));
 
-TEST(InstanceTest, OrientationKeepsTheMatrixBeforeTheLastChange)
-{
-	Zeph::ModelNode model;
-	Zeph::Instance instance(&model);
 	Matrix44<float> first = Matrix44<float>::CreateRotateAroundY(0.5f);
 	first.SetPosition({1.0f, 2.0f, 3.0f});
 	Matrix44<float> second = Matrix44<float>::CreateRotateAroundX(0.25f);
@@ -66,8 +60,8 @@ TEST(InstanceTest, OrientationKeepsTheMatrixBeforeTheLastChange)
 
 	instance.SetOrientation(first);
 	instance.SetOrientation(second);
-	ExpectMatrix(instance.GetPreviousOrientation(), std::vector<float>(first.myMatrix, first.myMatrix + 16));
-	ExpectMatrix(instance.GetOrientation(), std::vector<float>(second.myMatrix, second.myMatrix + 16));
+	EXPECT_EQ(Elements(instance.GetPreviousOrientation()), Elements(first));
+	EXPECT_EQ(Elements(instance.GetOrientation()), Elements(second));
 	EXPECT_EQ(Components(instance.GetPosition()), (std::vector{-7.0f, 8.0f, 9.0f}));
 }
 
@@ -133,17 +127,12 @@ TEST(InstanceTest, RoomDataReachesTheRootAndTheFirstChildChainOnly)
 	delete root;
 }
 
-TEST(RoomTest, BoundsGiveTheCentreAndExtents)
+TEST(RoomTest, BoundsGiveTheCentreAndExtentsAndSphereInsideIsStrictOnEveryAxis)
 {
 	const Zeph::Room room({0.0f, 0.0f, 0.0f}, {2.0f, 4.0f, 6.0f});
 	EXPECT_EQ(Components(room.GetCenterPosition()), (std::vector{1.0f, 2.0f, 3.0f}));
 	EXPECT_EQ(Components(room.myExtents), (std::vector{1.0f, 2.0f, 3.0f}));
 	EXPECT_EQ(Components(room.GetMax()), (std::vector{2.0f, 4.0f, 6.0f}));
-}
-
-TEST(RoomTest, SphereInsideIsStrictOnEveryAxis)
-{
-	const Zeph::Room room({0.0f, 0.0f, 0.0f}, {2.0f, 4.0f, 6.0f});
 	struct Case
 	{
 		Vector3<float> myCentre;
