@@ -2,6 +2,7 @@
 // what the editor shows afterwards; both bakes' handshake with a render loop that
 // keeps running and a third thread that polls the progress.
 #include <algorithm>
+#include <array>
 #include <atomic>
 #include <chrono>
 #include <cmath>
@@ -13,7 +14,6 @@
 
 #include "FacadeFixture.h"
 #include "engine/Engine.h"
-#include "engine/Room.h"
 #include "renderer/AmbientVolumeFile.h"
 #include "renderer/ProbeHelper.h"
 #include "renderer/Renderer.h"
@@ -21,87 +21,14 @@
 
 namespace
 {
-class BakeCommandTest : public FacadeTest
-{
-protected:
-	// The probe counts the bake's grid has over the loaded rooms.
-	void ExpectedCounts(int (&someCountsOut)[3]) const
-	{
-		Vector3<float> minimum(2000000.0f, 2000000.0f, 2000000.0f);
-		Vector3<float> maximum(-2000000.0f, -2000000.0f, -2000000.0f);
-		const auto& rooms = myFacadeRooms();
-		for (int index = 0; index < rooms.Count(); ++index)
-		{
-			minimum.Set(std::min(minimum.x, rooms[index]->GetMin().x),
-			            std::min(minimum.y, rooms[index]->GetMin().y),
-			            std::min(minimum.z, rooms[index]->GetMin().z));
-			maximum.Set(std::max(maximum.x, rooms[index]->GetMax().x),
-			            std::max(maximum.y, rooms[index]->GetMax().y),
-			            std::max(maximum.z, rooms[index]->GetMax().z));
-		}
-		someCountsOut[0] = static_cast<int>(std::ceil((maximum.x - minimum.x) / 2.0f));
-		someCountsOut[1] = static_cast<int>(std::ceil((maximum.y - minimum.y) / 2.0f));
-		someCountsOut[2] = static_cast<int>(std::ceil((maximum.z - minimum.z) / 2.0f));
-	}
-	const GrowingArray<Zeph::Room*>& myFacadeRooms() const
-	{
-		return Lumora::LumoraWrapper::GetInstance()->GetRooms();
-	}
-};
+using BakeCommandTest = FacadeTest;
 
 // The constant term of the red irradiance (E / pi) a cell holds: cAr.w decoded.
 float RedConstant(const Zeph::AmbientVolume& aVolume, size_t aCell)
 {
 	return static_cast<float>(aVolume.myBlocks[0][aCell] >> 24) / 255.0f * 2.0f - 1.0f;
 }
-} // namespace
 
-TEST_F(BakeCommandTest, AmbientBakeWritesTheVolumeKeepsTheModeAndTheEditorShowsIt)
-{
-	Facade().ParseLevel(u"sample_small");
-	ASSERT_GT(Facade().GetRooms().Count(), 0);
-	Facade().SetIsLightMode(Lumora::DECAL_MODE);
-	const std::filesystem::path file = ScratchPath() / "data/XML/levels/sample_small/ambient.sh";
-	ASSERT_FALSE(std::filesystem::exists(file));
-
-	// Zero bounces write nothing.
-	Facade().BakeAmbient(u"sample_small", 0, false);
-	EXPECT_FALSE(std::filesystem::exists(file));
-	EXPECT_EQ(Facade().GetBakeProgress(), 0);
-
-	Facade().BakeAmbient(u"sample_small", 1, false);
-	EXPECT_EQ(Facade().GetMode(), Lumora::DECAL_MODE) << "the mode comes back after the bake";
-	EXPECT_FALSE(Facade().IsBusy());
-	Zeph::AmbientVolume volume;
-	std::string problem;
-	ASSERT_EQ(Zeph::ReadAmbientVolume(file.string(), volume, problem), Zeph::AmbientVolumeRead::OK)
-	    << problem;
-	int counts[3];
-	ExpectedCounts(counts);
-	EXPECT_EQ(volume.myCounts[0], counts[0]);
-	EXPECT_EQ(volume.myCounts[1], counts[1]);
-	EXPECT_EQ(volume.myCounts[2], counts[2]);
-	// The room is lit: some probe received light, and none is brighter than the lights allow.
-	float brightest = -1.0f;
-	for (size_t cell = 0; cell < volume.myBlocks[0].size(); ++cell)
-	{
-		brightest = std::max(brightest, RedConstant(volume, cell));
-	}
-	EXPECT_GT(brightest, 0.01f) << "no probe saw the lights";
-	EXPECT_NE(Zeph::Engine::GetInstance()->GetRenderer().GetProbeHelper()->GetView(0), nullptr)
-	    << "the baked volume stays bound";
-
-	// Loading the level again reads the baked file, and the next frames draw (the bake's
-	// queued markers, deleted by the load, are not drawn).
-	Facade().ParseLevel(u"sample_small");
-	EXPECT_TRUE(Zeph::Engine::GetInstance()->GetRenderer().IsSHLoaded());
-	Facade().Update(16.0f);
-	Facade().Render();
-	Facade().Render();
-}
-
-namespace
-{
 // The progress a third thread saw, with the frames drawn so far.
 struct ProgressSample
 {
@@ -180,9 +107,19 @@ void ExpectTheBakeHeldTheLoop(const std::vector<ProgressSample>& someSamples, in
 }
 } // namespace
 
-TEST_F(BakeCommandTest, AnAmbientBakeHoldsOffTheRenderLoopAndItsProgressNeverGoesBack)
+TEST_F(BakeCommandTest, AnAmbientBakeHoldsOffTheRenderLoopWritesTheVolumeKeepsTheModeAndTheEditorShowsIt)
 {
 	Facade().ParseLevel(u"sample_small");
+	ASSERT_GT(Facade().GetRooms().Count(), 0);
+	Facade().SetIsLightMode(Lumora::DECAL_MODE);
+	const std::filesystem::path file = ScratchPath() / "data/XML/levels/sample_small/ambient.sh";
+	ASSERT_FALSE(std::filesystem::exists(file));
+
+	// Zero bounces write nothing.
+	Facade().BakeAmbient(u"sample_small", 0, false);
+	EXPECT_FALSE(std::filesystem::exists(file));
+	EXPECT_EQ(Facade().GetBakeProgress(), 0);
+
 	const std::vector<ProgressSample> samples =
 	    BakeWhileTheLoopRuns(Facade(), [this] { Facade().BakeAmbient(u"sample_small", 2, false); });
 	// The small level's rooms leave some grid cells unvisited, so the final value is
@@ -190,7 +127,32 @@ TEST_F(BakeCommandTest, AnAmbientBakeHoldsOffTheRenderLoopAndItsProgressNeverGoe
 	const int finalProgress = Facade().GetBakeProgress();
 	EXPECT_GT(finalProgress, 0);
 	ExpectTheBakeHeldTheLoop(samples, finalProgress);
+	EXPECT_EQ(Facade().GetMode(), Lumora::DECAL_MODE) << "the mode comes back after the bake";
 	EXPECT_FALSE(Facade().IsBusy());
+	Zeph::AmbientVolume volume;
+	std::string problem;
+	ASSERT_EQ(Zeph::ReadAmbientVolume(file.string(), volume, problem), Zeph::AmbientVolumeRead::OK)
+	    << problem;
+	// The room's -3..3 x 0..3 x -4..4 in cells of 2.
+	EXPECT_EQ((std::array{volume.myCounts[0], volume.myCounts[1], volume.myCounts[2]}),
+	          (std::array{3, 2, 4}));
+	// The room is lit: some probe received light, and none is brighter than the lights allow.
+	float brightest = -1.0f;
+	for (size_t cell = 0; cell < volume.myBlocks[0].size(); ++cell)
+	{
+		brightest = std::max(brightest, RedConstant(volume, cell));
+	}
+	EXPECT_GT(brightest, 0.01f) << "no probe saw the lights";
+	EXPECT_NE(Zeph::Engine::GetInstance()->GetRenderer().GetProbeHelper()->GetView(0), nullptr)
+	    << "the baked volume stays bound";
+
+	// Loading the level again reads the baked file, and the next frames draw (the bake's
+	// queued markers, deleted by the load, are not drawn).
+	Facade().ParseLevel(u"sample_small");
+	EXPECT_TRUE(Zeph::Engine::GetInstance()->GetRenderer().IsSHLoaded());
+	Facade().Update(16.0f);
+	Facade().Render();
+	Facade().Render();
 }
 
 TEST_F(BakeCommandTest, AReflectionBakeOfThreeRoomsHoldsOffTheRenderLoopAndReportsEachRoom)
@@ -209,7 +171,7 @@ TEST_F(BakeCommandTest, AReflectionBakeOfThreeRoomsHoldsOffTheRenderLoopAndRepor
 </root>
 )");
 	Facade().ParseLevel(u"three_rooms");
-	ASSERT_EQ(myFacadeRooms().Count(), 3);
+	ASSERT_EQ(Facade().GetRooms().Count(), 3);
 	const std::vector<ProgressSample> samples =
 	    BakeWhileTheLoopRuns(Facade(), [this] { Facade().BakeSpecular(u"three_rooms"); });
 	EXPECT_EQ(Facade().GetBakeProgress(), 100);

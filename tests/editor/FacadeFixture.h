@@ -17,9 +17,12 @@
 
 #include <array>
 #include <filesystem>
+#include <gmock/gmock-matchers.h>
 #include <gtest/gtest.h>
+#include <sstream>
 #include <string>
 #include <system_error>
+#include <vector>
 
 #include "core/Matrix44.h"
 #include "core/Vector4.h"
@@ -161,6 +164,59 @@ private:
 	bool myChangedDirectoryFlag = false;
 	Lumora::LumoraWrapper* myFacade = nullptr;
 };
+
+// What breaks the path graph's invariant, empty when it holds: every edge ends at two nodes of
+// the node array, each of which holds it, and every edge a node holds is an element of the edge
+// array that ends at that node (the references the graph rests on).
+inline std::string GraphProblems(const Lumora::LumoraWrapper& aFacade)
+{
+	const GrowingArray<AI::NGNode>& nodes = aFacade.GetNodes();
+	const GrowingArray<AI::NGEdge>& edges = aFacade.GetEdges();
+	std::ostringstream problems;
+	for (const AI::NGEdge& edge : edges)
+	{
+		for (const AI::NGNode* end : edge.GetConnections())
+		{
+			if (end < nodes.begin() || end >= nodes.end())
+			{
+				problems << "an edge ends outside the nodes; ";
+			}
+			else if (end->GetEdgeSlots()[0] != &edge && end->GetEdgeSlots()[1] != &edge)
+			{
+				problems << "node " << end->GetID() << " lost an edge; ";
+			}
+		}
+	}
+	for (const AI::NGNode& node : nodes)
+	{
+		for (const AI::NGEdge* edge : node.GetEdgeSlots())
+		{
+			if (edge != nullptr &&
+			    (edge < edges.begin() || edge >= edges.end() ||
+			     (edge->GetConnections()[0] != &node && edge->GetConnections()[1] != &node)))
+			{
+				problems << "node " << node.GetID() << " holds a stale edge; ";
+			}
+		}
+	}
+	return problems.str();
+}
+
+// A light's numbers (falloff, angles, colour, position or orientation) in one list, to compare
+// whole records at once.
+inline std::vector<float> Values(const Zeph::PointLightData& aLight)
+{
+	return {aLight.myFalloff, aLight.myPosition.x, aLight.myPosition.y, aLight.myPosition.z,
+	        aLight.myColor.x, aLight.myColor.y,    aLight.myColor.z,    aLight.myColor.w};
+}
+
+inline std::vector<float> Values(const Zeph::SpotLightData& aLight)
+{
+	std::vector<float> values = {aLight.myFalloff, aLight.myAngles.x, aLight.myAngles.y, aLight.myColor.x,
+	                             aLight.myColor.y, aLight.myColor.z,  aLight.myColor.w};
+	values.insert(values.end(), aLight.myOrientation.myMatrix, aLight.myOrientation.myMatrix + 16);
+	return values;
+}
 
 // Decals need the shipped catalogue's "brick", the type every new decal takes; without
 // it the test is skipped.

@@ -55,27 +55,9 @@ std::string CheckScene(const Lumora::LumoraWrapper& aFacade)
 			         << selection.myCount << "; ";
 		}
 	}
-	// Every edge joins two nodes of the array, and each of them holds it.
+	problems << GraphProblems(aFacade);
 	const auto& nodes = aFacade.GetNodes();
 	const auto& edges = aFacade.GetEdges();
-	const AI::NGNode* first = nodes.Count() > 0 ? &nodes[0] : nullptr;
-	for (int index = 0; index < edges.Count(); ++index)
-	{
-		for (int end = 0; end < 2; ++end)
-		{
-			const AI::NGNode* node = edges[index].GetConnections()[end];
-			if (node == nullptr || first == nullptr || node < first || node >= first + nodes.Count())
-			{
-				problems << "edge " << index << " points outside the nodes; ";
-				continue;
-			}
-			const auto& slots = node->GetEdgeSlots();
-			if (slots[0] != &edges[index] && slots[1] != &edges[index])
-			{
-				problems << "edge " << index << " is not held by its node; ";
-			}
-		}
-	}
 	// A chain built by adding nodes has one edge fewer than nodes.
 	if (nodes.Count() > 0 && edges.Count() != nodes.Count() - 1)
 	{

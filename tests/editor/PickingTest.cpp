@@ -53,14 +53,6 @@ protected:
 		const Vector3<float> offset = aTo - aFrom;
 		Facade().MoveSelectedVector(offset.x, offset.y, offset.z);
 	}
-
-	void ExpectSelection(int aPoint, int aSpot, int aNode, int aDecal)
-	{
-		EXPECT_EQ(Facade().GetSelectedPoint(), aPoint);
-		EXPECT_EQ(Facade().GetSelectedSpot(), aSpot);
-		EXPECT_EQ(Facade().GetSelectedNode(), aNode);
-		EXPECT_EQ(Facade().GetSelectedDecal(), aDecal);
-	}
 };
 
 struct NearestCase
@@ -92,7 +84,7 @@ TEST_P(NearestLightTest, CentreClickSelectsTheNearestLightOnTheLine)
 	const NearestCase& testCase = GetParam();
 	PlaceLights(testCase.myLights);
 	ClickCentre();
-	ExpectSelection(testCase.myPoint, testCase.mySpot, -1, -1);
+	EXPECT_EQ(Selection(), (std::array{testCase.myPoint, testCase.mySpot, -1, -1}));
 }
 
 INSTANTIATE_TEST_SUITE_P(
@@ -145,18 +137,13 @@ TEST_F(PickingTest, ClickOnTheDrawnPixelSelectsThatLight)
 	for (const Placed& light : lights)
 	{
 		ClickAt(light.myPosition);
-		if (light.myKind == Kind::Point)
-		{
-			ExpectSelection(pointIndex++, -1, -1, -1);
-		}
-		else
-		{
-			ExpectSelection(-1, spotIndex++, -1, -1);
-		}
+		const bool pointFlag = light.myKind == Kind::Point;
+		EXPECT_EQ(Selection(),
+		          (std::array{pointFlag ? pointIndex++ : -1, pointFlag ? -1 : spotIndex++, -1, -1}));
 	}
 	// The top-left corner sees none of them, and a miss clears the selection.
 	Facade().DoIntersection(0.0f, 0.0f);
-	ExpectSelection(-1, -1, -1, -1);
+	EXPECT_EQ(Selection(), (std::array{-1, -1, -1, -1}));
 }
 
 TEST_F(PickingTest, OnlyTheModesCandidatesArePicked)
@@ -165,29 +152,29 @@ TEST_F(PickingTest, OnlyTheModesCandidatesArePicked)
 
 	Facade().SetIsLightMode(NODE_MODE);
 	ClickCentre();
-	ExpectSelection(-1, -1, -1, -1);
+	EXPECT_EQ(Selection(), (std::array{-1, -1, -1, -1}));
 	Facade().AddPathNode(); // at (0, 10, 2), on the centre line
 	Facade().AddPointLight();
 	ASSERT_EQ(Facade().GetSelectedNode(), 0);
 	ClickCentre();
-	ExpectSelection(-1, -1, 0, -1);
+	EXPECT_EQ(Selection(), (std::array{-1, -1, 0, -1}));
 	// A click on empty space clears every kind, including ones the mode does not pick.
 	Facade().AddPointLight();
 	Facade().DoIntersection(5.0f, 5.0f);
-	ExpectSelection(-1, -1, -1, -1);
+	EXPECT_EQ(Selection(), (std::array{-1, -1, -1, -1}));
 
 	Facade().SetIsLightMode(DECAL_MODE);
 	ClickCentre();
-	ExpectSelection(-1, -1, -1, -1);
+	EXPECT_EQ(Selection(), (std::array{-1, -1, -1, -1}));
 
 	// A mode outside the three picks nothing at all.
 	Facade().SetIsLightMode(7);
 	ClickCentre();
-	ExpectSelection(-1, -1, -1, -1);
+	EXPECT_EQ(Selection(), (std::array{-1, -1, -1, -1}));
 
 	Facade().SetIsLightMode(LIGHT_MODE);
 	ClickCentre();
-	ExpectSelection(-1, 0, -1, -1);
+	EXPECT_EQ(Selection(), (std::array{-1, 0, -1, -1}));
 }
 
 TEST_F(PickingTest, QueriesReportTheSelectionOrLeaveTheRecordAlone)
