@@ -126,9 +126,7 @@ TEST_F(CommandLineTest, BakeDescribeAndRenderTheSmallLevelAndKeepItsVolumeOnAFul
 	int height = 0;
 	std::vector<uint8_t> pixels;
 	ASSERT_TRUE(TestSupport::ReadPng((myScratch.Path() / "frame.png").string(), width, height, pixels));
-	const std::string difference =
-	    TestSupport::CompareWithGolden("cli-sample-small-baked", width, height, pixels);
-	EXPECT_TRUE(difference.empty()) << difference;
+	EXPECT_EQ(TestSupport::CompareWithGolden("cli-sample-small-baked", width, height, pixels), "");
 
 	// A bake the disk will not take exits 1 naming the file and keeps the old volume: the
 	// disk takes the tool's messages, not the 708 bytes of the new one.
