@@ -12,8 +12,8 @@ PACKAGES=(
 	libtinyxml-dev
 	# the command line tool's argument parsing
 	libcli11-dev
-	# tests and benchmarks
-	googletest libgtest-dev libbenchmark-dev
+	# tests and benchmarks (the tests use GoogleMock's matchers, header-only)
+	googletest libgtest-dev libgmock-dev libbenchmark-dev
 	# the libFuzzer build of the file readers (cmake -DLUMORA_FUZZ=ON with clang)
 	clang
 	# GPU layer: OpenGL through libepoxy on EGL, Mesa's llvmpipe for headless runs, PNG output
