@@ -62,7 +62,7 @@ bool CreateDepthBuffer(int aWidth, int aHeight, const char* aFunction, const cha
 	if (!aTextureOut->Init(Engine::GetInstance()->GetContext(), desc))
 	{
 		aTextureOut.reset();
-		ReportCritical(someLines[0], aFunction, aText);
+		ReportCritical(someLines[0], aFunction, "%s", aText);
 		return false;
 	}
 	Gpu::DepthStencilDesc depthDesc;
@@ -70,7 +70,7 @@ bool CreateDepthBuffer(int aWidth, int aHeight, const char* aFunction, const cha
 	aDepthOut = aTextureOut->CreateDepthStencilView(depthDesc);
 	if (aDepthOut == nullptr)
 	{
-		ReportCritical(someLines[1], aFunction, aText);
+		ReportCritical(someLines[1], aFunction, "%s", aText);
 		return false;
 	}
 	Gpu::ShaderResourceDesc shaderDesc;
@@ -80,7 +80,7 @@ bool CreateDepthBuffer(int aWidth, int aHeight, const char* aFunction, const cha
 	aShaderOut = aTextureOut->CreateShaderResourceView(shaderDesc);
 	if (aShaderOut == nullptr)
 	{
-		ReportCritical(someLines[2], aFunction, aText);
+		ReportCritical(someLines[2], aFunction, "%s", aText);
 		return false;
 	}
 	return true;
