@@ -30,6 +30,7 @@ declare -A max_len=([dds]=70000 [collada]=60000 [al]=20000 [ambient]=20000 [leve
 declare -A shared=([dds]=../shared/testdata/dds [collada]=../shared/testdata/collada)
 
 status=0
+passed=0
 for target in "${targets[@]}"; do
 	# Absolute: the level target works in a scratch directory of its own.
 	work="$PWD/$dir/fuzz-run/$target"
@@ -57,5 +58,7 @@ for target in "${targets[@]}"; do
 		break
 	fi
 	grep -E '^stat::number_of_executed_units|^Done ' "$work/log.txt" | sed "s/^/fuzz: $target: /" || true
+	passed=$((passed + 1))
 done
+echo "fuzz: $passed passed, $((${#targets[@]} - passed)) failed"
 exit "$status"
