@@ -77,6 +77,22 @@ void ReportNotANumber(const std::string& aMessage)
 	log->ErrorMessage(__LINE__, "XML::ConvertValue", "%s", aMessage.c_str());
 }
 
+// For the numeric readers: true for any other type, or when the attribute's value reads as a
+// number; otherwise reported with the attribute and where it stands (aWhere), and false.
+template <typename T> bool IsNumberWhereOneGoes(const TiXmlAttribute* anAttribute, const std::string& aWhere)
+{
+	if constexpr (std::same_as<T, int> || std::same_as<T, float>)
+	{
+		if (!ReadsAsNumber<T>(anAttribute->Value()))
+		{
+			ReportNotANumber("Not a number [" + std::string(anAttribute->Value()) + "] in attribute [" +
+			                 anAttribute->Name() + "] of " + aWhere);
+			return false;
+		}
+	}
+	return true;
+}
+
 std::string ReadAll(FILE* aFile)
 {
 	std::string text;
@@ -516,14 +532,9 @@ template <XMLReadableValue T> T XML::GetAttribute(const std::string& aName)
 		Error("Could not find name [" + aName + "] in [" + elementName + "] in [" + GetDocumentName() + "]");
 		return T{};
 	}
-	if constexpr (std::same_as<T, int> || std::same_as<T, float>)
+	if (!IsNumberWhereOneGoes<T>(attribute, "[" + elementName + "] in [" + GetDocumentName() + "]"))
 	{
-		if (!ReadsAsNumber<T>(attribute->Value()))
-		{
-			ReportNotANumber("Not a number [" + std::string(attribute->Value()) + "] in attribute [" +
-			                 attribute->Name() + "] of [" + elementName + "] in [" + GetDocumentName() + "]");
-			return T{};
-		}
+		return T{};
 	}
 	return ConvertValue<T>(attribute->Value());
 }
@@ -557,15 +568,10 @@ template <XMLReadableValue T> T XML::GetChildAttribute(const std::string& aTag, 
 		      GetDocumentName() + "]");
 		return T{};
 	}
-	if constexpr (std::same_as<T, int> || std::same_as<T, float>)
+	if (!IsNumberWhereOneGoes<T>(attribute,
+	                             "[" + aTag + "] in [" + elementName + "] in [" + GetDocumentName() + "]"))
 	{
-		if (!ReadsAsNumber<T>(attribute->Value()))
-		{
-			ReportNotANumber("Not a number [" + std::string(attribute->Value()) + "] in attribute [" +
-			                 attribute->Name() + "] of [" + aTag + "] in [" + elementName + "] in [" +
-			                 GetDocumentName() + "]");
-			return T{};
-		}
+		return T{};
 	}
 	return ConvertValue<T>(attribute->Value());
 }
