@@ -15,6 +15,21 @@ void PrintError(const std::string& aMessage)
 	std::fprintf(stderr, "lumora: %s\n", aMessage.c_str());
 }
 
+namespace
+{
+// The level's folder on disk, or empty when the name is no plain folder name or names none.
+std::filesystem::path LevelFolder(const std::string& aLevel)
+{
+	if (aLevel.empty() || aLevel.find('/') != std::string::npos || aLevel == "." || aLevel == "..")
+	{
+		return {};
+	}
+	const std::filesystem::path resolved = Paths::Resolve("data/XML/levels/" + aLevel);
+	std::error_code ignored;
+	return std::filesystem::is_directory(resolved, ignored) ? resolved : std::filesystem::path();
+}
+} // namespace
+
 std::string LevelFolderProblem(const std::string& aLevel)
 {
 	namespace fs = std::filesystem;
@@ -24,8 +39,7 @@ std::string LevelFolderProblem(const std::string& aLevel)
 		return "no data/ folder in " + fs::current_path(ignored).string() +
 		       " (run from the repository root or a copy of its data/)";
 	}
-	if (!aLevel.empty() && (aLevel.find('/') != std::string::npos || aLevel == ".." || aLevel == "." ||
-	                        !fs::is_directory(Paths::Resolve("data/XML/levels/" + aLevel), ignored)))
+	if (!aLevel.empty() && LevelFolder(aLevel).empty())
 	{
 		return "no level '" + aLevel + "' under data/XML/levels/";
 	}
@@ -34,17 +48,8 @@ std::string LevelFolderProblem(const std::string& aLevel)
 
 std::string LevelSpelledOnDisk(const std::string& aLevel)
 {
-	if (aLevel.empty() || aLevel.find('/') != std::string::npos || aLevel == "." || aLevel == "..")
-	{
-		return aLevel;
-	}
-	const std::filesystem::path resolved = Paths::Resolve("data/XML/levels/" + aLevel);
-	std::error_code ignored;
-	if (!std::filesystem::is_directory(resolved, ignored))
-	{
-		return aLevel;
-	}
-	return resolved.filename().string();
+	const std::filesystem::path folder = LevelFolder(aLevel);
+	return folder.empty() ? aLevel : folder.filename().string();
 }
 
 std::string Describe(const Problem& aProblem)
