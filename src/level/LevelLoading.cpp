@@ -19,6 +19,7 @@
 #include <vector>
 
 #include "core/GrowingArray.h"
+#include "engine/EngineReport.h"
 #include "core/Matrix33.h"
 #include "core/Matrix44.h"
 #include "core/Sphere.h"
@@ -47,10 +48,7 @@ constexpr float ourDegreesToRadians = 0.01745329238474369f;
 // What a level lost on loading goes to the log as an error, which the editor survives.
 void ReportLeftOut(int aLine, const char* aFunction, const std::string& aMessage)
 {
-	if (Debug* log = Debug::GetInstance())
-	{
-		log->ErrorMessage(aLine, aFunction, "%s", aMessage.c_str());
-	}
+	Zeph::ReportError(aLine, aFunction, "%s", aMessage.c_str());
 }
 
 std::string LevelFolder(const std::string& aLevel)

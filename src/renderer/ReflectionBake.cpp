@@ -7,9 +7,9 @@
 #include <numbers>
 
 #include "core/Matrix44.h"
-#include "engine/Debug.h"
 #include "engine/Effect.h"
 #include "engine/Engine.h"
+#include "engine/EngineReport.h"
 #include "engine/Room.h"
 #include "engine/Texture.h"
 #include "engine/TextureContainer.h"
@@ -128,12 +128,9 @@ void Renderer::GenerateReflections(const GrowingArray<Room*>& someRooms, const s
 		const std::string file = CubemapContainer::GetRoomFile(aLevel, room->GetID());
 		if (file.empty())
 		{
-			if (Debug* log = Debug::GetInstance())
-			{
-				log->ErrorMessage(__LINE__, "Zeph::Renderer::GenerateReflections",
-				                  "Room %d has the ID [%s], which cannot name a cubemap file: not baked",
-				                  index, room->GetID().c_str());
-			}
+			ReportError(__LINE__, "Zeph::Renderer::GenerateReflections",
+			            "Room %d has the ID [%s], which cannot name a cubemap file: not baked", index,
+			            room->GetID().c_str());
 			myBakingProgress = BakeProgress(index + 1, count);
 			continue;
 		}

@@ -9,6 +9,7 @@
 #include <tinyxml.h>
 
 #include "engine/Debug.h"
+#include "engine/EngineReport.h"
 #include "platform/paths/Paths.h"
 #include "platform/xmlscan/NestingScan.h"
 #include "xml/XMLElement.h"
@@ -68,13 +69,7 @@ template <typename T> bool ReadsAsNumber(const char* aText)
 // on, while a tool that lists problems hears of it with the file, element and attribute.
 void ReportNotANumber(const std::string& aMessage)
 {
-	Debug* log = Debug::GetInstance();
-	if (log == nullptr)
-	{
-		std::fprintf(stderr, "XML::ConvertValue: %s\n", aMessage.c_str());
-		return;
-	}
-	log->ErrorMessage(__LINE__, "XML::ConvertValue", "%s", aMessage.c_str());
+	Zeph::ReportError(__LINE__, "XML::ConvertValue", "%s", aMessage.c_str());
 }
 
 // For the numeric readers: true for any other type, or when the attribute's value reads as a
