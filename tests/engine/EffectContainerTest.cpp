@@ -1,6 +1,7 @@
 // Effects through the engine's container: sharing by name, the sprite effect
 // compiled from source, the line effect kept apart, retrying failed loads, the
-// reports of missing variables, and the setters reaching their variables.
+// reports of missing variables, and switching techniques. What the setters upload
+// is seen in the renderer's frames (golden images of lit rooms).
 
 #include <filesystem>
 
@@ -61,7 +62,7 @@ technique RenderOther { pass P0 { VertexShader = VS; PixelShader = PS; } }
 } // namespace
 
 // One engine and one container in a scratch copy of data/Shaders, through all of it.
-TEST_F(EngineTest, TheContainerSharesRetriesCompilesTheSpriteFromSourceAndEffectsReachTheirVariables)
+TEST_F(EngineTest, TheContainerSharesRetriesCompilesTheSpriteFromSourceAndReportsMissingVariables)
 {
 	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	WorkingDirectory directory(myScratch.Path() / "work");
@@ -71,14 +72,12 @@ TEST_F(EngineTest, TheContainerSharesRetriesCompilesTheSpriteFromSourceAndEffect
 	Zeph::Effect* posCol = container.GetEffect("Data/Shaders/Misc/Vertex_PosCol.fx");
 	ASSERT_NE(posCol, nullptr) << TakeLog();
 	EXPECT_EQ(container.GetEffect("Data/Shaders/Misc/Vertex_PosCol.fx"), posCol);
-	EXPECT_TRUE(posCol->GetTechnique()->IsValid());
 	EXPECT_EQ(posCol->GetTechnique()->GetName(), "Render");
 	EXPECT_EQ(container.GetCount(), baseline + 1u);
 
 	Zeph::Effect* line = container.GetEffect(Zeph::ShaderFiles[Zeph::EFFECT_LINE]);
 	ASSERT_NE(line, nullptr) << TakeLog();
 	EXPECT_EQ(container.GetEffect("data/shaders/misc/Line2D.fx"), line);
-	EXPECT_TRUE(line->GetTechnique()->IsValid());
 	EXPECT_EQ(container.GetCount(), baseline + 1u) << "the line effect is not in the map";
 
 	for (int attempt = 0; attempt < 2; ++attempt)
@@ -114,76 +113,20 @@ TEST_F(EngineTest, TheContainerSharesRetriesCompilesTheSpriteFromSourceAndEffect
 	Zeph::Effect* sprite = container.GetEffect(Zeph::ShaderFiles[Zeph::EFFECT_SPRITE]);
 	ASSERT_NE(sprite, nullptr) << TakeLog();
 	EXPECT_TRUE(container.HasSpriteEffect());
-	EXPECT_TRUE(sprite->GetTechnique()->IsValid());
-	EXPECT_EQ(sprite->GetTechnique()->GetName(), "Render");
 	EXPECT_EQ(container.GetEffect("data/Shaders/Sprite/Sprite.fx"), sprite);
 	EXPECT_EQ(container.GetCount(), baseline + 1u);
 	EXPECT_EQ(container.GetEffect("Data/Shaders/Misc/Vertex_Pos.fx"), nullptr);
 	EXPECT_THAT(TakeLog(), HasSubstr("Cant Create Effect"));
 
-	// The variables an effect must have are reported, not refused; the setters reach theirs.
+	// The variables an effect must have are reported, not refused.
 	WriteCompiledEffect("data/Shaders/Test/NoWorld.fx",
 	                    std::string("uniform mat4 View;\nuniform mat4 Projection;\n") + ourPlainPass);
-	WriteCompiledEffect("data/Shaders/Test/Full.fx", std::string(R"(
-uniform mat4 World;
-uniform mat4 View;
-uniform mat4 Projection;
-uniform float FarPlane;
-uniform vec4 EyePos;
-uniform vec4 LightDirection;
-uniform vec4 LightColor;
-uniform vec4 EnvBoxPos;
-uniform vec4 EnvBoxMax;
-uniform vec4 EnvBoxMin;
-uniform vec4 PointLightColors[4];
-uniform vec4 PointLightPositions[4];
-uniform float PointLightRanges[4];
-uniform float Time;
-uniform sampler2D AlbedoTexture;
-)") + ourPlainPass);
-	ASSERT_NE(container.GetEffect("data/Shaders/Test/NoWorld.fx"), nullptr);
+	Zeph::Effect* effect = container.GetEffect("data/Shaders/Test/NoWorld.fx");
+	ASSERT_NE(effect, nullptr);
 	EXPECT_THAT(TakeLog(),
 	            AllOf(HasSubstr("myWorldMatrixVariable is invalid, data/Shaders/Test/NoWorld.fx"),
 	                  HasSubstr("myFarPlaneVariable is invalid"), Not(HasSubstr("myViewMatrixVariable")),
 	                  Not(HasSubstr("myProjectionMatrixVariable"))));
-
-	Zeph::Effect* effect = container.GetEffect("data/Shaders/Test/Full.fx");
-	ASSERT_NE(effect, nullptr) << TakeLog();
-	Fx::Effect& fx = *effect->GetEffect();
-	effect->SetEyePosition(Vector3<float>(1.0f, 2.0f, 3.0f));
-	EXPECT_EQ(std::vector<float>(fx.GetVariableByName("EyePos")->GetFloats().begin(),
-	                             fx.GetVariableByName("EyePos")->GetFloats().end()),
-	          (std::vector<float>{1.0f, 2.0f, 3.0f, 1.0f}));
-	effect->SetDirectionalLight(Vector4<float>(0.0f, -1.0f, 0.0f, 0.0f),
-	                            Vector4<float>(1.0f, 0.5f, 0.25f, 1.0f));
-	EXPECT_EQ(fx.GetVariableByName("LightDirection")->GetFloats()[1], -1.0f) << "direction first";
-	EXPECT_EQ(fx.GetVariableByName("LightColor")->GetFloats()[2], 0.25f);
-	effect->SetEnvironmentBox(Vector4<float>(1, 1, 1, 1), Vector4<float>(2, 2, 2, 1),
-	                          Vector4<float>(-2, -2, -2, 1));
-	EXPECT_EQ(fx.GetVariableByName("EnvBoxPos")->GetFloats()[0], 1.0f);
-	EXPECT_EQ(fx.GetVariableByName("EnvBoxMax")->GetFloats()[0], 2.0f);
-	EXPECT_EQ(fx.GetVariableByName("EnvBoxMin")->GetFloats()[0], -2.0f);
-
-	const Vector4<float> colors[4] = {{1, 0, 0, 1}, {0, 1, 0, 1}, {0, 0, 1, 1}, {1, 1, 1, 1}};
-	const Vector4<float> positions[4] = {{0, 0, 0, 1}, {1, 0, 0, 1}, {2, 0, 0, 1}, {3, 0, 0, 1}};
-	const float ranges[4] = {5.0f, 6.0f, 7.0f, 8.0f};
-	effect->SetPointLights(colors, positions, ranges);
-	EXPECT_EQ(fx.GetVariableByName("PointLightColors")->GetFloats()[4 * 3 + 1], 1.0f);
-	EXPECT_EQ(fx.GetVariableByName("PointLightPositions")->GetFloats()[4 * 2], 2.0f);
-	EXPECT_EQ(fx.GetVariableByName("PointLightRanges")->GetFloats()[3], 8.0f);
-	effect->SetFarPlane(750.0f);
-	EXPECT_EQ(fx.GetVariableByName("FarPlane")->GetFloats()[0], 750.0f);
-	effect->SetTime(2.5f);
-	EXPECT_EQ(fx.GetVariableByName("Time")->GetFloats()[0], 2.5f);
-
-	Matrix44<float> world;
-	world.myMatrix[12] = 4.0f; // translation x
-	effect->SetWorldMatrix(world);
-	effect->SetPrevWorldMatrix(world); // no such variable: nothing happens
-	EXPECT_EQ(fx.GetVariableByName("World")->GetFloats()[12], 4.0f) << "uploaded as stored, row-major";
-
-	EXPECT_FALSE(effect->SetShaderResource("NoSuchTexture", nullptr));
-	EXPECT_TRUE(effect->SetShaderResource("AlbedoTexture", nullptr));
 	effect->SetTechnique("RenderOther");
 	EXPECT_EQ(effect->GetTechnique()->GetName(), "RenderOther");
 	effect->SetTechnique("NoSuchTechnique");

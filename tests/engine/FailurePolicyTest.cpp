@@ -36,7 +36,6 @@ TEST_F(FailurePolicyTest, AFailedSetUpStepAndResourcesThatCannotBeMadeAreErrorsA
 	// A fresh start succeeds.
 	Zeph::Engine::ShutDown();
 	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
-	EXPECT_TRUE(DrawFrame());
 	Zeph::Engine* engine = Zeph::Engine::GetInstance();
 
 	// A DDS the reader understands but GL cannot sample: a depth-stencil format.
@@ -63,7 +62,6 @@ TEST_F(FailurePolicyTest, AFailedSetUpStepAndResourcesThatCannotBeMadeAreErrorsA
 	{
 	}
 #endif
-	EXPECT_TRUE(DrawFrame());
 }
 
 using FailurePolicyDeathTest = FailurePolicyTest;

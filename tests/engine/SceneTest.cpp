@@ -38,52 +38,33 @@ public:
 };
 } // namespace
 
-TEST(InstanceTest, ScaleReplacesTheMatrixPositionRestoresTheTranslationAndThePreviousOrientationIsKept)
-{
-	Zeph::ModelNode model;
-	Zeph::Instance instance(&model);
-	instance.SetPosition({4.0f, 5.0f, 6.0f});
-	instance.SetScale(2.0f, 2.0f, 2.0f);
-	// The translation is gone while the position member still holds it.
-	EXPECT_EQ(Elements(instance.GetOrientation()),
-	          (std::vector<float>{2, 0, 0, 0, 0, 2, 0, 0, 0, 0, 2, 0, 0, 0, 0, 1}));
-	EXPECT_EQ(Components(instance.GetPosition()), (std::vector{4.0f, 5.0f, 6.0f}));
-
-	instance.SetPosition({1.0f, 2.0f, 3.0f});
-	EXPECT_EQ(Elements(instance.GetOrientation()),
-	          (std::vector<float>{2, 0, 0, 0, 0, 2, 0, 0, 0, 0, 2, 0, 1, 2, 3, 1}));
-
-	Matrix44<float> first = Matrix44<float>::CreateRotateAroundY(0.5f);
-	first.SetPosition({1.0f, 2.0f, 3.0f});
-	Matrix44<float> second = Matrix44<float>::CreateRotateAroundX(0.25f);
-	second.SetPosition({-7.0f, 8.0f, 9.0f});
-
-	instance.SetOrientation(first);
-	instance.SetOrientation(second);
-	EXPECT_EQ(Elements(instance.GetPreviousOrientation()), Elements(first));
-	EXPECT_EQ(Elements(instance.GetOrientation()), Elements(second));
-	EXPECT_EQ(Components(instance.GetPosition()), (std::vector{-7.0f, 8.0f, 9.0f}));
-}
-
-TEST(InstanceTest, AttachedObjectsFollowPositionAndOrientationButNotScale)
+TEST(InstanceTest, ScalePositionAndOrientationSetTheMatrixAndAttachedObjectsFollowAllButScale)
 {
 	Zeph::ModelNode model;
 	auto* instance = new Zeph::Instance(&model);
 	int renders = 0;
 	auto* follower = new Follower(&renders);
 	instance->AddAttachedObject(follower);
-
-	instance->SetPosition({1.0f, 2.0f, 3.0f});
-	EXPECT_EQ(follower->myUpdates, 1);
-	EXPECT_FLOAT_EQ(follower->myLast.GetPosition().y, 2.0f);
-
-	instance->SetScale(3.0f, 3.0f, 3.0f);
+	instance->SetPosition({4.0f, 5.0f, 6.0f});
+	EXPECT_EQ(Elements(follower->myLast), Elements(instance->GetOrientation()));
+	instance->SetScale(2.0f, 2.0f, 2.0f);
+	// The translation is gone while the position member still holds it.
+	EXPECT_EQ(Elements(instance->GetOrientation()),
+	          (std::vector<float>{2, 0, 0, 0, 0, 2, 0, 0, 0, 0, 2, 0, 0, 0, 0, 1}));
+	EXPECT_EQ(Components(instance->GetPosition()), (std::vector{4.0f, 5.0f, 6.0f}));
 	EXPECT_EQ(follower->myUpdates, 1) << "SetScale leaves the attached objects where they are";
+	instance->SetPosition({1.0f, 2.0f, 3.0f});
+	EXPECT_EQ(Elements(instance->GetOrientation()),
+	          (std::vector<float>{2, 0, 0, 0, 0, 2, 0, 0, 0, 0, 2, 0, 1, 2, 3, 1}));
 
-	const Matrix44<float> turned = Matrix44<float>::CreateRotateAroundZ(1.0f);
+	Matrix44<float> turned = Matrix44<float>::CreateRotateAroundZ(1.0f);
+	turned.SetPosition({-7.0f, 8.0f, 9.0f});
+	const Matrix44<float> before = instance->GetOrientation();
 	instance->SetOrientation(turned);
-	EXPECT_EQ(follower->myUpdates, 2);
-	EXPECT_FLOAT_EQ(follower->myLast.myMatrix[1], turned.myMatrix[1]);
+	EXPECT_EQ(Elements(instance->GetPreviousOrientation()), Elements(before));
+	EXPECT_EQ(Components(instance->GetPosition()), (std::vector{-7.0f, 8.0f, 9.0f}));
+	EXPECT_EQ(follower->myUpdates, 3);
+	EXPECT_EQ(Elements(follower->myLast), Elements(turned));
 
 	// Rendering without an engine queues nothing but still renders the attachments.
 	instance->Render();
@@ -96,34 +77,26 @@ TEST(InstanceTest, RoomDataReachesTheRootAndTheFirstChildChainOnly)
 	// root -> {a -> {a0, a1}, b}
 	auto* root = new Zeph::ModelNode();
 	auto* a = new Zeph::ModelNode();
-	auto* b = new Zeph::ModelNode();
-	auto* a0 = new Zeph::ModelNode();
-	auto* a1 = new Zeph::ModelNode();
-	a->AddChild(a0);
-	a->AddChild(a1);
+	a->AddChild(new Zeph::ModelNode());
+	a->AddChild(new Zeph::ModelNode());
 	root->AddChild(a);
-	root->AddChild(b);
+	root->AddChild(new Zeph::ModelNode());
 	Zeph::Instance instance(root);
-
 	Zeph::RoomData room;
 	room.myRoomIndex = 7;
-	room.myCenter = {1.0f, 2.0f, 3.0f};
 	instance.SetRoomData(room);
 
 	Zeph::Instance::Node* node = instance.GetRootNode();
 	ASSERT_EQ(node->GetChildren().Count(), 2);
 	Zeph::Instance::Node* nodeA = node->GetChildren()[0];
-	Zeph::Instance::Node* nodeB = node->GetChildren()[1];
 	ASSERT_EQ(nodeA->GetChildren().Count(), 2);
 	EXPECT_EQ(nodeA->GetModelNode(), a);
-	EXPECT_EQ(nodeA->GetChildren()[1]->GetModelNode(), a1);
-
-	EXPECT_EQ(node->GetRenderData().myRoomData.myRoomIndex, 7);
-	EXPECT_EQ(nodeA->GetRenderData().myRoomData.myRoomIndex, 7);
-	EXPECT_EQ(nodeA->GetChildren()[0]->GetRenderData().myRoomData.myRoomIndex, 7);
-	EXPECT_FLOAT_EQ(nodeA->GetChildren()[0]->GetRenderData().myRoomData.myCenter.z, 3.0f);
-	EXPECT_EQ(nodeA->GetChildren()[1]->GetRenderData().myRoomData.myRoomIndex, -1);
-	EXPECT_EQ(nodeB->GetRenderData().myRoomData.myRoomIndex, -1);
+	const auto index = [](Zeph::Instance::Node* aNode) {
+		return aNode->GetRenderData().myRoomData.myRoomIndex;
+	};
+	EXPECT_EQ((std::vector{index(node), index(nodeA), index(nodeA->GetChildren()[0]),
+	                       index(nodeA->GetChildren()[1]), index(node->GetChildren()[1])}),
+	          (std::vector{7, 7, 7, -1, -1}));
 	delete root;
 }
 
@@ -140,11 +113,9 @@ TEST(RoomTest, BoundsGiveTheCentreAndExtentsAndSphereInsideIsStrictOnEveryAxis)
 		bool myInside;
 	};
 	const Case cases[] = {
-	    {{3.0f, 2.0f, 3.0f}, 1.0f, false}, // touches the face x = 2
-	    {{3.0f, 2.0f, 3.0f}, 1.5f, true},   {{1.0f, 2.0f, 3.0f}, 0.1f, true},
-	    {{1.0f, -1.0f, 3.0f}, 1.0f, false}, // touches y = 0 from below
-	    {{1.0f, -1.0f, 3.0f}, 1.01f, true}, {{1.0f, 2.0f, 7.5f}, 1.4f, false},
-	    {{1.0f, 2.0f, 7.5f}, 1.6f, true},   {{-5.0f, 2.0f, 3.0f}, 1.0f, false},
+	    {{3.0f, 2.0f, 3.0f}, 1.0f, false},                                      // touches the face x = 2
+	    {{3.0f, 2.0f, 3.0f}, 1.5f, true},   {{1.0f, -1.0f, 3.0f}, 1.0f, false}, // touches y = 0 from below
+	    {{1.0f, -1.0f, 3.0f}, 1.01f, true}, {{-5.0f, 2.0f, 3.0f}, 1.0f, false},
 	};
 	for (const Case& test : cases)
 	{
@@ -164,7 +135,6 @@ TEST(RoomTest, DebugModelNameWritesTheBoundsWithoutSeparators)
 	};
 	const Case cases[] = {
 	    {{0.0f, 0.0f, 0.0f}, {2.0f, 4.0f, 6.0f}, "room000246"},
-	    {{0.5f, -1.0f, 0.25f}, {2.125f, 4.0f, 1e7f}, "room0.5-10.252.12541e+07"},
 	    {{-3.333333f, 0.1f, 100000.0f}, {1234567.0f, 2.0f, 3.0f}, "room-3.333330.11000001.23457e+0623"},
 	};
 	for (const Case& test : cases)
