@@ -1,7 +1,7 @@
 #pragma once
 // GeneratedContent: runs the content generator once per test binary into a scratch directory and
-// gives the tests its files; LoadGeneratedImage reads one of them back with the DDS reader; Dot is the
-// tests' own, so that a fault in the generator's vector helpers cannot hide in both.
+// gives the tests its files; Dot is the tests' own, so that a fault in the generator's vector helpers
+// cannot hide in both.
 
 #include <gtest/gtest.h>
 
@@ -12,7 +12,6 @@
 
 #include "Generator.h"
 #include "core/Vector3.h"
-#include "platform/dds/DdsFile.h"
 #include "support/TestSupport.h"
 
 namespace ContentTestSupport
@@ -55,15 +54,4 @@ private:
 	std::vector<std::string> myFiles;
 	std::string myError;
 };
-
-// Loads a generated file ("grading/warm.dds") into anImageOut; use with ASSERT_NO_FATAL_FAILURE.
-inline void LoadGeneratedImage(const std::string& aRelative, Dds::Image& anImageOut)
-{
-	const GeneratedContent& content = GeneratedContent::Get();
-	ASSERT_EQ(content.Error(), "");
-	ASSERT_NE(std::find(content.Files().begin(), content.Files().end(), aRelative), content.Files().end())
-	    << aRelative << " is not among the generated files";
-	std::string error;
-	ASSERT_TRUE(Dds::LoadFromFile(content.Path(aRelative), anImageOut, error)) << error;
-}
 } // namespace ContentTestSupport
