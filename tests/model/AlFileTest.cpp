@@ -1,11 +1,10 @@
 // The binary model file as bytes: trees written and read back, a hand-written
 // version-1 file, and damaged files failing cleanly. No GPU: effects, textures and
 // buffers are the GPU suite's.
-#include <array>
-#include <cstring>
 #include <functional>
 #include <gtest/gtest.h>
 #include <memory>
+#include <tuple>
 #include <vector>
 
 #include "ModelTreeCheck.h"
@@ -23,6 +22,7 @@ struct ModelFields
 	int myIndices[3] = {0, 0, 0}; // 12 bytes, read as three 32-bit or six 16-bit indices
 	int myVertexSize = 32;
 	int myStride = 32;
+	int myTextureCount = 1;
 };
 
 // Builds a file image field by field, as the format lists them.
@@ -31,7 +31,6 @@ class Bytes
 public:
 	Bytes& Int(int aValue) { return Raw(&aValue, sizeof(aValue)); }
 	Bytes& Float(float aValue) { return Raw(&aValue, sizeof(aValue)); }
-	Bytes& Double(double aValue) { return Raw(&aValue, sizeof(aValue)); }
 	Bytes& String(const std::string& aText)
 	{
 		Int(static_cast<int>(aText.size()));
@@ -70,7 +69,11 @@ public:
 		}
 		String("first").String("RenderAlphaTest").String("NULL");
 		Int(1).Int(3).Int(0).Int(0).Int(0).Int(4);
-		Int(1).String("data/tex/a.dds").String("DiffuseTexture").Int(1);
+		Int(someFields.myTextureCount);
+		for (int texture = 0; texture < someFields.myTextureCount; ++texture)
+		{
+			String("data/tex/a.dds").String("DiffuseTexture").Int(1);
+		}
 		return Int(0).Int(0).Int(0).Int(0).Int(0);
 	}
 	std::vector<uint8_t> myBytes;
@@ -94,26 +97,14 @@ TEST(AlFileTest, ATreeWrittenAndReadBackIsTheSameTreeAndEveryTruncationFails)
 	const std::unique_ptr<Zeph::ModelNode> tree(ModelTreeCheck::MakeTree());
 	std::vector<uint8_t> bytes;
 	Zeph::AlFile::Encode(*tree, bytes);
-	int version = 0;
-	ASSERT_GE(bytes.size(), 4u);
-	std::memcpy(&version, bytes.data(), 4);
-	EXPECT_EQ(version, 2);
-
 	std::string error;
 	const std::unique_ptr<Zeph::ModelNode> read = Parse(bytes, error);
 	ASSERT_NE(read, nullptr) << error;
-	ModelTreeCheck::ExpectSameTree(*tree, *read);
-	// The layout description comes from the vertex type, not from the file.
-	const GrowingArray<Gpu::InputElement>& layout = read->GetModel()->GetInputLayoutDesc();
-	ASSERT_EQ(layout.Count(), 5);
-	EXPECT_EQ(layout[4].mySemanticName, "BINORMAL");
-	EXPECT_EQ(layout[4].myAlignedByteOffset, 44u);
-
+	EXPECT_EQ(ModelTreeCheck::Describe(*read), ModelTreeCheck::Describe(*tree));
 	std::vector<uint8_t> again;
 	Zeph::AlFile::Encode(*read, again);
 	EXPECT_EQ(again, bytes) << "writing the read tree gives the same bytes";
 
-	// Every truncation of the file fails.
 	for (size_t length = 0; length < bytes.size(); ++length)
 	{
 		const std::vector<uint8_t> cut(bytes.begin(), bytes.begin() + static_cast<std::ptrdiff_t>(length));
@@ -123,7 +114,9 @@ TEST(AlFileTest, ATreeWrittenAndReadBackIsTheSameTreeAndEveryTruncationFails)
 	}
 }
 
-TEST(AlFileTest, AVersionOneFileHasNoModelFlagOnTheRootOnly)
+// Version 1 has no has-model flag on the root (the root always has a model); the writer writes
+// version 2, with the flag.
+TEST(AlFileTest, AVersionOneFileReadsAsTheSameTreeWithTheRootsFlag)
 {
 	Bytes file;
 	file.Int(1).SmallModel().PlainNodeTail("root", 1);
@@ -132,38 +125,22 @@ TEST(AlFileTest, AVersionOneFileHasNoModelFlagOnTheRootOnly)
 	std::vector<Zeph::AlTextureBinding> bindings;
 	const std::unique_ptr<Zeph::ModelNode> root = Parse(file.myBytes, error, &bindings);
 	ASSERT_NE(root, nullptr) << error;
-	EXPECT_EQ(root->GetName(), "root");
-	const Zeph::Model* model = root->GetModel();
-	ASSERT_NE(model, nullptr);
-	EXPECT_FALSE(model->IsNullObject());
-	// Model ID, vertex type, index count, vertex count and stride, in the file's order.
-	EXPECT_EQ((std::array{model->GetModelID(), model->GetVertexType(), model->GetIndexCount(),
-	                      model->GetVertexCount(), model->GetVertexStride()}),
-	          (std::array{42, 2, 3, 1, 32}));
-	float lastFloat = 0.0f;
-	std::memcpy(&lastFloat, model->GetVertexData().data() + 28, 4);
-	EXPECT_EQ(lastFloat, 7.0f);
-	EXPECT_EQ((std::array{model->GetFirstName(), model->GetTechniqueName(), model->GetThirdName()}),
-	          (std::array<std::string, 3>{"first", "RenderAlphaTest", "NULL"}));
-	ASSERT_EQ(model->GetSurfaces().Count(), 1);
-	EXPECT_EQ(model->GetSurfaces()[0].GetIndexCount(), 3);
-	EXPECT_EQ(model->GetSurfaces()[0].GetPrimitiveTopology(), Gpu::PrimitiveTopology::TriangleList);
+	Bytes second;
+	// The texture is a binding for the factory to make (with a GPU), not yet on the surface.
+	second.Int(2).Int(1).SmallModel({.myTextureCount = 0}).PlainNodeTail("root", 1);
+	second.Int(0).PlainNodeTail("child", 0);
+	std::vector<uint8_t> written;
+	Zeph::AlFile::Encode(*root, written);
+	EXPECT_EQ(written, second.myBytes);
 	ASSERT_EQ(bindings.size(), 1u);
-	EXPECT_EQ(bindings[0].myModel, model);
-	EXPECT_EQ(bindings[0].mySurface, 0);
-	EXPECT_EQ(bindings[0].myPath, "data/tex/a.dds");
-	EXPECT_EQ(bindings[0].myVariableName, "DiffuseTexture");
-	EXPECT_TRUE(bindings[0].mySRGBFlag);
-	ModelTreeCheck::ExpectSameMatrix(root->GetTransformation()->GetOrientation(),
-	                                 ModelTreeCheck::DistinctMatrix(0.0f), "root matrix");
-	ASSERT_EQ(root->GetChildren().Count(), 1);
-	EXPECT_EQ(root->GetChildren()[0]->GetName(), "child");
-	EXPECT_EQ(root->GetChildren()[0]->GetModel(), nullptr);
+	EXPECT_EQ(
+	    std::tuple(bindings[0].myModel, bindings[0].mySurface, bindings[0].myPath, bindings[0].myVariableName,
+	               bindings[0].mySRGBFlag),
+	    std::tuple(root->GetModel(), 0, std::string("data/tex/a.dds"), std::string("DiffuseTexture"), true));
 
 	// The same file as version 2 lacks the root's flag: the model block is misread.
-	Bytes second = file;
-	second.myBytes[0] = 2;
-	EXPECT_EQ(Parse(second.myBytes, error), nullptr);
+	file.myBytes[0] = 2;
+	EXPECT_EQ(Parse(file.myBytes, error), nullptr);
 }
 
 TEST(AlFileTest, DamagedFilesFailWithTheirReason)
@@ -177,23 +154,13 @@ TEST(AlFileTest, DamagedFilesFailWithTheirReason)
 	const Case cases[] = {
 	    {"version 3", [](Bytes& aFile) { aFile.Int(3).Int(0).PlainNodeTail("r", 0); },
 	     "unsupported version 3"},
-	    {"version 0", [](Bytes& aFile) { aFile.Int(0).Int(0).PlainNodeTail("r", 0); },
-	     "unsupported version 0"},
 	    {"no version", [](Bytes& aFile) { aFile.Raw("\x02", 1); }, "file ends inside version"},
 	    {"has-model 2", [](Bytes& aFile) { aFile.Int(2).Int(2).PlainNodeTail("r", 0); }, "not 0 or 1"},
-	    {"child count past the end", [](Bytes& aFile) { aFile.Int(2).Int(0).PlainNodeTail("r", 0x7fffffff); },
-	     "child node count 2147483647 does not fit"},
 	    {"negative child count", [](Bytes& aFile) { aFile.Int(2).Int(0).PlainNodeTail("r", -1); },
 	     "child node count -1 does not fit"},
-	    {"name longer than the file",
-	     [](Bytes& aFile) { aFile.Int(2).Int(0).Int(1).Int(0).Matrix(0.0f).Int(1000000000); },
-	     "node name 1000000000 does not fit"},
 	    {"hierarchy children past the end",
 	     [](Bytes& aFile) { aFile.Int(2).Int(0).Int(1).Int(0x10000000).Matrix(0.0f).String("r").Int(0); },
 	     "transformation child count"},
-	    {"negative vertex data size",
-	     [](Bytes& aFile) { aFile.Int(2).Int(1).SmallModel({.myVertexSize = -4}); },
-	     "vertex data size -4 does not fit"},
 	    {"indices past the index data",
 	     [](Bytes& aFile) { aFile.Int(2).Int(1).SmallModel({.myIndexCount = 4}); },
 	     "4 indices do not fit 12 bytes"},
@@ -217,11 +184,6 @@ TEST(AlFileTest, DamagedFilesFailWithTheirReason)
 	     "unsupported index format 7"},
 	    {"stride under the layout", [](Bytes& aFile) { aFile.Int(2).Int(1).SmallModel({.myStride = 12}); },
 	     "vertex stride 12 is less than the 32 bytes of vertex type 2"},
-	    {"curve keys past the end",
-	     [](Bytes& aFile) {
-		     aFile.Int(2).Int(0).Int(0).Int(0).Float(0).Float(0).Int(0).Int(1).Double(0).Double(0).Int(5000);
-	     },
-	     "curve key count 5000 does not fit"},
 	    {"more children than an array holds",
 	     [](Bytes& aFile) {
 		     aFile.Int(2).Int(0).PlainNodeTail("r", 65536);
@@ -247,6 +209,5 @@ TEST(AlFileTest, DamagedFilesFailWithTheirReason)
 		std::string error;
 		EXPECT_EQ(Parse(file.myBytes, error), nullptr) << test.myName;
 		EXPECT_NE(error.find(test.myReason), std::string::npos) << test.myName << ": " << error;
-		EXPECT_NE(error.find(" at byte "), std::string::npos) << test.myName << ": " << error;
 	}
 }

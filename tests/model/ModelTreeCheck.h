@@ -1,9 +1,10 @@
 #pragma once
-// Field-by-field comparison of model trees for the model file tests, and a
-// builder of a tree that uses every field the file stores.
-#include <gtest/gtest.h>
+// Model trees for the model file tests: every field the file stores written out as text, so
+// that two trees compare in one expectation and a difference shows where it lies, and a
+// builder of a tree that uses every one of those fields.
+#include <ostream>
+#include <sstream>
 #include <string>
-#include <tuple>
 
 #include "model/Model.h"
 #include "model/ModelNode.h"
@@ -12,163 +13,135 @@
 
 namespace ModelTreeCheck
 {
-inline void ExpectSameMatrix(const Matrix44<float>& anExpected, const Matrix44<float>& anActual,
-                             const std::string& aWhere)
+// One line of the description: a label and the values after it.
+template <typename... Values> void Line(std::ostream& anOut, const char* aLabel, const Values&... someValues)
 {
-	for (int i = 0; i < 16; ++i)
-	{
-		EXPECT_EQ(anExpected.myMatrix[i], anActual.myMatrix[i]) << aWhere << ", element " << i;
-	}
+	anOut << aLabel;
+	((anOut << ' ' << someValues), ...);
+	anOut << '\n';
 }
 
-inline void ExpectSameTransformation(const Zeph::TransformationNode* anExpected,
-                                     const Zeph::TransformationNode* anActual, const std::string& aWhere)
+// A label and every element of aRange (bytes as numbers).
+template <typename Range> void RangeLine(std::ostream& anOut, const char* aLabel, const Range& aRange)
 {
-	ASSERT_NE(anExpected, nullptr) << aWhere;
-	ASSERT_NE(anActual, nullptr) << aWhere;
-	ASSERT_EQ(anExpected->GetType(), anActual->GetType()) << aWhere;
-	ExpectSameMatrix(anExpected->GetOrientation(), anActual->GetOrientation(), aWhere + " matrix");
-	const auto* hierarchy = dynamic_cast<const Zeph::TransformationNodeHierarchy*>(anExpected);
-	if (hierarchy != nullptr)
+	anOut << aLabel;
+	for (const auto& value : aRange)
 	{
-		const auto* other = dynamic_cast<const Zeph::TransformationNodeHierarchy*>(anActual);
-		ASSERT_NE(other, nullptr) << aWhere << ": not read back as a hierarchy";
-		ASSERT_EQ(hierarchy->GetChildCount(), other->GetChildCount()) << aWhere;
+		anOut << ' ' << +value;
+	}
+	anOut << '\n';
+}
+
+inline void Write(std::ostream& anOut, const Matrix44<float>& aMatrix)
+{
+	RangeLine(anOut, "matrix", aMatrix.myMatrix);
+}
+
+inline void Write(std::ostream& anOut, const Zeph::TransformationNode* aNode)
+{
+	if (aNode == nullptr)
+	{
+		Line(anOut, "no transformation");
+		return;
+	}
+	Line(anOut, "transformation", static_cast<int>(aNode->GetType()));
+	Write(anOut, aNode->GetOrientation());
+	if (const auto* hierarchy = dynamic_cast<const Zeph::TransformationNodeHierarchy*>(aNode))
+	{
 		for (int child = 0; child < hierarchy->GetChildCount(); ++child)
 		{
-			ExpectSameTransformation(&hierarchy->GetChild(child), &other->GetChild(child),
-			                         aWhere + "/child " + std::to_string(child));
+			Line(anOut, "hierarchy child", child);
+			Write(anOut, &hierarchy->GetChild(child));
 		}
 	}
-	const auto* curves = dynamic_cast<const Zeph::TransformationNodeCurves*>(anExpected);
-	if (curves != nullptr)
+	if (const auto* curves = dynamic_cast<const Zeph::TransformationNodeCurves*>(aNode))
 	{
-		const auto* other = dynamic_cast<const Zeph::TransformationNodeCurves*>(anActual);
-		ASSERT_NE(other, nullptr) << aWhere << ": not read back as curves";
-		const auto fields = [](const Zeph::TransformationNodeCurves& aNode) {
-			const Vector3<float>& axis = aNode.GetRotationAxis();
-			const Vector3<float>& translation = aNode.GetTranslation();
-			return std::tuple(aNode.GetFirstParameter(), aNode.GetSecondParameter(),
-			                  aNode.GetThirdParameter(), aNode.GetFourthParameter(), axis.x, axis.y, axis.z,
-			                  translation.x, translation.y, translation.z, aNode.GetAngle());
-		};
-		EXPECT_EQ(fields(*curves), fields(*other)) << aWhere << ": parameters, axis, translation, angle";
+		const Vector3<float>& axis = curves->GetRotationAxis();
+		const Vector3<float>& move = curves->GetTranslation();
+		Line(anOut, "curves", curves->GetFirstParameter(), curves->GetSecondParameter(),
+		     curves->GetThirdParameter(), curves->GetFourthParameter(), axis.x, axis.y, axis.z, move.x,
+		     move.y, move.z, curves->GetAngle());
 		for (int slot = 0; slot < Zeph::TransformationNodeCurves::CURVE_SLOT_COUNT; ++slot)
 		{
-			const Zeph::AnimationCurve* curve = curves->GetCurve(slot);
-			const Zeph::AnimationCurve* otherCurve = other->GetCurve(slot);
-			ASSERT_EQ(curve == nullptr, otherCurve == nullptr) << aWhere << ", slot " << slot;
-			if (curve == nullptr)
+			if (const Zeph::AnimationCurve* curve = curves->GetCurve(slot))
 			{
-				continue;
-			}
-			EXPECT_EQ(curve->GetFirstParameter(), otherCurve->GetFirstParameter()) << aWhere;
-			EXPECT_EQ(curve->GetSecondParameter(), otherCurve->GetSecondParameter()) << aWhere;
-			ASSERT_EQ(curve->GetKeys().size(), otherCurve->GetKeys().size()) << aWhere << ", slot " << slot;
-			for (size_t key = 0; key < curve->GetKeys().size(); ++key)
-			{
-				EXPECT_EQ(curve->GetKeys()[key].myTime, otherCurve->GetKeys()[key].myTime) << aWhere;
-				EXPECT_EQ(curve->GetKeys()[key].myValue, otherCurve->GetKeys()[key].myValue) << aWhere;
+				Line(anOut, "curve", slot, curve->GetFirstParameter(), curve->GetSecondParameter());
+				for (const Zeph::AnimationKey& key : curve->GetKeys())
+				{
+					Line(anOut, "key", key.myTime, key.myValue);
+				}
 			}
 		}
 	}
 }
 
-inline void ExpectSameModel(const Zeph::Model& anExpected, const Zeph::Model& anActual,
-                            const std::string& aWhere)
+inline void Write(std::ostream& anOut, const Zeph::Model& aModel)
 {
-	const auto fields = [](const Zeph::Model& aModel) {
-		return std::tuple(aModel.IsNullObject(), aModel.GetModelID(), aModel.GetVertexType(),
-		                  aModel.GetIndexCount(), aModel.GetIndexFormat(), aModel.GetVertexCount(),
-		                  aModel.GetVertexStride(), aModel.GetFirstName(), aModel.GetTechniqueName(),
-		                  aModel.GetThirdName());
-	};
-	EXPECT_EQ(fields(anExpected), fields(anActual))
-	    << aWhere << ": null flag, ID, type, counts, format, names";
-	EXPECT_TRUE(std::ranges::equal(anExpected.GetIndexData(), anActual.GetIndexData())) << aWhere;
-	EXPECT_TRUE(std::ranges::equal(anExpected.GetVertexData(), anActual.GetVertexData())) << aWhere;
-
-	ASSERT_EQ(anExpected.GetSurfaces().Count(), anActual.GetSurfaces().Count()) << aWhere;
-	for (int index = 0; index < anExpected.GetSurfaces().Count(); ++index)
+	Line(anOut, "model", aModel.IsNullObject(), aModel.GetModelID(), aModel.GetVertexType(),
+	     aModel.GetIndexCount(), aModel.GetIndexFormat(), aModel.GetVertexCount(), aModel.GetVertexStride(),
+	     aModel.GetFirstName(), aModel.GetTechniqueName(), aModel.GetThirdName());
+	RangeLine(anOut, "indices", aModel.GetIndexData());
+	RangeLine(anOut, "vertices", aModel.GetVertexData());
+	for (const Zeph::Surface& surface : aModel.GetSurfaces())
 	{
-		const Zeph::Surface& surface = anExpected.GetSurfaces()[index];
-		const Zeph::Surface& other = anActual.GetSurfaces()[index];
-		const std::string where = aWhere + ", surface " + std::to_string(index);
-		EXPECT_EQ(surface.GetIndexCount(), other.GetIndexCount()) << where;
-		EXPECT_EQ(surface.GetStartIndex(), other.GetStartIndex()) << where;
-		EXPECT_EQ(surface.GetReservedValue(), other.GetReservedValue()) << where;
-		EXPECT_EQ(surface.GetSecondReservedValue(), other.GetSecondReservedValue()) << where;
-		EXPECT_EQ(surface.GetPrimitiveTopology(), other.GetPrimitiveTopology()) << where;
-		ASSERT_EQ(surface.GetTextureCount(), other.GetTextureCount()) << where;
+		Line(anOut, "surface", surface.GetIndexCount(), surface.GetStartIndex(), surface.GetReservedValue(),
+		     surface.GetSecondReservedValue(), static_cast<int>(surface.GetPrimitiveTopology()));
 		for (int texture = 0; texture < surface.GetTextureCount(); ++texture)
 		{
-			EXPECT_EQ(surface.GetTextureFileName(texture), other.GetTextureFileName(texture)) << where;
-			EXPECT_EQ(surface.GetTextureVariableName(texture), other.GetTextureVariableName(texture))
-			    << where;
-			EXPECT_EQ(surface.GetTextureSRGBFlag(texture), other.GetTextureSRGBFlag(texture)) << where;
-			EXPECT_EQ(surface.GetTexture(texture), other.GetTexture(texture))
-			    << where << ": the shared texture";
+			// The texture object too: a tree loaded twice shares the container's textures.
+			Line(anOut, "texture", surface.GetTextureFileName(texture),
+			     surface.GetTextureVariableName(texture), surface.GetTextureSRGBFlag(texture),
+			     surface.GetTexture(texture));
 		}
 	}
-
-	const Zeph::ModelAnimationData& data = anExpected.GetAnimationData();
-	const Zeph::ModelAnimationData& otherData = anActual.GetAnimationData();
-	ASSERT_EQ(data.myTransformationRecords.size(), otherData.myTransformationRecords.size()) << aWhere;
-	for (size_t index = 0; index < data.myTransformationRecords.size(); ++index)
+	const Zeph::ModelAnimationData& data = aModel.GetAnimationData();
+	for (const Zeph::ModelTransformationRecord& record : data.myTransformationRecords)
 	{
-		ExpectSameTransformation(data.myTransformationRecords[index].myTransformation.get(),
-		                         otherData.myTransformationRecords[index].myTransformation.get(),
-		                         aWhere + ", transformation record");
+		Write(anOut, record.myTransformation.get());
 	}
-	ASSERT_EQ(data.myNamedRecords.size(), otherData.myNamedRecords.size()) << aWhere;
-	for (size_t index = 0; index < data.myNamedRecords.size(); ++index)
+	for (const Zeph::ModelNamedRecord& record : data.myNamedRecords)
 	{
-		const Zeph::ModelNamedRecord& record = data.myNamedRecords[index];
-		const Zeph::ModelNamedRecord& other = otherData.myNamedRecords[index];
-		EXPECT_EQ(record.myName, other.myName) << aWhere;
-		EXPECT_EQ(record.myValue, other.myValue) << aWhere;
-		EXPECT_EQ(record.myFirst, other.myFirst) << aWhere;
-		EXPECT_EQ(record.mySecond, other.mySecond) << aWhere;
-		ExpectSameTransformation(record.myTransformation.get(), other.myTransformation.get(),
-		                         aWhere + ", named record");
+		Line(anOut, "named", record.myName, record.myValue, record.myFirst, record.mySecond);
+		Write(anOut, record.myTransformation.get());
 	}
-	ASSERT_EQ(data.myMatrixRecords.size(), otherData.myMatrixRecords.size()) << aWhere;
-	for (size_t index = 0; index < data.myMatrixRecords.size(); ++index)
+	for (const Zeph::ModelMatrixRecord& record : data.myMatrixRecords)
 	{
-		for (size_t matrix = 0; matrix < 3; ++matrix)
+		for (const Matrix44<float>& matrix : record.myMatrices)
 		{
-			ExpectSameMatrix(data.myMatrixRecords[index].myMatrices[matrix],
-			                 otherData.myMatrixRecords[index].myMatrices[matrix], aWhere + ", matrix record");
+			Write(anOut, matrix);
 		}
-		EXPECT_EQ(data.myMatrixRecords[index].myValues, otherData.myMatrixRecords[index].myValues) << aWhere;
+		RangeLine(anOut, "values", record.myValues);
 	}
-	EXPECT_EQ(data.myIntegers, otherData.myIntegers) << aWhere;
-
-	ASSERT_EQ(anExpected.GetChildModels().Count(), anActual.GetChildModels().Count()) << aWhere;
-	for (int child = 0; child < anExpected.GetChildModels().Count(); ++child)
+	RangeLine(anOut, "integers", data.myIntegers);
+	for (const Zeph::Model* child : aModel.GetChildModels())
 	{
-		ExpectSameModel(*anExpected.GetChildModels()[child], *anActual.GetChildModels()[child],
-		                aWhere + "/child model " + std::to_string(child));
+		Write(anOut, *child);
 	}
+	Line(anOut, "end of model");
 }
 
-inline void ExpectSameTree(const Zeph::ModelNode& anExpected, const Zeph::ModelNode& anActual,
-                           const std::string& aWhere = "root")
+inline void Write(std::ostream& anOut, const Zeph::ModelNode& aNode)
 {
-	EXPECT_EQ(anExpected.GetName(), anActual.GetName()) << aWhere;
-	ASSERT_EQ(anExpected.GetModel() == nullptr, anActual.GetModel() == nullptr) << aWhere;
-	if (anExpected.GetModel() != nullptr)
+	Line(anOut, "node", aNode.GetName());
+	if (aNode.GetModel() != nullptr)
 	{
-		ExpectSameModel(*anExpected.GetModel(), *anActual.GetModel(), aWhere + " model");
+		Write(anOut, *aNode.GetModel());
 	}
-	ExpectSameTransformation(anExpected.GetTransformation(), anActual.GetTransformation(),
-	                         aWhere + " transformation");
-	ASSERT_EQ(anExpected.GetChildren().Count(), anActual.GetChildren().Count()) << aWhere;
-	for (int child = 0; child < anExpected.GetChildren().Count(); ++child)
+	Write(anOut, aNode.GetTransformation());
+	for (const Zeph::ModelNode* child : aNode.GetChildren())
 	{
-		ExpectSameTree(*anExpected.GetChildren()[child], *anActual.GetChildren()[child],
-		               aWhere + "/" + std::to_string(child));
+		Write(anOut, *child);
 	}
+	Line(anOut, "end of node", aNode.GetName());
+}
+
+// The tree as text, exact to the last bit of every value.
+inline std::string Describe(const Zeph::ModelNode& aRoot)
+{
+	std::ostringstream text;
+	text.precision(17);
+	Write(text, aRoot);
+	return text.str();
 }
 
 // A matrix whose every element differs, so a swapped or dropped element shows.
