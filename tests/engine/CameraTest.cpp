@@ -1,5 +1,6 @@
-// The editor camera: fly-through moves, turning limits, the look-to view and the
-// lens matrices, with the numbers the renderer and the bakes depend on.
+// The editor camera: turning limits, the previous view and the lens, with the numbers the
+// bakes depend on. The start pose and the fly-through moves are the editor's tests (the
+// info line's position, picking after turns and moves) and every rendered frame's.
 
 #include <gtest/gtest.h>
 
@@ -31,41 +32,11 @@ float Tolerance(float anExpected)
 		EXPECT_NEAR(value.z, (ez), Tolerance(ez));                                                           \
 	} while (false)
 
-Vector3<float> Transform(const Vector3<float>& aPoint, const Matrix44<float>& aMatrix)
-{
-	return Vector3<float>(Vector4<float>(aPoint) * aMatrix);
-}
 } // namespace
 
-TEST(CameraTest, NewCameraLooksAlongZFromFiveUnitsBack)
-{
-	Zeph::Camera lens(4.0f / 3.0f);
-	Zeph::CameraInstance camera(&lens);
-
-	EXPECT_VEC3_NEAR(camera.GetPosition(), 0.0f, 0.0f, 5.0f);
-	EXPECT_VEC3_NEAR(camera.GetForward(), 0.0f, 0.0f, 1.0f);
-	EXPECT_VEC3_NEAR(Transform(Vector3<float>(0.0f, 0.0f, 6.0f), camera.GetView()), 0.0f, 0.0f, 1.0f);
-	// The orientation is the inverse of the view: camera space back to the world.
-	EXPECT_VEC3_NEAR(Transform(Vector3<float>(0.0f, 0.0f, 1.0f), camera.GetActualOrientation()), 0.0f, 0.0f,
-	                 6.0f);
-	EXPECT_FLOAT_EQ(camera.GetFarPlane(), 1000.0f);
-
-	camera.Move(2.0f);
-	EXPECT_VEC3_NEAR(camera.GetPosition(), 0.0f, 0.0f, 7.0f);
-	camera.Strafe(1.5f);
-	EXPECT_VEC3_NEAR(camera.GetPosition(), 1.5f, 0.0f, 7.0f);
-}
-
-TEST(CameraTest, YawTurnsAboutUpAndPitchIsRefusedNearVertical)
+TEST(CameraTest, PitchTiltsTheViewAboutTheWorldUpAndIsRefusedNearVertical)
 {
 	Zeph::Camera lens(1.0f);
-	const float quarter = std::numbers::pi_v<float> / 2.0f;
-	for (const float yaw : {quarter, -quarter})
-	{
-		Zeph::CameraInstance camera(&lens);
-		camera.Yaw(yaw);
-		EXPECT_VEC3_NEAR(camera.GetForward(), yaw > 0.0f ? -1.0f : 1.0f, 0.0f, 0.0f);
-	}
 	{
 		Zeph::CameraInstance camera(&lens);
 		camera.Pitch(1.0f);
@@ -88,27 +59,11 @@ TEST(CameraTest, YawTurnsAboutUpAndPitchIsRefusedNearVertical)
 	}
 }
 
-TEST(CameraTest, SetOrientationAndLookToPlaceTheCamera)
+// The cube-face cameras of LookTo are the reflection bake's (its faces are checked there).
+TEST(CameraTest, ThePreviousViewIsKeptWhenTheCameraMoves)
 {
 	Zeph::Camera lens(1.0f);
 	Zeph::CameraInstance camera(&lens);
-
-	Matrix44<float> placed;
-	placed.SetPosition(Vector3<float>(1.0f, 2.0f, 3.0f));
-	camera.SetOrientation(placed);
-	EXPECT_VEC3_NEAR(camera.GetForward(), 0.0f, 0.0f, 1.0f);
-	EXPECT_VEC3_NEAR(camera.GetUp(), 0.0f, 1.0f, 0.0f);
-	EXPECT_VEC3_NEAR(camera.GetPosition(), 1.0f, 2.0f, 3.0f);
-
-	// A cube-face camera: looking down -Y with +Z as up, from (4, 5, 6).
-	camera.LookTo(Vector3<float>(4.0f, 5.0f, 6.0f), Vector3<float>(0.0f, -2.0f, 0.0f),
-	              Vector3<float>(0.0f, 0.0f, 1.0f));
-	EXPECT_VEC3_NEAR(camera.GetForward(), 0.0f, -1.0f, 0.0f);
-	EXPECT_VEC3_NEAR(camera.GetUp(), 0.0f, 0.0f, 1.0f);
-	EXPECT_VEC3_NEAR(camera.GetPosition(), 4.0f, 5.0f, 6.0f);
-	EXPECT_VEC3_NEAR(Transform(Vector3<float>(4.0f, 2.0f, 6.0f), camera.GetView()), 0.0f, 0.0f, 3.0f);
-	// Right = up x forward = (1, 0, 0): a point to the +X side is to the right.
-	EXPECT_VEC3_NEAR(Transform(Vector3<float>(5.0f, 5.0f, 6.0f), camera.GetView()), 1.0f, 0.0f, 0.0f);
 
 	camera.StorePreviousView();
 	const Matrix44<float> stored = camera.GetView();
@@ -124,10 +79,6 @@ TEST(CameraTest, ProjectionMapsNearAndFarToZeroAndOne)
 	camera.SetProjection(std::numbers::pi_v<float> / 2.0f, 2.0f, 1.0f, 101.0f);
 
 	const Matrix44<float>& projection = camera.GetProjection();
-	EXPECT_NEAR(projection.myMatrix[0], 0.5f, ourTolerance);
-	EXPECT_NEAR(projection.myMatrix[5], 1.0f, ourTolerance);
-	EXPECT_FLOAT_EQ(projection.myMatrix[11], 1.0f);
-	EXPECT_FLOAT_EQ(projection.myMatrix[15], 0.0f);
 	const auto depthAt = [&projection](float aZ) {
 		const Vector4<float> clip = Vector4<float>(0.0f, 0.0f, aZ, 1.0f) * projection;
 		return clip.z / clip.w;

@@ -98,34 +98,17 @@ TEST_F(DebugTest, EntryIsWrittenByteForByteAndNonFatalLevelsContinue)
 	}
 }
 
-TEST_F(DebugTest, CreateTwiceKeepsTheFirstLogAndDestroyClearsTheInstance)
-{
-	const std::string first = myScratch.File("first.txt");
-	const std::string second = myScratch.File("second.txt");
-	EXPECT_EQ(Debug::GetInstance(), nullptr);
-	ASSERT_TRUE(Debug::Create(first, std::bitset<4>(0)));
-	Debug* instance = Debug::GetInstance();
-	EXPECT_FALSE(Debug::Create(second, std::bitset<4>(8)));
-	EXPECT_EQ(Debug::GetInstance(), instance);
-	Debug::GetInstance()->CriticalErrorMessage(5, "Test::Second", "still %s", "here");
-	EXPECT_NE(CoreReport::GetCriticalHandler(), nullptr);
-	EXPECT_TRUE(Debug::Destroy());
-
-	EXPECT_EQ(Debug::GetInstance(), nullptr);
-	EXPECT_EQ(CoreReport::GetCriticalHandler(), nullptr);
-	EXPECT_FALSE(std::filesystem::exists(second));
-	EXPECT_THAT(ReadWholeFile(first), testing::HasSubstr("\"still here\n\""))
-	    << "levels 8 were not taken either";
-}
-
 // The core layer (a growing array past its counter's range, say) reports through the handler
-// that Debug installs.
-TEST_F(DebugTest, CoreReportsReachTheLogAndLongMessagesAreCutAt4095Characters)
+// that Debug installs, and takes it away again. (A Destroy that left the instance would fail
+// every later fixture's Create.)
+TEST_F(DebugTest, CoreReportsReachTheFirstLogAndLongMessagesAreCutAt4095Characters)
 {
 	const std::string log = myScratch.File("DebugLogger.txt");
 	ASSERT_TRUE(Debug::Create(log, std::bitset<4>(0)));
+	EXPECT_FALSE(Debug::Create(myScratch.File("second.txt"), std::bitset<4>(12))) << "the first log stays";
 	CoreReport::GetCriticalHandler()(1, "GrowingArray::Add", std::string(5000, 'x').c_str());
 	ASSERT_TRUE(Debug::Destroy());
+	EXPECT_EQ(CoreReport::GetCriticalHandler(), nullptr);
 	const std::string text = ReadWholeFile(log);
 	EXPECT_THAT(text,
 	            testing::HasSubstr(
@@ -167,21 +150,17 @@ TEST_F(DebugDeathTest, FatalCriticalErrorWritesAssertionBlockAndStackThenEnds)
 		lines.push_back(line);
 	}
 	ASSERT_GE(lines.size(), 6u) << report;
-	EXPECT_EQ(lines[0], "\"Assertion Failed:\"\"Critical Error Message\"");
-	EXPECT_TRUE(lines[1].starts_with("\"File:\"\"") && lines[1].ends_with('"')) << lines[1];
-	EXPECT_EQ(lines[2], "\"Function:\"\"Zeph::Engine::D3DDeviceSetup\"");
-	EXPECT_EQ(lines[3], "\"Line:\"77");
-	EXPECT_EQ(lines[4], "");
-	// The stack starts at the reporter, one "file (line): function" item per frame.
+	lines[1] = lines[1].starts_with("\"File:\"\"") && lines[1].ends_with('"') ? "(file)" : lines[1];
+	EXPECT_EQ(std::vector<std::string>(lines.begin(), lines.begin() + 5),
+	          (std::vector<std::string>{"\"Assertion Failed:\"\"Critical Error Message\"", "(file)",
+	                                    "\"Function:\"\"Zeph::Engine::D3DDeviceSetup\"", "\"Line:\"77", ""}));
+	// The stack starts at the reporter (each frame's form is the stack trace's own test).
 	const std::size_t source = lines[5].find("DebugTest.cpp (");
 	EXPECT_TRUE(source != std::string::npos &&
 	            lines[5].find("): (anonymous namespace)::FailFatally", source) != std::string::npos)
 	    << report;
 	for (std::size_t i = 5; i < lines.size(); ++i)
 	{
-		EXPECT_TRUE(lines[i].size() > 2 && lines[i].starts_with('"') && lines[i].ends_with('"') &&
-		            lines[i].find("): ") != std::string::npos)
-		    << lines[i];
 		EXPECT_EQ(lines[i].find("Debug::"), std::string::npos) << "logger frame in the stack: " << lines[i];
 	}
 }

@@ -2,6 +2,7 @@
 
 #include <filesystem>
 #include <gtest/gtest.h>
+#include <vector>
 
 #include "support/TestSupport.h"
 
@@ -30,43 +31,29 @@ protected:
 };
 } // namespace
 
-TEST_F(FI_FileTest, TextModeQuotesStringsWritesNumbersBareReadsThemBackAndSkipsCommentLines)
+// Quoted strings, whole numbers and words are the settings file's (SetupInfo's tests).
+TEST_F(FI_FileTest, TextModeWritesFloatsAsTextReadsThemBackAndSkipsCommentLines)
 {
 	const std::string name = myScratch.File("text.txt");
-	{
-		FI_File file;
-		ASSERT_TRUE(file.Open(name, WRITE));
-		EXPECT_TRUE(file.Write("a b") && file.Write(std::string("c")) && file.NewLine());
-		EXPECT_TRUE(file.Write(1.0f / 3.0f) && file.WriteWord(" ") && file.Write(-7) &&
-		            file.WriteWord(" 65535 rest of line") && file.NewLine() && file.Write(2.5));
-		ASSERT_TRUE(file.Close());
-	}
-	EXPECT_EQ(ReadWholeFile(name), "\"a b\"\"c\"\n0.333333 -7 65535 rest of line\n2.5");
-
 	FI_File file;
+	ASSERT_TRUE(file.Open(name, WRITE));
+	EXPECT_TRUE(file.Write(1.0f / 3.0f) && file.WriteWord(" 65535 rest of line") && file.NewLine() &&
+	            file.Write(2.5));
+	ASSERT_TRUE(file.Close());
+	EXPECT_EQ(ReadWholeFile(name), "0.333333 65535 rest of line\n2.5");
 	ASSERT_TRUE(file.Open(name, READ));
-	EXPECT_EQ(Next<std::string>(file), "a b");
-	EXPECT_EQ(Next<std::string>(file), "c");
 	EXPECT_FLOAT_EQ(Next<float>(file), 0.333333f);
-	EXPECT_EQ(Next<int>(file), -7);
 	EXPECT_EQ(Next<unsigned short>(file), 65535);
 	EXPECT_TRUE(file.NewLine()) << "skips the rest of the line";
 	EXPECT_DOUBLE_EQ(Next<double>(file), 2.5);
 	EXPECT_TRUE(file.Close());
 
-	// ReadWord passes over comment lines.
-	const std::string words = myScratch.File("words.txt");
-	WriteWholeFile(words, "// a comment with SURF in it\n//another\n  SURF next\n//trailing");
-
-	ASSERT_TRUE(file.Open(words, READ));
-	const auto nextWord = [&file] {
-		std::string word;
-		EXPECT_TRUE(file.ReadWord(word));
-		return word;
-	};
-	EXPECT_EQ(nextWord(), "SURF");
-	EXPECT_EQ(nextWord(), "next");
-	EXPECT_EQ(nextWord(), "") << "a file ending in a comment has no further word";
+	// ReadWord passes over comment lines; a file ending in one has no further word.
+	WriteWholeFile(name, "// a comment with SURF in it\n//another\n  SURF next\n//trailing");
+	ASSERT_TRUE(file.Open(name, READ));
+	std::string words[3] = {"", "", "not cleared"};
+	EXPECT_TRUE(file.ReadWord(words[0]) && file.ReadWord(words[1]) && file.ReadWord(words[2]));
+	EXPECT_EQ(std::vector<std::string>(words, words + 3), (std::vector<std::string>{"SURF", "next", ""}));
 }
 
 TEST_F(FI_FileTest, BinaryWritesRawLittleEndianBytesAndReadsThemBack)
@@ -101,7 +88,8 @@ TEST_F(FI_FileTest, BinaryWritesRawLittleEndianBytesAndReadsThemBack)
 	EXPECT_TRUE(file.Close()) << "every read stayed inside the file";
 }
 
-TEST_F(FI_FileTest, CorruptLengthFailsAtCloseAndAReopenStartsClean)
+// GetFileSize, which rewinds, is read before every compiled effect and baked volume.
+TEST_F(FI_FileTest, CorruptLengthFailsAtClose)
 {
 	const std::string name = myScratch.File("corrupt.bin");
 	WriteWholeFile(name, std::string("\xff\xff\xff\x7f"
@@ -112,22 +100,15 @@ TEST_F(FI_FileTest, CorruptLengthFailsAtCloseAndAReopenStartsClean)
 	ASSERT_TRUE(file.Open(name, READ | BINARY));
 	EXPECT_EQ(Next<std::string>(file, "old"), "") << "no 2 GiB string was built; the call still returns true";
 	EXPECT_FALSE(file.Close()) << "the caller learns of the bad length at Close";
-
-	// GetFileSize counts from the read position and rewinds to the start.
-	ASSERT_TRUE(file.Open(name, READ | BINARY));
-	EXPECT_EQ(file.GetFileSize(), 7);
-	char bytes[3] = {};
-	EXPECT_TRUE(file.ReadData(bytes, 3));
-	EXPECT_EQ(file.GetFileSize(), 4);
-	EXPECT_TRUE(file.ReadData(bytes, 3));
-	EXPECT_EQ(std::string(bytes, 3), "\xff\xff\xff");
-	EXPECT_TRUE(file.Close());
 }
 
-TEST_F(FI_FileTest, OperationsWithoutTheirFlagAreRefusedAndTouchNothing)
+// Creating folders and truncating are the settings file's (SetupInfo's tests write one file into
+// a new folder, longer then shorter); finding a file whatever the case of its name is the path
+// resolver's, seen in every data load.
+TEST_F(FI_FileTest, OperationsWithoutTheirFlagAreRefusedAndAppendWritesAfterTheFile)
 {
 	const std::string name = myScratch.File("flags.txt");
-	WriteWholeFile(name, "\"kept\" 5\n");
+	WriteWholeFile(name, "\"kept\" ");
 	std::string text;
 	char byte = 0;
 	FI_File file;
@@ -136,13 +117,12 @@ TEST_F(FI_FileTest, OperationsWithoutTheirFlagAreRefusedAndTouchNothing)
 	             file.ReadData(&byte, 1));
 	EXPECT_EQ(Next<std::string>(file), "kept") << "the refused calls moved nothing";
 	EXPECT_TRUE(file.Close());
-	EXPECT_EQ(ReadWholeFile(name), "\"kept\" 5\n");
 
-	ASSERT_TRUE(file.Open(name, WRITE));
+	ASSERT_TRUE(file.Open(name, WRITE | APPEND));
 	EXPECT_FALSE(file.Read(text) || file.ReadWord(text) || file.WriteData("raw", 3));
+	EXPECT_TRUE(file.Write(5));
 	EXPECT_TRUE(file.Close());
-	EXPECT_EQ(ReadWholeFile(name), "") << "WriteData wrote nothing into the truncated file";
-	EXPECT_FALSE(FI_File().Write("x")) << "nothing is written to a file never opened";
+	EXPECT_EQ(ReadWholeFile(name), "\"kept\" 5") << "the refused calls wrote nothing";
 }
 
 TEST_F(FI_FileTest, OpenReportsBadFlagsAndUnopenableFiles)
@@ -167,23 +147,6 @@ TEST_F(FI_FileTest, OpenReportsBadFlagsAndUnopenableFiles)
 		EXPECT_FALSE(file.Write("lost")) << "nothing is written after a failed open";
 	}
 	EXPECT_FALSE(std::filesystem::exists(myScratch.File("a.txt")));
-}
-
-// Finding a file whatever the case of its name is the path resolver's, seen in every data load.
-TEST_F(FI_FileTest, OpenCreatesDirectoriesAppendsAndTruncates)
-{
-	const std::string written = myScratch.File("data/Misc/new.txt");
-	FI_File file;
-	ASSERT_TRUE(file.Open(written, WRITE));
-	EXPECT_TRUE(file.WriteWord("first "));
-	ASSERT_TRUE(file.Close());
-	ASSERT_TRUE(file.Open(written, WRITE | APPEND));
-	EXPECT_TRUE(file.Write(5));
-	ASSERT_TRUE(file.Close());
-	EXPECT_EQ(ReadWholeFile(written), "first 5");
-	ASSERT_TRUE(file.Open(written, WRITE));
-	ASSERT_TRUE(file.Close());
-	EXPECT_EQ(ReadWholeFile(written), "") << "plain write truncates";
 }
 
 TEST_F(FI_FileTest, WritesFlushAndCloseReportADiskThatRefusesThem)

@@ -1,8 +1,8 @@
 // Textures through the engine's container: sharing by name, retrying missing files,
 // the sRGB conversion, cube and volume files, render-target textures.
 
-#include <cstring>
 #include <filesystem>
+#include <tuple>
 
 #include "EngineFixture.h"
 #include "engine/Texture.h"
@@ -11,34 +11,20 @@
 
 namespace
 {
-// Writes a DDS file of one colour per slice and mip (RGBA8 bytes: slice, mip, 0x80, 0xff).
+// Writes a DDS file of two mips (of no particular colour).
 void WriteDds(const std::string& aPath, Dds::Format aFormat, uint32_t aSize, uint32_t anArraySize,
               uint32_t aDepth, uint32_t someMisc)
 {
 	const auto dimension = aDepth > 1 ? Dds::ResourceDimension::Texture3D : Dds::ResourceDimension::Texture2D;
-	const Dds::ImageInfo info{aSize, aSize, aDepth, anArraySize, 2, someMisc, aFormat, dimension};
 	Dds::Image image;
 	std::string error;
-	ASSERT_TRUE(image.Init(info, error)) << error;
-	for (uint32_t item = 0; item < anArraySize; ++item)
-	{
-		for (uint32_t mip = 0; mip < info.myMipLevels; ++mip)
-		{
-			uint8_t* bytes = image.Data(mip, item);
-			const uint64_t size = image.SubresourceSize(mip);
-			for (uint64_t at = 0; at + 3 < size; at += 4)
-			{
-				const uint8_t texel[4] = {static_cast<uint8_t>(item * 40), static_cast<uint8_t>(mip * 100),
-				                          0x80, 0xff};
-				std::memcpy(bytes + at, texel, 4);
-			}
-		}
-	}
+	ASSERT_TRUE(image.Init({aSize, aSize, aDepth, anArraySize, 2, someMisc, aFormat, dimension}, error))
+	    << error;
 	ASSERT_TRUE(Dds::SaveToFile(aPath, image, error)) << error;
 }
 } // namespace
 
-TEST_F(EngineTest, TheSameNameGivesTheSameTextureAndAMissingFileIsTriedAgain)
+TEST_F(EngineTest, TexturesAreSharedByNameRetriedWhenMissingAndViewedAsTheFileAndTheSrgbFlagSay)
 {
 	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	Zeph::TextureContainer& container = Zeph::Engine::GetInstance()->GetTextureContainer();
@@ -55,9 +41,7 @@ TEST_F(EngineTest, TheSameNameGivesTheSameTextureAndAMissingFileIsTriedAgain)
 	WriteDds(path, Dds::Format::R8G8B8A8_UNORM, 16, 1, 1, 0);
 	Zeph::Texture* texture = container.GetTexture(path, false);
 	ASSERT_NE(texture, nullptr) << "the second request tries the file again";
-	EXPECT_EQ(texture->GetFileName(), path);
 	EXPECT_EQ(texture->GetImageInfo().myWidth, 16u);
-	EXPECT_EQ(texture->GetImageInfo().myMipLevels, 2u);
 
 	std::filesystem::remove(path);
 	EXPECT_EQ(container.GetTexture(path, true), texture) << "the second request does not touch the file";
@@ -79,11 +63,7 @@ TEST_F(EngineTest, TheSameNameGivesTheSameTextureAndAMissingFileIsTriedAgain)
 	EXPECT_EQ(ddsOnly.GetTexture(myScratch.File("textures/albedo.png"), false), nullptr);
 	EXPECT_THAT(TakeLog(), testing::HasSubstr("Not a texture file this container takes"));
 	EXPECT_NE(ddsOnly.GetTexture(path, false), nullptr);
-}
 
-TEST_F(EngineTest, TexturesLoadWithSrgbAndCubeViewsReportOtherDimensionsAndRenderTargetsHaveBothViews)
-{
-	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
 	const struct
 	{
 		const char* name;
@@ -96,26 +76,17 @@ TEST_F(EngineTest, TexturesLoadWithSrgbAndCubeViewsReportOtherDimensionsAndRende
 		GLenum viewTarget;
 		bool reported;
 	} cases[] = {
-	    {"plain.dds", Dds::Format::R8G8B8A8_UNORM, 1, 1, 0, false, Dds::Format::R8G8B8A8_UNORM, GL_TEXTURE_2D,
-	     false},
 	    {"srgb.dds", Dds::Format::R8G8B8A8_UNORM, 1, 1, 0, true, Dds::Format::R8G8B8A8_UNORM_SRGB,
 	     GL_TEXTURE_2D, false},
-	    {"stored-srgb.dds", Dds::Format::R8G8B8A8_UNORM_SRGB, 1, 1, 0, false,
-	     Dds::Format::R8G8B8A8_UNORM_SRGB, GL_TEXTURE_2D, false},
 	    {"bc1.dds", Dds::Format::BC1_UNORM, 1, 1, 0, true, Dds::Format::BC1_UNORM_SRGB, GL_TEXTURE_2D, false},
 	    {"float.dds", Dds::Format::R16G16B16A16_FLOAT, 1, 1, 0, true, Dds::Format::R16G16B16A16_FLOAT,
 	     GL_TEXTURE_2D, false},
 	    {"cube.dds", Dds::Format::R8G8B8A8_UNORM, 6, 1, Dds::MiscTextureCube, false,
 	     Dds::Format::R8G8B8A8_UNORM, GL_TEXTURE_CUBE_MAP, false},
-	    {"srgb-cube.dds", Dds::Format::R8G8B8A8_UNORM, 6, 1, Dds::MiscTextureCube, true,
-	     Dds::Format::R8G8B8A8_UNORM_SRGB, GL_TEXTURE_CUBE_MAP, false},
-	    {"array.dds", Dds::Format::R8G8B8A8_UNORM, 3, 1, 0, false, Dds::Format::R8G8B8A8_UNORM, GL_TEXTURE_2D,
-	     false},
 	    // Only 2D files are converted, but the flag is not dropped: the volume is viewed as sRGB.
 	    {"volume.dds", Dds::Format::R8G8B8A8_UNORM, 1, 4, 0, true, Dds::Format::R8G8B8A8_UNORM_SRGB,
 	     GL_TEXTURE_3D, true},
 	};
-	Zeph::TextureContainer& container = Zeph::Engine::GetInstance()->GetTextureContainer();
 	for (const auto& test : cases)
 	{
 		SCOPED_TRACE(test.name);
@@ -138,10 +109,9 @@ TEST_F(EngineTest, TexturesLoadWithSrgbAndCubeViewsReportOtherDimensionsAndRende
 	Zeph::Texture target(96, 48, Dds::Format::R16G16B16A16_FLOAT);
 	ASSERT_NE(target.GetRenderTargetView(), nullptr);
 	ASSERT_NE(target.GetShaderResourceView(), nullptr);
-	EXPECT_EQ(target.GetRenderTargetView()->GetWidth(), 96);
-	EXPECT_EQ(target.GetShaderResourceView()->GetFormat(), Dds::Format::R16G16B16A16_FLOAT);
-	EXPECT_EQ(target.GetImageInfo().myWidth, 96u);
-	EXPECT_EQ(target.GetImageInfo().myHeight, 48u);
+	EXPECT_EQ(std::tuple(target.GetRenderTargetView()->GetWidth(),
+	                     target.GetShaderResourceView()->GetFormat(), target.GetImageInfo().myHeight),
+	          std::tuple(96, Dds::Format::R16G16B16A16_FLOAT, 48u));
 
 	Zeph::Texture broken(0, 48, Dds::Format::R8G8B8A8_UNORM);
 	EXPECT_EQ(broken.GetRenderTargetView(), nullptr);
