@@ -1,5 +1,4 @@
 #include "platform/gpu/Buffer.h"
-#include "platform/gpu/Formats.h"
 #include "platform/gpu/Readback.h"
 
 #include <cstdio>
@@ -14,34 +13,26 @@ namespace
 {
 using DeviceTest = GpuTest;
 
-TEST_F(DeviceTest, ContextIsCoreProfile45WithDirect3DConventions)
+// Direct3D's conventions are set once on the context; the renderer never sets them again.
+TEST_F(DeviceTest, ContextFollowsDirect3DAndBadInitIsReportedNotFatal)
 {
-	// Each query and the value Direct3D's conventions need (the version as major * 10 + minor).
-	const struct
-	{
-		GLenum myQuery;
-		GLint myExpected;
-	} states[] = {{GL_CLIP_ORIGIN, GL_UPPER_LEFT},
-	              {GL_CLIP_DEPTH_MODE, GL_ZERO_TO_ONE},
-	              {GL_FRONT_FACE, GL_CW},
-	              {GL_CULL_FACE_MODE, GL_BACK},
-	              {GL_CONTEXT_PROFILE_MASK, GL_CONTEXT_CORE_PROFILE_BIT}};
-	for (const auto& state : states)
+	for (const auto& [query, expected] : {std::pair<GLenum, GLint>{GL_CLIP_ORIGIN, GL_UPPER_LEFT},
+	                                      {GL_CLIP_DEPTH_MODE, GL_ZERO_TO_ONE},
+	                                      {GL_FRONT_FACE, GL_CW}})
 	{
 		GLint value = 0;
-		glGetIntegerv(state.myQuery, &value);
-		EXPECT_EQ(value, state.myExpected) << std::hex << state.myQuery;
+		glGetIntegerv(query, &value);
+		EXPECT_EQ(value, expected) << std::hex << query;
 	}
-	GLint major = 0;
-	GLint minor = 0;
-	glGetIntegerv(GL_MAJOR_VERSION, &major);
-	glGetIntegerv(GL_MINOR_VERSION, &minor);
-	EXPECT_GE(major * 10 + minor, 45);
-	EXPECT_FALSE(myDevice.GetRendererName().empty());
-	EXPECT_NE(myDevice.GetVersionName().find("4."), std::string::npos) << myDevice.GetVersionName();
-
-	EXPECT_TRUE(glIsEnabled(GL_CULL_FACE));
 	EXPECT_TRUE(glIsEnabled(GL_TEXTURE_CUBE_MAP_SEAMLESS));
+
+	EXPECT_FALSE(myDevice.Init(64, 64));
+	Gpu::Device other;
+	EXPECT_FALSE(other.Init(0, 32));
+	ExpectReports({{"already initialized"}, {"Gpu::Device::Init: Bad back-buffer size 0x32"}});
+	// The failed device left the shared display alone.
+	EXPECT_TRUE(myDevice.MakeCurrent());
+	EXPECT_NE(MakeTarget(Dds::Format::R8G8B8A8_UNORM, 4, 4), nullptr);
 }
 
 TEST_F(DeviceTest, ContextMovesBetweenThreads)
@@ -69,54 +60,9 @@ TEST_F(DeviceTest, ContextMovesBetweenThreads)
 	EXPECT_EQ(PixelAt(ReadPixels(*view), 8, 7, 7), (Pixel{0, 255, 0, 255}));
 }
 
-TEST_F(DeviceTest, BadInitIsReportedNotFatal)
-{
-	EXPECT_FALSE(myDevice.Init(64, 64));
-	Gpu::Device other;
-	EXPECT_FALSE(other.Init(0, 32));
-	ExpectReports({{"already initialized"}, {"Gpu::Device::Init: Bad back-buffer size 0x32"}});
-	// The failed device left the shared display alone.
-	EXPECT_TRUE(myDevice.MakeCurrent());
-	EXPECT_NE(MakeTarget(Dds::Format::R8G8B8A8_UNORM, 4, 4), nullptr);
-}
-
-// Every format the engine uses makes storage of the intended GL format and
-// accepts an upload of its own layout.
-TEST_F(DeviceTest, EveryEngineFormatMapsToWorkingStorage)
-{
-	// By number, as files carry them: the enum must keep DXGI's values.
-	const uint32_t numbers[] = {28, 29, 27, 87, 91, 71, 72, 74, 75, 77, 78,
-	                            10, 41, 2,  34, 26, 24, 61, 54, 45, 40};
-	for (const uint32_t number : numbers)
-	{
-		const Dds::Format format = static_cast<Dds::Format>(number);
-		SCOPED_TRACE(number);
-		const Gpu::FormatInfo info = Gpu::GetFormatInfo(format);
-		ASSERT_TRUE(info.IsSupported());
-		Gpu::Texture* texture = MakeTarget(format, 8, 8);
-		ASSERT_NE(texture, nullptr);
-		GLint internalFormat = 0;
-		glGetTextureLevelParameteriv(texture->GetName(), 0, GL_TEXTURE_INTERNAL_FORMAT, &internalFormat);
-		EXPECT_EQ(static_cast<GLenum>(internalFormat), info.myInternalFormat);
-
-		while (glGetError() != GL_NO_ERROR)
-		{
-		}
-		const std::vector<uint8_t> zeros(info.RowBytes(8) * info.BlockRows(8));
-		EXPECT_TRUE(texture->Upload(0, 0, zeros.data(), info.RowBytes(8)));
-		EXPECT_EQ(glGetError(), static_cast<GLenum>(GL_NO_ERROR));
-	}
-	EXPECT_EQ(Gpu::GetFormatInfo(static_cast<Dds::Format>(42)).RowBytes(7), 0u);
-	EXPECT_EQ(Gpu::GetFormatInfo(Dds::Format::BC1_UNORM).RowBytes(7), 16u); // two 8-byte blocks
-	EXPECT_EQ(Gpu::GetFormatInfo(Dds::Format::BC1_UNORM).BlockRows(5), 2u);
-}
-
 TEST_F(DeviceTest, UnsupportedFormatAndBadDescriptionsFailCleanly)
 {
-	constexpr Dds::Format outOfEnum = static_cast<Dds::Format>(9999);
-	static_assert(!Gpu::GetFormatInfo(Dds::Format::UNKNOWN).IsSupported() &&
-	              !Gpu::GetFormatInfo(outOfEnum).IsSupported());
-	EXPECT_EQ(MakeTarget(outOfEnum, 8, 8), nullptr);
+	EXPECT_EQ(MakeTarget(static_cast<Dds::Format>(9999), 8, 8), nullptr);
 	EXPECT_EQ(MakeTexture({.myKind = Gpu::TextureKind::TextureCube,
 	                       .myWidth = 8,
 	                       .myHeight = 4,
@@ -129,50 +75,39 @@ TEST_F(DeviceTest, UnsupportedFormatAndBadDescriptionsFailCleanly)
 	Gpu::Texture* texture = MakeTarget(Dds::Format::R8G8B8A8_UNORM, 8, 8);
 	ASSERT_NE(texture, nullptr);
 	EXPECT_EQ(texture->CreateRenderTargetView({.myFormat = Dds::Format::R16G16B16A16_FLOAT}), nullptr);
-	EXPECT_EQ(texture->CreateRenderTargetView({.myMip = 1}), nullptr);
 	EXPECT_EQ(texture->CreateDepthStencilView(), nullptr);
 	const uint8_t row[4] = {};
 	EXPECT_FALSE(texture->Upload(0, 0, row, 4)); // a pitch shorter than a row
-
 	ExpectReports({{"unsupported DXGI format 9999"},
 	               {"'oblong cube' needs square faces"},
 	               {"5 mips asked, 8x8x1 has 4"},
 	               {"(format 28): no render target of format 10"},
 	               {},
-	               {},
 	               {"row pitch 4 below the 32 bytes"}});
 }
 
+// Buffers start zeroed; only dynamic ones take updates, and only inside their size.
 TEST_F(DeviceTest, BuffersStartZeroAndOnlyDynamicOnesChange)
 {
 	const uint32_t initial[4] = {1, 2, 3, 4};
-	Gpu::Buffer fixed;
-	ASSERT_TRUE(fixed.Init({.myKind = Gpu::BufferKind::Vertex, .mySize = sizeof(initial), .myLabel = "fixed"},
-	                       initial));
-	Gpu::Buffer dynamic;
+	Gpu::Buffer& fixed = myBuffers.emplace_back();
+	ASSERT_TRUE(fixed.Init({.mySize = sizeof(initial), .myLabel = "fixed"}, initial));
+	Gpu::Buffer& dynamic = myBuffers.emplace_back();
 	ASSERT_TRUE(dynamic.Init(
 	    {.myKind = Gpu::BufferKind::Constant, .mySize = 16, .myDynamicFlag = true, .myLabel = "dynamic"},
 	    nullptr));
-
-	uint32_t contents[4] = {9, 9, 9, 9};
-	glGetNamedBufferSubData(dynamic.GetName(), 0, sizeof(contents), contents);
-	EXPECT_EQ(contents[0] | contents[1] | contents[2] | contents[3], 0u);
-
 	const uint32_t update[2] = {7, 8};
 	EXPECT_TRUE(dynamic.Update(update, sizeof(update), 8));
-	glGetNamedBufferSubData(dynamic.GetName(), 0, sizeof(contents), contents);
-	EXPECT_EQ(contents[1], 0u);
-	EXPECT_EQ(contents[2], 7u);
-	EXPECT_EQ(contents[3], 8u);
-
 	EXPECT_FALSE(dynamic.Update(update, sizeof(update), 12)); // past the end
 	EXPECT_FALSE(fixed.Update(update, sizeof(update)));
-	glGetNamedBufferSubData(fixed.GetName(), 0, sizeof(contents), contents);
-	EXPECT_EQ(contents[0], 1u);
-	EXPECT_EQ(contents[3], 4u);
 	ExpectReports({{}, {"'fixed' (16 bytes, immutable)"}});
-	fixed.Destroy();
-	dynamic.Destroy();
+	for (const auto& [buffer, expected] : {std::pair{&dynamic, std::array<uint32_t, 4>{0, 0, 7, 8}},
+	                                       std::pair{&fixed, std::array<uint32_t, 4>{1, 2, 3, 4}}})
+	{
+		std::array<uint32_t, 4> contents{9, 9, 9, 9};
+		glGetNamedBufferSubData(buffer->GetName(), 0, sizeof(contents), contents.data());
+		EXPECT_EQ(contents, expected);
+	}
 }
 } // namespace
 
@@ -240,9 +175,4 @@ TEST(DeviceFailureTest, OlderGlIsVersionTooLowNotNoDevice)
 	EXPECT_EQ(older.myExitCode, static_cast<int>(Gpu::DeviceFailure::VersionTooLow)) << older.myOutput;
 	EXPECT_NE(older.myOutput.find("OpenGL 4.5 core profile is needed"), std::string::npos) << older.myOutput;
 	EXPECT_NE(older.myOutput.find("version '4.1"), std::string::npos) << older.myOutput;
-
-	// The same child with the driver's own version initializes: the probe itself is sound.
-	const ProbeResult current = RunProbe("4.5");
-	EXPECT_EQ(current.myExitCode, static_cast<int>(Gpu::DeviceFailure::None)) << current.myOutput;
-	EXPECT_NE(current.myOutput.find("probe: initialized"), std::string::npos) << current.myOutput;
 }

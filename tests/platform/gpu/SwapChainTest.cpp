@@ -31,47 +31,13 @@ Pixel Stored(const float aColor[4], Dds::Format aFormat)
 }
 
 constexpr float ourClearColor[4] = {0.6f, 0.2f, 1.0f, 1.0f};
-constexpr float ourQuadColor[4] = {1.0f, 0.6f, 0.0f, 1.0f};
+constexpr float ourQuadColor[4] = {1.0f, 0.6f, 0.0f, 1.0f}; // the window program's colour
 } // namespace
 
 using SwapChainTest = GpuTest;
 
-// Resizing with UNKNOWN keeps the format; the last case changes it.
-TEST_F(SwapChainTest, HeadlessBackBufferIsARenderTargetThatResizeBuffersReplaces)
-{
-	using Dds::Format;
-	const std::pair<Format, Format> cases[] = {{Format::R8G8B8A8_UNORM_SRGB, Format::UNKNOWN},
-	                                           {Format::R8G8B8A8_UNORM, Format::UNKNOWN},
-	                                           {Format::B8G8R8A8_UNORM_SRGB, Format::UNKNOWN},
-	                                           {Format::R8G8B8A8_UNORM_SRGB, Format::B8G8R8A8_UNORM}};
-	for (const auto& [initial, resized] : cases)
-	{
-		const Format format = resized == Format::UNKNOWN ? initial : resized;
-		SCOPED_TRACE(Dds::FormatName(format));
-		Gpu::SwapChain swapChain;
-		ASSERT_TRUE(swapChain.Init(myDevice, 32, 16, initial));
-		Gpu::RenderTargetView* views[] = {swapChain.GetBuffer()->CreateRenderTargetView()};
-		ASSERT_TRUE(GetContext().SetRenderTargets(views, nullptr));
-		const size_t framebufferCount = GetContext().GetFramebufferCache().GetEntryCount();
-
-		ASSERT_TRUE(swapChain.ResizeBuffers(48, 20, resized));
-		EXPECT_EQ(swapChain.GetFormat(), format);
-		// The old view's framebuffer went with it, so nothing can draw into freed storage.
-		EXPECT_EQ(GetContext().GetFramebufferCache().GetEntryCount(), framebufferCount - 1);
-		Gpu::RenderTargetView* view = swapChain.GetBuffer()->CreateRenderTargetView();
-		ASSERT_NE(view, nullptr);
-		GetContext().ClearRenderTargetView(*view, ourClearColor);
-		const std::vector<uint8_t> bytes = ReadPixels(*view);
-		EXPECT_EQ(bytes.size(), 48u * 20u * 4u);
-		EXPECT_EQ(PixelAt(bytes, 48, 47, 19), Stored(ourClearColor, format));
-		EXPECT_TRUE(swapChain.Present(0));
-		EXPECT_TRUE(swapChain.Present(1));
-		swapChain.Destroy();
-		EXPECT_EQ(swapChain.GetBuffer(), nullptr);
-	}
-}
-
-TEST_F(SwapChainTest, BadRequestsAreReportedAndChangeNothing)
+// A refused request changes nothing; a resize replaces the back buffer, keeping its format unless told.
+TEST_F(SwapChainTest, BadRequestsAreReportedAndChangeNothingAndResizeBuffersReplaces)
 {
 	Gpu::SwapChain swapChain;
 	EXPECT_FALSE(swapChain.Present(0));
@@ -83,25 +49,41 @@ TEST_F(SwapChainTest, BadRequestsAreReportedAndChangeNothing)
 	EXPECT_EQ(swapChain.GetBuffer(), nullptr);
 	EXPECT_EQ(TakeReports().size(), 5u);
 
-	ASSERT_TRUE(swapChain.Init(myDevice, 8, 4, Dds::Format::R8G8B8A8_UNORM));
-	Gpu::RenderTargetView* view = swapChain.GetBuffer()->CreateRenderTargetView();
+	ASSERT_TRUE(swapChain.Init(myDevice, 8, 4, Dds::Format::R8G8B8A8_UNORM_SRGB));
+	Gpu::RenderTargetView* views[] = {swapChain.GetBuffer()->CreateRenderTargetView()};
+	Gpu::RenderTargetView* view = views[0];
 	EXPECT_FALSE(swapChain.Init(myDevice, 8, 4, Dds::Format::R8G8B8A8_UNORM));
 	EXPECT_FALSE(swapChain.ResizeBuffers(16, 16, Dds::Format::R32_FLOAT));
-	EXPECT_FALSE(swapChain.ResizeBuffers(-1, 4, Dds::Format::UNKNOWN));
 	EXPECT_FALSE(swapChain.ResizeBuffers(1 << 20, 4, Dds::Format::UNKNOWN));
 	EXPECT_FALSE(swapChain.Present(5));
-	EXPECT_FALSE(swapChain.Present(-1));
 	ExpectReports({{"Gpu::SwapChain::Init: The swap chain is already initialized"},
 	               {"Gpu::SwapChain::ResizeBuffers: Cannot make a 16x16 back buffer of format 41"},
 	               {"ResizeBuffers"},
-	               {"ResizeBuffers"},
-	               {"Gpu::SwapChain::Present: Bad sync interval 5"},
-	               {"Present"}});
+	               {"Gpu::SwapChain::Present: Bad sync interval 5"}});
 
 	// The refused resizes left the buffer and its view alone.
 	EXPECT_EQ(swapChain.GetWidth(), 8);
 	GetContext().ClearRenderTargetView(*view, ourClearColor);
-	EXPECT_EQ(PixelAt(ReadPixels(*view), 8, 7, 3), Stored(ourClearColor, Dds::Format::R8G8B8A8_UNORM));
+	EXPECT_EQ(PixelAt(ReadPixels(*view), 8, 7, 3), Stored(ourClearColor, Dds::Format::R8G8B8A8_UNORM_SRGB));
+
+	for (const Dds::Format format : {Dds::Format::R8G8B8A8_UNORM_SRGB, Dds::Format::B8G8R8A8_UNORM})
+	{
+		SCOPED_TRACE(Dds::FormatName(format));
+		ASSERT_TRUE(GetContext().SetRenderTargets(views, nullptr));
+		const size_t framebufferCount = GetContext().GetFramebufferCache().GetEntryCount();
+		ASSERT_TRUE(swapChain.ResizeBuffers(
+		    48, 20, format == Dds::Format::B8G8R8A8_UNORM ? format : Dds::Format::UNKNOWN));
+		EXPECT_EQ(swapChain.GetFormat(), format);
+		// The old view's framebuffer went with it, so nothing can draw into freed storage.
+		EXPECT_EQ(GetContext().GetFramebufferCache().GetEntryCount(), framebufferCount - 1);
+		views[0] = swapChain.GetBuffer()->CreateRenderTargetView();
+		ASSERT_NE(views[0], nullptr);
+		GetContext().ClearRenderTargetView(*views[0], ourClearColor);
+		const std::vector<uint8_t> bytes = ReadPixels(*views[0]);
+		EXPECT_EQ(bytes.size(), 48u * 20u * 4u);
+		EXPECT_EQ(PixelAt(bytes, 48, 47, 19), Stored(ourClearColor, format));
+	}
+	EXPECT_TRUE(swapChain.Present(1));
 	swapChain.Destroy();
 }
 
@@ -152,14 +134,11 @@ protected:
 		}
 		ASSERT_EQ(attributes.map_state, IsViewable);
 		// The quad needs no vertex buffer: its corners come from gl_VertexID.
-		const std::string fragment = "#version 450 core\nout vec4 oColor;\nvoid main() { oColor = vec4(" +
-		                             std::to_string(ourQuadColor[0]) + ", " +
-		                             std::to_string(ourQuadColor[1]) + ", " +
-		                             std::to_string(ourQuadColor[2]) + ", 1.0); }\n";
-		myProgram = LinkProgram(R"(#version 450 core
+		myProgram = LinkProgram(
+		    R"(#version 450 core
 const vec2 corners[4] = vec2[](vec2(-1.0, 1.0), vec2(1.0, 1.0), vec2(-1.0, 0.0), vec2(1.0, 0.0));
 void main() { gl_Position = vec4(corners[gl_VertexID], 0.5, 1.0); })",
-		                        fragment.c_str());
+		    "#version 450 core\nout vec4 oColor;\nvoid main() { oColor = vec4(1.0, 0.6, 0.0, 1.0); }");
 	}
 
 	void TearDown() override
@@ -275,17 +254,11 @@ TEST_F(SwapChainWindowTest, PresentShowsTheBackBufferUprightWithItsBytesAndFollo
 		}
 		ASSERT_TRUE(presentedFlag);
 
+		// Every byte arrives as the back buffer stored it (sRGB-encoded, not decoded or encoded
+		// again), upright: the quad in the top half of the view is in the top half of the window.
 		const std::vector<uint8_t> window = ReadWindow(320, 240);
-		const Pixel quad = Stored(ourQuadColor, format);
-		const Pixel clear = Stored(ourClearColor, format);
-		// Direct3D's orientation: the top rows of the view are the top rows of the window.
-		EXPECT_EQ(PixelAt(window, 320, 0, 0), quad);
-		EXPECT_EQ(PixelAt(window, 320, 319, 119), quad);
-		EXPECT_EQ(PixelAt(window, 320, 0, 120), clear);
-		EXPECT_EQ(PixelAt(window, 320, 319, 239), clear);
-		// Every byte arrives as the back buffer stored it (sRGB-encoded, not decoded or encoded again).
 		EXPECT_TRUE(window == TestSupport::Opaque(myBackBuffer));
-		Gpu::SavePng("/tmp/lumora-swapchain-window.png", 320, 240, window.data());
+		EXPECT_EQ(PixelAt(window, 320, 0, 0), Stored(ourQuadColor, format));
 		mySwapChain.Destroy();
 	}
 
@@ -297,9 +270,7 @@ TEST_F(SwapChainWindowTest, PresentShowsTheBackBufferUprightWithItsBytesAndFollo
 	EXPECT_EQ(mySwapChain.GetHeight(), 300);
 	DrawFrame(ourClearColor);
 	ASSERT_TRUE(mySwapChain.Present(1));
-	std::vector<uint8_t> window = ReadWindow(400, 300);
-	EXPECT_TRUE(window == TestSupport::Opaque(myBackBuffer));
-	Gpu::SavePng("/tmp/lumora-swapchain-resized.png", 400, 300, window.data());
+	EXPECT_TRUE(ReadWindow(400, 300) == TestSupport::Opaque(myBackBuffer));
 
 	// A back buffer smaller than the window is stretched over all of it.
 	const float blackColor[4] = {0.0f, 0.0f, 0.0f, 1.0f};
@@ -308,14 +279,11 @@ TEST_F(SwapChainWindowTest, PresentShowsTheBackBufferUprightWithItsBytesAndFollo
 	ASSERT_TRUE(mySwapChain.Present(0));
 	const Pixel quad = Stored(ourQuadColor, Dds::Format::R8G8B8A8_UNORM_SRGB);
 	const Pixel black = {0, 0, 0, 255};
-	window = ReadWindow(400, 300, [&](const std::vector<uint8_t>& someShown) {
+	const std::vector<uint8_t> window = ReadWindow(400, 300, [&](const std::vector<uint8_t>& someShown) {
 		return PixelAt(someShown, 400, 399, 0) == quad && PixelAt(someShown, 400, 0, 299) == black;
 	});
-	EXPECT_EQ(PixelAt(window, 400, 399, 0), quad);
 	EXPECT_EQ(PixelAt(window, 400, 399, 140), quad);
 	EXPECT_EQ(PixelAt(window, 400, 399, 160), black);
-	EXPECT_EQ(PixelAt(window, 400, 0, 299), black);
-	Gpu::SavePng("/tmp/lumora-swapchain-stretched.png", 400, 300, window.data());
 }
 
 TEST_F(SwapChainWindowTest, BadWindowOrDisplayIsReportedNotFatal)
@@ -329,7 +297,6 @@ TEST_F(SwapChainWindowTest, BadWindowOrDisplayIsReportedNotFatal)
 	};
 	const Case cases[] = {
 	    {display.c_str(), 0x3fffffff, "does not exist on X display"},
-	    {display.c_str(), DefaultRootWindow(myDisplay) + 0x123456, "does not exist on X display"},
 	    {":997", myWindow, "Cannot open the X display ':997'"},
 	    {nullptr, myWindow, "$DISPLAY is not set"},
 	};

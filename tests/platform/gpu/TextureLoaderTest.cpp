@@ -47,28 +47,6 @@ Bytes Bc1Block(uint16_t aColor0, uint16_t aColor1, uint8_t anIndex)
 	        indices,          indices};
 }
 
-// A BC3 alpha block: two endpoints and one 3-bit index for all 16 pixels.
-Bytes Bc3AlphaBlock(uint8_t anAlpha0, uint8_t anAlpha1, uint64_t anIndex)
-{
-	Bytes block = {anAlpha0, anAlpha1};
-	for (int byte = 0; byte < 6; ++byte)
-	{
-		uint64_t bits = 0;
-		for (int pixel = 0; pixel < 16; ++pixel)
-		{
-			bits |= anIndex << (3 * pixel);
-		}
-		block.push_back(static_cast<uint8_t>(bits >> (8 * byte)));
-	}
-	return block;
-}
-
-Bytes Concat(Bytes aFirst, const Bytes& aSecond)
-{
-	aFirst.insert(aFirst.end(), aSecond.begin(), aSecond.end());
-	return aFirst;
-}
-
 template <typename Value, size_t Count> Bytes BytesOf(const std::array<Value, Count>& someValues)
 {
 	Bytes bytes(sizeof(someValues));
@@ -125,8 +103,7 @@ protected:
 
 // Every array item (layer, cube face), mip and volume slice gets its own colour,
 // and a shader sampling it must get that colour back: the subresources reached
-// GL in their places. The 2D array colours the top and bottom halves of each
-// mip apart, since row 0 of the file is the top of the texture (v = 0).
+// GL in their places.
 TEST_F(TextureLoaderTest, EveryItemMipAndSliceSamplesItsOwnColour)
 {
 	const struct
@@ -134,86 +111,47 @@ TEST_F(TextureLoaderTest, EveryItemMipAndSliceSamplesItsOwnColour)
 		const char* myName;
 		Dds::ImageInfo myInfo;
 		GLenum myViewTarget;
-		bool myHalvesFlag;
 	} cases[] = {
 	    {"cube with nine mips",
 	     {256, 256, 1, 6, 9, Dds::MiscTextureCube, Format::R8G8B8A8_UNORM},
-	     GL_TEXTURE_CUBE_MAP,
-	     false},
-	    {"BC1 cube array",
-	     {4, 4, 1, 12, 3, Dds::MiscTextureCube, Format::BC1_UNORM},
-	     GL_TEXTURE_CUBE_MAP_ARRAY,
-	     false},
-	    {"volume",
-	     {8, 8, 4, 1, 4, 0, Format::R8G8B8A8_UNORM, ResourceDimension::Texture3D},
-	     GL_TEXTURE_3D,
-	     false},
-	    {"2D array", {16, 8, 1, 3, 5, 0, Format::R8G8B8A8_UNORM}, GL_TEXTURE_2D_ARRAY, true},
+	     GL_TEXTURE_CUBE_MAP},
+	    {"cube array",
+	     {4, 4, 1, 12, 3, Dds::MiscTextureCube, Format::R8G8B8A8_UNORM},
+	     GL_TEXTURE_CUBE_MAP_ARRAY},
+	    {"volume", {8, 8, 4, 1, 4, 0, Format::R8G8B8A8_UNORM, ResourceDimension::Texture3D}, GL_TEXTURE_3D},
+	    {"2D array", {16, 8, 1, 3, 5, 0, Format::R8G8B8A8_UNORM}, GL_TEXTURE_2D_ARRAY},
 	};
 	for (const auto& test : cases)
 	{
 		SCOPED_TRACE(test.myName);
 		const Dds::ImageInfo& info = test.myInfo;
-		const bool bcFlag = info.myFormat == Format::BC1_UNORM;
-		auto color = [&](uint32_t anItem, uint32_t aMip, uint32_t aSlice, bool aTopFlag) -> Pixel {
-			return Pixel{uint8_t(10 + 20 * anItem), uint8_t(10 + 25 * aMip),
-			             uint8_t(30 + 50 * aSlice + (aTopFlag ? 0 : 20)), 255};
-		};
-		// BC1 keeps the 565 colour, which GL expands exactly.
-		auto read = [&](Pixel aPixel) {
-			return bcFlag ? Color{(aPixel[0] >> 3) / 31.0f, (aPixel[1] >> 2) / 63.0f,
-			                      (aPixel[2] >> 3) / 31.0f, 1}
-			              : Unorm(aPixel);
-		};
-		// Each subresource filled with its colours, and one query per colour to read it back.
+		// Each subresource filled with its colour, and one query per colour to read it back.
 		Dds::Image image = MakeImage(info);
 		std::vector<SampleQuery> queries;
-		std::vector<std::pair<Color, std::string>> expected;
+		std::vector<Color> expected;
 		for (uint32_t item = 0; item < info.myArraySize; ++item)
 		{
 			for (uint32_t mip = 0; mip < info.myMipLevels; ++mip)
 			{
-				const uint32_t height = Dds::MipExtent(info.myHeight, mip);
 				const uint32_t depth = Dds::MipExtent(info.myDepth, mip);
-				if (bcFlag)
-				{
-					const Pixel pixel = color(item, mip, 0, true);
-					Repeat(image.Data(mip, item), image.SubresourceSize(mip),
-					       Bc1Block(Rgb565(pixel[0] >> 3, pixel[1] >> 2, pixel[2] >> 3), 0, 0));
-				}
 				for (uint32_t slice = 0; slice < depth; ++slice)
 				{
-					for (uint32_t row = 0; row < height && !bcFlag; ++row)
+					const Pixel pixel = {uint8_t(10 + 20 * item), uint8_t(10 + 25 * mip),
+					                     uint8_t(30 + 50 * slice), 255};
+					Repeat(image.Data(mip, item) + slice * image.SlicePitch(mip), image.SlicePitch(mip),
+					       {pixel.begin(), pixel.end()});
+					std::array<float, 4> coord = {0.5f, 0.5f, float(item), 0};
+					if (info.IsCube())
 					{
-						const Pixel pixel =
-						    color(item, mip, slice, !test.myHalvesFlag || row < (height + 1) / 2);
-						Repeat(image.Data(mip, item) + slice * image.SlicePitch(mip) +
-						           row * image.RowPitch(mip),
-						       image.RowPitch(mip), {pixel.begin(), pixel.end()});
+						coord = ourFaceDirections[item % 6];
+						coord[3] = float(item / 6);
 					}
-					for (const bool topFlag : {true, false})
+					else if (info.IsVolume())
 					{
-						if (!topFlag && !test.myHalvesFlag)
-						{
-							continue;
-						}
-						std::array<float, 4> coord = {0.5f, topFlag ? 0.2f : 0.8f, float(item), 0};
-						if (info.IsCube())
-						{
-							coord = ourFaceDirections[item % 6];
-							coord[3] = float(item / 6);
-						}
-						else if (info.IsVolume())
-						{
-							coord = {0.5f, 0.5f, (float(slice) + 0.5f) / float(depth), 0};
-						}
-						queries.push_back({coord, float(mip)});
-						// A mip one row high has only its top row.
-						expected.emplace_back(read(color(item, mip, slice, topFlag || height == 1)),
-						                      "item " + std::to_string(item) + " mip " + std::to_string(mip) +
-						                          " slice " + std::to_string(slice) +
-						                          (topFlag ? " top" : " bottom"));
+						coord = {0.5f, 0.5f, (float(slice) + 0.5f) / float(depth), 0};
 					}
+					queries.push_back({coord, float(mip)});
+					expected.push_back(Unorm(pixel));
 				}
 			}
 		}
@@ -229,7 +167,7 @@ TEST_F(TextureLoaderTest, EveryItemMipAndSliceSamplesItsOwnColour)
 		    mySampleProgram.Sample(*texture->GetDefaultShaderResourceView(), queries);
 		for (size_t query = 0; query < colors.size(); ++query)
 		{
-			ExpectColor(colors[query], expected[query].first, bcFlag ? 4e-3f : 1e-4f, expected[query].second);
+			ExpectColor(colors[query], expected[query], 1e-4f, "query " + std::to_string(query));
 		}
 	}
 }
@@ -256,35 +194,20 @@ TEST_F(TextureLoaderTest, FormatsSampleTheirStoredValues)
 	    {Format::R8G8B8A8_UNORM, {rgba.begin(), rgba.end()}, Unorm(rgba), 1e-4f},
 	    {Format::R8G8B8A8_UNORM_SRGB, {rgba.begin(), rgba.end()}, decoded(Unorm(rgba)), 2e-3f},
 	    {Format::B8G8R8A8_UNORM, {bgra.begin(), bgra.end()}, bgraRead, 1e-4f},
-	    {Format::B8G8R8A8_UNORM_SRGB, {bgra.begin(), bgra.end()}, decoded(bgraRead), 2e-3f},
 	    {Format::B8G8R8X8_UNORM, {10, 100, 200, 7}, bgraRead, 1e-4f}, // alpha ignored
 	    {Format::BC1_UNORM, Bc1Block(bc1Color, 0, 0), bc1Read, 4e-3f},
-	    {Format::BC1_UNORM_SRGB, Bc1Block(bc1Color, 0, 0), decoded(bc1Read), 1e-2f},
 	    // Endpoints in the three-colour order: index 3 is transparent black.
 	    {Format::BC1_UNORM, Bc1Block(bc1Color, bc1Color, 3), {0, 0, 0, 0}, 1e-4f},
-	    {Format::BC2_UNORM,
-	     Concat(Bytes(8, 0x99), Bc1Block(Rgb565(0, 63, 0), 0, 0)),
-	     {0, 1, 0, 9 / 15.0f},
-	     4e-3f},
-	    // Index 2 lies a third of the way from the first endpoint to the second.
-	    {Format::BC3_UNORM,
-	     Concat(Bc3AlphaBlock(200, 50, 2), Bc1Block(Rgb565(31, 0, 0), Rgb565(0, 0, 31), 2)),
-	     {2 / 3.0f, 0, 1 / 3.0f, (6 * 200 + 50) / 7.0f / 255.0f},
-	     1e-2f},
 	    // 0.25, -2, 1000, 0.5 as halves.
 	    {Format::R16G16B16A16_FLOAT,
 	     BytesOf(std::array<uint16_t, 4>{0x3400, 0xC000, 0x63D0, 0x3800}),
 	     {0.25f, -2.0f, 1000.0f, 0.5f},
 	     0.0f},
-	    {Format::R32_FLOAT, BytesOf(std::array<float, 1>{3.75f}), {3.75f, 0, 0, 1}, 0.0f},
 	    {Format::R32G32B32A32_FLOAT,
 	     BytesOf(std::array<float, 4>{-1.5f, 0.125f, 65536.0f, 7.0f}),
 	     {-1.5f, 0.125f, 65536.0f, 7.0f},
 	     0.0f},
 	};
-	// The sRGB cases carry the value the format description promises.
-	EXPECT_NEAR(SrgbToLinear(188 / 255.0f), 0.5f, 5e-3f);
-
 	int number = 0;
 	for (const auto& test : cases)
 	{
@@ -320,18 +243,11 @@ TEST_F(TextureLoaderTest, FailuresGiveNullAndOneReportNamingTheFile)
 	ExpectReports({{"Gpu::CreateTextureFromFile", missing}});
 	EXPECT_EQ(info.myWidth, 77u) << "the information of a file that was never read";
 
-	// A valid file cut short, and bytes that are no DDS file at all.
-	Bytes bytes;
-	std::string error;
-	ASSERT_TRUE(Dds::SaveToMemory(MakeImage({16, 16, 1, 1, 1, 0, Format::R8G8B8A8_UNORM}), bytes, error))
-	    << error;
-	const std::string truncated = myScratch.File("truncated.dds");
+	// Bytes that are no DDS file at all (the file layer's own messages are its tests').
 	const std::string garbage = myScratch.File("garbage.dds");
-	TestSupport::WriteWholeFile(truncated, std::string(bytes.begin(), bytes.begin() + 200));
 	TestSupport::WriteWholeFile(garbage, "PNG? no, not even that");
-	EXPECT_EQ(Load(truncated, nullptr), nullptr);
 	EXPECT_EQ(Load(garbage, nullptr), nullptr);
-	ExpectReports({{"Gpu::CreateTextureFromFile", truncated}, {"Gpu::CreateTextureFromFile", garbage}});
+	ExpectReports({{"Gpu::CreateTextureFromFile", garbage}});
 
 	// A format the file layer knows and GL does not: the information still arrives.
 	ASSERT_FALSE(Gpu::GetFormatInfo(Format::R16G16B16A16_UNORM).IsSupported());
@@ -339,8 +255,7 @@ TEST_F(TextureLoaderTest, FailuresGiveNullAndOneReportNamingTheFile)
 	Save(unorm16, MakeImage({4, 4, 1, 1, 1, 0, Format::R16G16B16A16_UNORM}));
 	EXPECT_EQ(Load(unorm16, &info), nullptr);
 	ExpectReports({{unorm16, "R16G16B16A16_UNORM"}});
-	EXPECT_EQ(info.myFormat, Format::R16G16B16A16_UNORM);
-	EXPECT_EQ(info.myWidth, 4u);
+	EXPECT_EQ(std::pair(info.myFormat, info.myWidth), std::pair(Format::R16G16B16A16_UNORM, 4u));
 
 	// GL compresses only 2D images with BC formats.
 	const std::string bcVolume = myScratch.File("bc volume.dds");
