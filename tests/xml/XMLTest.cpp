@@ -9,66 +9,32 @@
 
 #include "XMLTestFixture.h"
 
-TEST_F(XMLFixture, WalksSkipCommentsAndExitChildAfterTheLastSiblingLandsOnTheSection)
+// The walks and readers every level load takes are held by the level suites; here what they do not
+// meet: walks without a name, the cursor after a walk ran off, the first attribute and the
+// components of the cursor element itself, and Try readers that keep the value.
+TEST_F(XMLFixture, WalksAndReadersSilentlyTakeWhatIsThere)
 {
-	XML xml(myPath);
-	ASSERT_TRUE(xml.GoToElement("lights", "", ""));
-	ASSERT_TRUE(xml.EnterChild("light"));
-	ASSERT_TRUE(xml.GoToNextSibling("light")); // past <note> and the comment
-	EXPECT_EQ(xml.GetAttribute<int>("id"), 2);
-	EXPECT_FALSE(xml.GoToNextSibling("light"));
-	EXPECT_FALSE(xml.EnterChild("")); // the walk ran off the end: no cursor
-	xml.ExitChild();
-	EXPECT_EQ(xml.GetElementName(), "lights");
-
-	// Unnamed, EnterChild and the walk pass over comments only.
-	ASSERT_TRUE(xml.EnterChild(""));
-	EXPECT_FALSE(xml.EnterChild("no-such-child")); // a failed EnterChild leaves the cursor
-	ASSERT_TRUE(xml.GoToNextSibling(""));
-	EXPECT_EQ(xml.GetElementName(), "note");
-	ASSERT_TRUE(xml.GoToNextSibling(""));
-	EXPECT_EQ(xml.GetAttribute<int>("id"), 2);
-	EXPECT_FALSE(xml.GoToNextSibling(""));
-
-	// Up to three levels, false when one is missing; an empty first level takes any first child.
-	ASSERT_TRUE(xml.GoToElement("lights", "light", "falloff"));
-	EXPECT_EQ(xml.GetAttribute<float>(""), 2.5f);
-	EXPECT_FALSE(xml.GoToElement("lights", "light", "nope"));
-	EXPECT_FALSE(xml.GoToElement("nope", "", ""));
-	ASSERT_TRUE(xml.GoToElement("", "", ""));
-	EXPECT_EQ(xml.GetElementName(), " first child ");
-	EXPECT_EQ(ReportCount(), 0);
-}
-
-TEST_F(XMLFixture, ReadersFindValuesByNameOrTakeTheFirstAttributeAndTryReadersKeepTheValue)
-{
-	// The Try readers answer false without a report and keep the value.
 	XML xml(myPath);
 	bool flag = true;
 	std::string text = "unchanged";
 	EXPECT_FALSE(xml.TryGetAttribute(flag, "id")); // no cursor yet
-	EXPECT_FALSE(xml.TryGetChildAttribute("falloff", text, ""));
-	ASSERT_TRUE(xml.GoToElement("lights", "light", ""));
+	ASSERT_TRUE(xml.GoToElement("lights", "", ""));
+	ASSERT_TRUE(xml.EnterChild("")); // past the comment
 	EXPECT_FALSE(xml.TryGetAttribute(flag, "cast-shadow"));
-	EXPECT_FALSE(xml.TryGetChildAttribute("no-such-tag", text, ""));
 	EXPECT_FALSE(xml.TryGetChildAttribute("position", text, "w"));
 	EXPECT_TRUE(flag && text == "unchanged");
-	EXPECT_EQ(ReportCount(), 0);
 	EXPECT_TRUE(xml.TryGetAttribute(flag, "id") && !flag);
-	EXPECT_TRUE(xml.TryGetChildAttribute("color", text, "g") && text == "0.25");
 	EXPECT_TRUE(xml.TryGetChildAttribute("falloff", text, "") && text == "2.5");
-
-	EXPECT_EQ(xml.GetChildAttribute<float>("falloff", ""), 2.5f); // value="2.5"
-	EXPECT_EQ(Components(xml.GetVector3Attribute("position")), (std::vector<float>{1, 2, 3}));
-	ASSERT_TRUE(xml.GoToNextSibling("light"));
+	ASSERT_TRUE(xml.GoToNextSibling(""));
+	EXPECT_EQ(xml.GetElementName(), "note");
+	ASSERT_TRUE(xml.GoToNextSibling(""));
 	EXPECT_EQ(xml.GetChildAttribute<float>("falloff", ""), 0.5f); // v="0.5"
-	EXPECT_EQ(xml.GetChildAttribute<float>("angles", "outer"), 0.7f);
-	EXPECT_EQ(Components(xml.GetVector4Attribute("color")), (std::vector<float>{2, 0, 0, 1}));
-	// With an empty tag the cursor element itself holds the components.
+	EXPECT_FALSE(xml.GoToNextSibling("light"));
+	EXPECT_FALSE(xml.EnterChild("")); // the walk ran off the end: no cursor
+	xml.ExitChild();
+	EXPECT_EQ(xml.GetElementName(), "lights");
 	ASSERT_TRUE(xml.GoToElement("lights", "light", "color"));
 	EXPECT_EQ(Components(xml.GetVector4Attribute("")), (std::vector<float>{0.5f, 0.25f, 1, 4}));
-	ASSERT_TRUE(xml.GoToElement("lights", "light", "position"));
-	EXPECT_EQ(Components(xml.GetVector3Attribute("")), (std::vector<float>{1, 2, 3}));
 	EXPECT_EQ(ReportCount(), 0);
 }
 
@@ -99,8 +65,6 @@ TEST_F(XMLFixture, EveryFailureReportsOnceWithItsMessageAndNamesAsGiven)
 	     "Could not find name [outer] in [angles] in [light]" + in},
 	    // From <bare> up to <root>, to the document, and then past it.
 	    {"bare", "", 2, [](XML& x) { x.ExitChild(); }, "Could not find element [" + myPath + "]" + in},
-	    {nullptr, "", 0, [&](XML& x) { x.InsertElement(record, false); },
-	     "Could not insert element [light] in file [" + myPath + "]"},
 	    // On the comment that is the root's first child: a comment cannot hold children that are saved.
 	    {"", "", 0, [&](XML& x) { x.InsertElement(record, false); },
 	     "Could not insert element [light] in file [" + myPath + "]"},

@@ -9,7 +9,6 @@
 #include <string>
 #include <vector>
 
-#include "core/Vector3.h"
 #include "core/Vector4.h"
 #include "engine/Debug.h"
 #include "support/TestSupport.h"
@@ -74,15 +73,13 @@ protected:
 	{
 		const std::string log = Log();
 		int count = 0;
-		for (std::size_t at = log.find("CRITICAL ERROR", aFrom); at != std::string::npos;
-		     at = log.find("CRITICAL ERROR", at + 1))
+		for (std::size_t at = log.find("CRITICAL ERROR", aFrom); at != std::string::npos; ++count)
 		{
-			++count;
+			at = log.find("CRITICAL ERROR", at + 1);
 		}
 		return count;
 	}
 
-	static std::vector<float> Components(const Vector3<float>& aV) { return {aV.x, aV.y, aV.z}; }
 	static std::vector<float> Components(const Vector4<float>& aV) { return {aV.x, aV.y, aV.z, aV.w}; }
 
 	TestSupport::ScratchDir myScratch;
