@@ -1,10 +1,15 @@
-// Loading models through the factory with a GPU: ".al" files written and read back
-// with their effects, textures, techniques and stored bounding sphere, the load
-// reports, the lit effects' techniques and a lit quad on screen.
+// The model factory with a GPU: ".al" files written and loaded back with their effects,
+// textures, techniques and stored bounding sphere, the load reports, every vertex type's
+// layout against its effect, a lit quad on screen, generated boxes, the cull-shape fallback
+// and texture paths.
 #include <cmath>
+#include <cstring>
 #include <filesystem>
+#include <gmock/gmock-matchers.h>
 #include <gtest/gtest.h>
 #include <iterator>
+#include <utility>
+#include <vector>
 
 #include "ModelTreeCheck.h"
 #include "engine/Effect.h"
@@ -13,7 +18,9 @@
 #include "engine/ShaderFiles.h"
 #include "engine/TextureContainer.h"
 #include "model/ColladaMeshFactory.h"
+#include "model/Model.h"
 #include "model/ModelFactory.h"
+#include "model/ModelNode.h"
 #include "model/VertexTypes.h"
 #include "platform/dds/DdsFile.h"
 #include "platform/fx/Technique.h"
@@ -67,7 +74,9 @@ TEST_F(ModelLoadTest, AnAlFileLoadsAsTheTreeThatWasSavedWithItsTexturesAndTechni
 	const size_t baseline = factory.GetCount();
 	Zeph::ModelNode* loaded = factory.CreateModelNodeAL(path);
 	ASSERT_NE(loaded, nullptr) << TakeLog();
-	EXPECT_EQ(ModelTreeCheck::Describe(*loaded), ModelTreeCheck::Describe(*tree));
+	EXPECT_EQ(ModelTreeCheck::Encoded(*loaded), ModelTreeCheck::Encoded(*tree));
+	EXPECT_EQ(loaded->GetModel()->GetSurfaces()[0].GetTexture(1), first.GetTexture(1))
+	    << "the shared texture";
 	EXPECT_EQ(factory.GetModel(path), loaded) << "the same path gives the same tree";
 	EXPECT_EQ(factory.CreateModelNodeAL(path), loaded);
 	EXPECT_EQ(factory.GetCount(), baseline + 1u);
@@ -88,38 +97,6 @@ TEST_F(ModelLoadTest, AnAlFileLoadsAsTheTreeThatWasSavedWithItsTexturesAndTechni
 	EXPECT_FLOAT_EQ(sphere.myPosition.x, 0.0f);
 	EXPECT_FLOAT_EQ(sphere.myPosition.z, 0.5f);
 	EXPECT_NEAR(sphere.myRadius, std::sqrt(0.5f), 1e-6f);
-}
-
-TEST_F(ModelLoadTest, ModelsThatCannotLoadAreReportedAndNotStored)
-{
-	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
-	const std::string damaged = myScratch.File("damaged.al");
-	const std::string missing = myScratch.File("missing.al");
-	TestSupport::WriteWholeFile(damaged, std::string("\x02\x00\x00\x00\x07", 5));
-	// Each reason is reported before the load's own failure.
-	const std::pair<std::string, std::string> cases[] = {
-	    {"data/models/crate", "Invalid model file format: data/models/crate\n"},
-	    {missing, "Failed to open " + missing + ":\n"},
-	    {damaged, "Damaged model file " + damaged + ": "},
-	};
-	Zeph::ModelFactory& factory = Zeph::Engine::GetInstance()->GetModelFactory();
-	// Whatever the engine loaded for itself at start-up is not counted.
-	const size_t baseline = factory.GetCount();
-	for (const auto& [name, reason] : cases)
-	{
-		EXPECT_EQ(factory.GetModel(name), nullptr) << name;
-		const std::string log = TakeLog();
-		const size_t failed =
-		    log.find("\"Zeph::ModelFactory::LoadModel\"\n\"Couldn't load Model: " + name + "\n");
-		EXPECT_LT(log.find(reason), failed) << log;
-		EXPECT_NE(failed, std::string::npos) << log;
-	}
-	EXPECT_EQ(factory.CreateModelNodeAL(missing), nullptr);
-	const std::string log = TakeLog();
-	EXPECT_NE(log.find("\"Zeph::ModelFactory::CreateModelNodeAL\"\n\"Couldn't load Model: " + missing),
-	          std::string::npos)
-	    << log;
-	EXPECT_EQ(factory.GetCount(), baseline);
 }
 
 // Every vertex type's layout feeds its effect's "Render" and shadow passes (the two lit
@@ -202,4 +179,88 @@ TEST_F(ModelLoadTest, ALoadedLitModelDrawnWithRenderShowsItsAlbedoLit)
 		const float lit = static_cast<float>(albedo[channel]) / 255.0f * light[channel] * 0.8f;
 		EXPECT_NEAR(pixels[centre + channel], TestSupport::SrgbEncoded(lit), 2) << "channel " << channel;
 	}
+}
+
+using ModelFactoryTest = EngineTest;
+
+TEST_F(ModelFactoryTest, CreateAABBBuildsTheBoxOnceForAName)
+{
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
+	Zeph::ModelFactory& factory = Zeph::Engine::GetInstance()->GetModelFactory();
+	// Whatever the engine loaded for itself at start-up is not counted.
+	const size_t baseline = factory.GetCount();
+	Zeph::ModelNode* box = factory.CreateAABB("box", {1.0f, 2.0f, 3.0f}, {0.25f, 0.5f, 0.75f, 1.0f},
+	                                          Gpu::PrimitiveTopology::TriangleList);
+	ASSERT_NE(box, nullptr) << TakeLog();
+	Zeph::ModelNode* again = factory.CreateAABB("box", {9.0f, 9.0f, 9.0f}, {0.0f, 1.0f, 0.0f, 0.0f},
+	                                            Gpu::PrimitiveTopology::LineList);
+	EXPECT_EQ(again, box);
+	EXPECT_EQ(factory.GetModel("box"), box) << "GetModel finds a generated box without loading";
+	EXPECT_EQ(factory.GetCount(), baseline + 1u);
+
+	// The first call's size and colour (the late-gizmo golden image shows the box drawn).
+	const Zeph::Model* model = box->GetModel();
+	ASSERT_EQ(model->GetVertexData().size(), 8u * 28u);
+	float corner[7];
+	std::memcpy(corner, model->GetVertexData().data() + 6 * 28, sizeof(corner));
+	EXPECT_EQ(std::vector<float>(corner, corner + 7), (std::vector<float>{1, 2, 3, 0.25f, 0.5f, 0.75f, 1}));
+	ASSERT_NE(model->GetEffect(), nullptr);
+	EXPECT_EQ(model->GetEffect()->GetFileName(), "Data/Shaders/Misc/Vertex_PosCol.fx");
+	EXPECT_EQ(TakeLog().find("CRITICAL"), std::string::npos);
+}
+
+TEST_F(ModelFactoryTest, ModelsThatCannotLoadAreReportedAndNotStoredAndUnknownNamesFallBack)
+{
+	LUMORA_RETURN_UNLESS(CreateEngine(64, 64));
+	Zeph::ModelFactory& factory = Zeph::Engine::GetInstance()->GetModelFactory();
+	// Whatever the engine loaded for itself at start-up is not counted.
+	const size_t baseline = factory.GetCount();
+	const Intersection::Sphere sphere = factory.GetCullShapeFromModel("data/models/nothing.dae");
+	EXPECT_THAT(TakeLog(), testing::HasSubstr("Tried to get radius for model not in container!"));
+	EXPECT_EQ((std::vector{sphere.myPosition.x, sphere.myPosition.y, sphere.myPosition.z, sphere.myRadius}),
+	          (std::vector{0.0f, 0.0f, 0.0f, 1.0f}));
+
+	// Each reason is reported before the load's own failure; a failed load stores nothing, so
+	// the second request fails (and reports) again.
+	const std::string damaged = myScratch.File("damaged.al");
+	const std::string missing = myScratch.File("missing.al");
+	TestSupport::WriteWholeFile(damaged, std::string("\x02\x00\x00\x00\x07", 5));
+	const std::pair<std::string, std::string> loads[] = {
+	    {"data/models/crate", "Invalid model file format: data/models/crate\n"},
+	    {missing, "Failed to open " + missing + ":\n"},
+	    {damaged, "Damaged model file " + damaged + ": "},
+	    {damaged, "Damaged model file " + damaged + ": "},
+	};
+	for (const auto& [name, reason] : loads)
+	{
+		EXPECT_EQ(factory.GetModel(name), nullptr) << name;
+		const std::string log = TakeLog();
+		const size_t failed =
+		    log.find("\"Zeph::ModelFactory::LoadModel\"\n\"Couldn't load Model: " + name + "\n");
+		EXPECT_LT(log.find(reason), failed) << log;
+		EXPECT_NE(failed, std::string::npos) << log;
+	}
+	EXPECT_EQ(factory.GetCount(), baseline);
+
+	// A surface texture from an art path is looked up from its data folder.
+	struct Case
+	{
+		const char* myPath;
+		const char* myLooked; // the path the texture container was asked for
+	};
+	const Case cases[] = {
+	    {"C:/work/data/tex/a.dds", "data/tex/a.dds"},
+	    {"D:/art/tex/data.dds", "data.dds"},
+	    {"D:/art/tex/data", "D:/art/tex/data"}, // "data" as the last four characters is not searched
+	    {"C:/art/b.dds", "C:/art/b.dds"},
+	};
+	Zeph::Surface surface;
+	for (const Case& test : cases)
+	{
+		EXPECT_FALSE(surface.SetTexture(test.myPath, "DiffuseTexture", true));
+		const std::string log = TakeLog();
+		EXPECT_NE(log.find(std::string("Invalid Texture: ") + test.myLooked + "\n"), std::string::npos)
+		    << log;
+	}
+	EXPECT_EQ(surface.GetTextureCount(), 0) << "a failed binding adds nothing";
 }

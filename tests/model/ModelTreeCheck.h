@@ -1,11 +1,11 @@
 #pragma once
-// Model trees for the model file tests: every field the file stores written out as text, so
-// that two trees compare in one expectation and a difference shows where it lies, and a
-// builder of a tree that uses every one of those fields.
-#include <ostream>
-#include <sstream>
-#include <string>
+// Model trees for the model file tests: a builder of a tree that uses every field the model
+// file stores, and the tree's file image to compare trees with.
+#include <cstdint>
+#include <memory>
+#include <vector>
 
+#include "model/AlFile.h"
 #include "model/Model.h"
 #include "model/ModelNode.h"
 #include "model/TransformationNodeCurves.h"
@@ -13,135 +13,13 @@
 
 namespace ModelTreeCheck
 {
-// One line of the description: a label and the values after it.
-template <typename... Values> void Line(std::ostream& anOut, const char* aLabel, const Values&... someValues)
+// The tree as a model file: the file holds every field of the tree, so two trees whose files
+// are equal byte for byte are the same tree as far as the file goes.
+inline std::vector<uint8_t> Encoded(const Zeph::ModelNode& aRoot)
 {
-	anOut << aLabel;
-	((anOut << ' ' << someValues), ...);
-	anOut << '\n';
-}
-
-// A label and every element of aRange (bytes as numbers).
-template <typename Range> void RangeLine(std::ostream& anOut, const char* aLabel, const Range& aRange)
-{
-	anOut << aLabel;
-	for (const auto& value : aRange)
-	{
-		anOut << ' ' << +value;
-	}
-	anOut << '\n';
-}
-
-inline void Write(std::ostream& anOut, const Matrix44<float>& aMatrix)
-{
-	RangeLine(anOut, "matrix", aMatrix.myMatrix);
-}
-
-inline void Write(std::ostream& anOut, const Zeph::TransformationNode* aNode)
-{
-	if (aNode == nullptr)
-	{
-		Line(anOut, "no transformation");
-		return;
-	}
-	Line(anOut, "transformation", static_cast<int>(aNode->GetType()));
-	Write(anOut, aNode->GetOrientation());
-	if (const auto* hierarchy = dynamic_cast<const Zeph::TransformationNodeHierarchy*>(aNode))
-	{
-		for (int child = 0; child < hierarchy->GetChildCount(); ++child)
-		{
-			Line(anOut, "hierarchy child", child);
-			Write(anOut, &hierarchy->GetChild(child));
-		}
-	}
-	if (const auto* curves = dynamic_cast<const Zeph::TransformationNodeCurves*>(aNode))
-	{
-		const Vector3<float>& axis = curves->GetRotationAxis();
-		const Vector3<float>& move = curves->GetTranslation();
-		Line(anOut, "curves", curves->GetFirstParameter(), curves->GetSecondParameter(),
-		     curves->GetThirdParameter(), curves->GetFourthParameter(), axis.x, axis.y, axis.z, move.x,
-		     move.y, move.z, curves->GetAngle());
-		for (int slot = 0; slot < Zeph::TransformationNodeCurves::CURVE_SLOT_COUNT; ++slot)
-		{
-			if (const Zeph::AnimationCurve* curve = curves->GetCurve(slot))
-			{
-				Line(anOut, "curve", slot, curve->GetFirstParameter(), curve->GetSecondParameter());
-				for (const Zeph::AnimationKey& key : curve->GetKeys())
-				{
-					Line(anOut, "key", key.myTime, key.myValue);
-				}
-			}
-		}
-	}
-}
-
-inline void Write(std::ostream& anOut, const Zeph::Model& aModel)
-{
-	Line(anOut, "model", aModel.IsNullObject(), aModel.GetModelID(), aModel.GetVertexType(),
-	     aModel.GetIndexCount(), aModel.GetIndexFormat(), aModel.GetVertexCount(), aModel.GetVertexStride(),
-	     aModel.GetFirstName(), aModel.GetTechniqueName(), aModel.GetThirdName());
-	RangeLine(anOut, "indices", aModel.GetIndexData());
-	RangeLine(anOut, "vertices", aModel.GetVertexData());
-	for (const Zeph::Surface& surface : aModel.GetSurfaces())
-	{
-		Line(anOut, "surface", surface.GetIndexCount(), surface.GetStartIndex(), surface.GetReservedValue(),
-		     surface.GetSecondReservedValue(), static_cast<int>(surface.GetPrimitiveTopology()));
-		for (int texture = 0; texture < surface.GetTextureCount(); ++texture)
-		{
-			// The texture object too: a tree loaded twice shares the container's textures.
-			Line(anOut, "texture", surface.GetTextureFileName(texture),
-			     surface.GetTextureVariableName(texture), surface.GetTextureSRGBFlag(texture),
-			     surface.GetTexture(texture));
-		}
-	}
-	const Zeph::ModelAnimationData& data = aModel.GetAnimationData();
-	for (const Zeph::ModelTransformationRecord& record : data.myTransformationRecords)
-	{
-		Write(anOut, record.myTransformation.get());
-	}
-	for (const Zeph::ModelNamedRecord& record : data.myNamedRecords)
-	{
-		Line(anOut, "named", record.myName, record.myValue, record.myFirst, record.mySecond);
-		Write(anOut, record.myTransformation.get());
-	}
-	for (const Zeph::ModelMatrixRecord& record : data.myMatrixRecords)
-	{
-		for (const Matrix44<float>& matrix : record.myMatrices)
-		{
-			Write(anOut, matrix);
-		}
-		RangeLine(anOut, "values", record.myValues);
-	}
-	RangeLine(anOut, "integers", data.myIntegers);
-	for (const Zeph::Model* child : aModel.GetChildModels())
-	{
-		Write(anOut, *child);
-	}
-	Line(anOut, "end of model");
-}
-
-inline void Write(std::ostream& anOut, const Zeph::ModelNode& aNode)
-{
-	Line(anOut, "node", aNode.GetName());
-	if (aNode.GetModel() != nullptr)
-	{
-		Write(anOut, *aNode.GetModel());
-	}
-	Write(anOut, aNode.GetTransformation());
-	for (const Zeph::ModelNode* child : aNode.GetChildren())
-	{
-		Write(anOut, *child);
-	}
-	Line(anOut, "end of node", aNode.GetName());
-}
-
-// The tree as text, exact to the last bit of every value.
-inline std::string Describe(const Zeph::ModelNode& aRoot)
-{
-	std::ostringstream text;
-	text.precision(17);
-	Write(text, aRoot);
-	return text.str();
+	std::vector<uint8_t> bytes;
+	Zeph::AlFile::Encode(aRoot, bytes);
+	return bytes;
 }
 
 // A matrix whose every element differs, so a swapped or dropped element shows.
