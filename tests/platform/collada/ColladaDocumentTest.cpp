@@ -1,33 +1,15 @@
 // The document reader on real exporters' files and on small broken documents.
 
+#include <array>
 #include <gtest/gtest.h>
 #include <string>
+#include <tuple>
 #include <vector>
 
 #include "platform/collada/Document.h"
 
 namespace
 {
-struct MeshCounts
-{
-	size_t mySets;
-	size_t myTriangles;
-	size_t mySources;
-};
-
-struct RealDocument
-{
-	const char* myFile;
-	const char* myUpAxis;
-	std::vector<MeshCounts> myMeshes;
-	size_t myNodes;
-	size_t myCameras;
-	size_t myLights;
-	size_t myImages;
-	size_t myMaterials;
-	size_t myControllers;
-};
-
 size_t CountNodes(const std::vector<std::unique_ptr<Collada::Node>>& someNodes)
 {
 	size_t count = 0;
@@ -38,54 +20,51 @@ size_t CountNodes(const std::vector<std::unique_ptr<Collada::Node>>& someNodes)
 	return count;
 }
 
-// Counted from the files: polygon sets, triangles once triangulated (n - 2 per polygon, strip or
-// fan), sources per mesh, and the library entries.
-const RealDocument ourRealDocuments[] = {
-    {"Cinema4D.dae", "Y_UP", {{1, 756, 3}, {1, 528, 3}, {1, 12, 3}}, 3, 0, 0, 0, 1, 0},
-    {"ConcavePolygon.dae", "Y_UP", {{1, 64, 1}}, 1, 0, 0, 0, 1, 0},
-    {"box_nested_animation.dae", "Z_UP", {{1, 12, 3}}, 3, 0, 0, 0, 1, 1},
-    {"cameras.dae", "Z_UP", {}, 3, 3, 0, 0, 0, 0},
-    {"cube_tristrips.dae", "Z_UP", {{1, 12, 2}}, 7, 2, 4, 0, 1, 0},
-    {"kwxport_test_vcolors.dae", "Z_UP", {{3, 12, 4}}, 1, 0, 0, 3, 3, 0},
-    {"lights.dae", "Z_UP", {}, 5, 0, 5, 0, 0, 0},
-    {"sphere.dae", "Y_UP", {{1, 760, 3}}, 1, 0, 0, 0, 1, 0},
-    {"teapots.DAE", "Z_UP", {{1, 992, 3}, {1, 992, 3}, {1, 992, 2}}, 3, 0, 0, 1, 3, 0},
-};
+// What a document holds: its up axis, per mesh the polygon sets, sources and triangles once
+// triangulated (n - 2 per polygon, strip or fan), then its nodes, cameras, lights, images,
+// materials and controllers.
+using Counts = std::tuple<std::string, std::vector<std::array<size_t, 3>>, std::array<size_t, 6>>;
+
+Counts CountsOf(const Collada::Document& aDocument)
+{
+	std::vector<std::array<size_t, 3>> meshes;
+	for (const Collada::Geometry& geometry : aDocument.GetGeometries())
+	{
+		Collada::Mesh mesh = geometry.myMesh;
+		const size_t sets = mesh.mySets.size();
+		mesh.Triangulate();
+		EXPECT_TRUE(mesh.IsTriangles());
+		meshes.push_back({sets, mesh.mySources.size(), mesh.GetTriangleCount()});
+	}
+	const Collada::VisualScene* scene = aDocument.GetVisualScene();
+	return {aDocument.GetAsset().myUpAxis,
+	        meshes,
+	        {scene ? CountNodes(scene->myNodes) : 0, aDocument.GetCameras().size(),
+	         aDocument.GetLights().size(), aDocument.GetImages().size(), aDocument.GetMaterials().size(),
+	         aDocument.GetControllers().size()}};
+}
 } // namespace
 
 TEST(ColladaDocumentTest, RealDocumentsLoadWithTheirCounts)
 {
-	for (const RealDocument& expected : ourRealDocuments)
+	const std::pair<const char*, Counts> documents[] = {
+	    {"Cinema4D.dae", {"Y_UP", {{1, 3, 756}, {1, 3, 528}, {1, 3, 12}}, {3, 0, 0, 0, 1, 0}}},
+	    {"ConcavePolygon.dae", {"Y_UP", {{1, 1, 64}}, {1, 0, 0, 0, 1, 0}}},
+	    {"box_nested_animation.dae", {"Z_UP", {{1, 3, 12}}, {3, 0, 0, 0, 1, 1}}},
+	    {"cameras.dae", {"Z_UP", {}, {3, 3, 0, 0, 0, 0}}},
+	    {"cube_tristrips.dae", {"Z_UP", {{1, 2, 12}}, {7, 2, 4, 0, 1, 0}}},
+	    {"kwxport_test_vcolors.dae", {"Z_UP", {{3, 4, 12}}, {1, 0, 0, 3, 3, 0}}},
+	    {"lights.dae", {"Z_UP", {}, {5, 0, 5, 0, 0, 0}}},
+	    {"sphere.dae", {"Y_UP", {{1, 3, 760}}, {1, 0, 0, 0, 1, 0}}},
+	    {"teapots.DAE", {"Z_UP", {{1, 3, 992}, {1, 3, 992}, {1, 2, 992}}, {3, 0, 0, 1, 3, 0}}},
+	};
+	for (const auto& [file, expected] : documents)
 	{
-		SCOPED_TRACE(expected.myFile);
+		SCOPED_TRACE(file);
 		Collada::Document document;
 		std::string error;
-		ASSERT_TRUE(document.Load(std::string("../shared/testdata/collada/") + expected.myFile, error))
-		    << error;
-		EXPECT_EQ(document.GetAsset().myUpAxis, expected.myUpAxis);
-		ASSERT_EQ(document.GetGeometries().size(), expected.myMeshes.size());
-		for (size_t i = 0; i < expected.myMeshes.size(); ++i)
-		{
-			Collada::Mesh mesh = document.GetGeometries()[i].myMesh;
-			EXPECT_EQ(mesh.mySets.size(), expected.myMeshes[i].mySets);
-			EXPECT_EQ(mesh.mySources.size(), expected.myMeshes[i].mySources);
-			mesh.Triangulate();
-			EXPECT_TRUE(mesh.IsTriangles());
-			EXPECT_EQ(mesh.GetTriangleCount(), expected.myMeshes[i].myTriangles);
-			for (const Collada::PolygonSet& set : mesh.mySets)
-			{
-				ASSERT_NE(set.FindInput(Collada::Semantic::Position), nullptr);
-				EXPECT_EQ(set.FindInput(Collada::Semantic::Position)->myIndices.size(),
-				          set.GetTriangleCount() * 3);
-			}
-		}
-		ASSERT_NE(document.GetVisualScene(), nullptr);
-		EXPECT_EQ(CountNodes(document.GetVisualScene()->myNodes), expected.myNodes);
-		EXPECT_EQ(document.GetCameras().size(), expected.myCameras);
-		EXPECT_EQ(document.GetLights().size(), expected.myLights);
-		EXPECT_EQ(document.GetImages().size(), expected.myImages);
-		EXPECT_EQ(document.GetMaterials().size(), expected.myMaterials);
-		EXPECT_EQ(document.GetControllers().size(), expected.myControllers);
+		ASSERT_TRUE(document.Load(std::string("../shared/testdata/collada/") + file, error)) << error;
+		EXPECT_EQ(CountsOf(document), expected);
 	}
 }
 
@@ -110,22 +89,13 @@ TEST(ColladaDocumentTest, MaterialsLeadToImageFilesAndCamerasAndLightsKeepTheirP
 	ASSERT_TRUE(document.Load("../shared/testdata/collada/cube_tristrips.dae", error)) << error;
 	const Collada::Camera* camera = document.FindCamera("PerspCamera");
 	ASSERT_NE(camera, nullptr);
-	EXPECT_TRUE(camera->myHasYFlag);
-	EXPECT_FLOAT_EQ(camera->myYFov, 37.8493f);
-	EXPECT_FLOAT_EQ(camera->myZFar, 1000.0f);
+	EXPECT_EQ(std::tuple(camera->myHasYFlag, camera->myYFov, camera->myZFar),
+	          std::tuple(true, 37.8493f, 1000.0f));
 	// The empty <light id="light"/> before the real one must not hide it.
 	const Collada::Light* light = document.FindLight("light");
 	ASSERT_NE(light, nullptr);
-	EXPECT_EQ(light->myKind, Collada::LightKind::Point);
-	EXPECT_FLOAT_EQ(light->myConstantAttenuation, 1.0f);
-
-	ASSERT_TRUE(document.Load("../shared/testdata/collada/cameras.dae", error)) << error;
-	size_t orthographic = 0;
-	for (const Collada::Camera& each : document.GetCameras())
-	{
-		orthographic += each.myProjection == Collada::Projection::Orthographic ? 1 : 0;
-	}
-	EXPECT_EQ(orthographic, 1u);
+	EXPECT_EQ(std::pair(light->myKind, light->myConstantAttenuation),
+	          std::pair(Collada::LightKind::Point, 1.0f));
 }
 
 namespace

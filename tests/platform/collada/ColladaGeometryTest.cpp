@@ -118,20 +118,10 @@ TEST(ColladaGeometryTest, NodeTransformsComposeInFileOrderAndInstanceNodesResolv
 	ExpectPoint(Apply(a->myInstances[0].myNode->GetLocalMatrix(), 1, 2, 3), 2, 4, 6);
 }
 
-TEST(ColladaGeometryTest, SkinWeightsAndReduceInfluences)
+// The strongest four joints stay, in order of weight, and share the whole weight. (A real skin's
+// weights reach the model through the import.)
+TEST(ColladaGeometryTest, ReduceInfluencesKeepsTheStrongestFourNormalised)
 {
-	Collada::Document document;
-	std::string error;
-	ASSERT_TRUE(document.Load("../shared/testdata/collada/box_nested_animation.dae", error)) << error;
-	ASSERT_EQ(document.GetControllers().size(), 1u);
-	const Collada::Skin& skin = document.GetControllers()[0].mySkin;
-	const Collada::Geometry* base = document.FindGeometry(skin.mySource);
-	ASSERT_NE(base, nullptr);
-	EXPECT_EQ(skin.myInfluences.size(),
-	          size_t(base->myMesh.FindSourceBySemantic(Collada::Semantic::Position)->myCount));
-	EXPECT_EQ(skin.myJointNames.size(), skin.myInverseBindMatrices.size());
-	EXPECT_FALSE(skin.myJointNames.empty());
-
 	Collada::Skin reduced;
 	reduced.myInfluences = {{{0, 0.1f}, {1, 0.4f}, {2, 0.05f}, {3, 0.2f}, {4, 0.15f}, {5, 0.1f}},
 	                        {{7, 0.5f}}};
