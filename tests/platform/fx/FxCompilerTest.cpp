@@ -3,6 +3,7 @@
 // states, variables and vertex inputs.
 
 #include <filesystem>
+#include <tuple>
 
 #include "GpuTest.h"
 #include "platform/fx/CompiledFormat.h"
@@ -123,23 +124,21 @@ sampler Shadow { Filter = COMPARISON_MIN_MAG_MIP_LINEAR; ComparisonFunc = LESS_E
 	ASSERT_TRUE(Fx::ReadCompiled(output.myCompiled, desc, error)) << error;
 	ASSERT_EQ(desc.myVariables.size(), 3u);
 
+	// What is not said takes Direct3D's default (clamped W for the declared one, a wrapping linear
+	// sampler for the undeclared array); units follow the declaration order, and the array takes two.
 	const Gpu::SamplerDesc& declared = desc.myVariables[0].mySampler;
-	EXPECT_EQ(declared.myFilter, Gpu::Filter::Anisotropic);
-	EXPECT_EQ(declared.myMaxAnisotropy, 8.0f);
-	EXPECT_EQ(declared.myAddressU, Gpu::TextureAddress::Mirror);
-	EXPECT_EQ(declared.myAddressV, Gpu::TextureAddress::Border);
-	EXPECT_EQ(declared.myAddressW, Gpu::TextureAddress::Clamp); // Direct3D's default for what is not said
-	EXPECT_EQ(declared.myBorderColor[1], 0.5f);
-	EXPECT_EQ(declared.myMaxLod, 4.5f);
+	EXPECT_EQ(std::tuple(declared.myFilter, declared.myMaxAnisotropy, declared.myAddressU,
+	                     declared.myAddressV, declared.myAddressW, declared.myBorderColor[1],
+	                     declared.myMinLod, declared.myMaxLod),
+	          std::tuple(Gpu::Filter::Anisotropic, 8.0f, Gpu::TextureAddress::Mirror,
+	                     Gpu::TextureAddress::Border, Gpu::TextureAddress::Clamp, 0.5f, 1.0f, 4.5f));
 	const Fx::VariableDesc& undeclared = desc.myVariables[1];
-	EXPECT_EQ(undeclared.mySampler.myFilter, Gpu::Filter::Linear);
-	EXPECT_EQ(undeclared.mySampler.myAddressV, Gpu::TextureAddress::Wrap);
-	EXPECT_EQ(undeclared.myElementCount, 2);
+	EXPECT_EQ(
+	    std::tuple(undeclared.mySampler.myFilter, undeclared.mySampler.myAddressV, undeclared.myElementCount),
+	    std::tuple(Gpu::Filter::Linear, Gpu::TextureAddress::Wrap, 2));
 	const Gpu::SamplerDesc& shadow = desc.myVariables[2].mySampler;
-	EXPECT_TRUE(shadow.myComparisonFlag);
-	EXPECT_EQ(shadow.myComparison, Gpu::Comparison::LessEqual);
-	// Units follow the declaration order; the array takes two.
-	EXPECT_EQ(desc.myVariables[0].myUnit, 0);
-	EXPECT_EQ(undeclared.myUnit, 1);
-	EXPECT_EQ(desc.myVariables[2].myUnit, 3);
+	EXPECT_EQ(std::tuple(shadow.myComparisonFlag, shadow.myComparison),
+	          std::tuple(true, Gpu::Comparison::LessEqual));
+	EXPECT_EQ(std::tuple(desc.myVariables[0].myUnit, undeclared.myUnit, desc.myVariables[2].myUnit),
+	          std::tuple(0, 1, 3));
 }
