@@ -118,10 +118,21 @@ TEST(ColladaGeometryTest, NodeTransformsComposeInFileOrderAndInstanceNodesResolv
 	ExpectPoint(Apply(a->myInstances[0].myNode->GetLocalMatrix(), 1, 2, 3), 2, 4, 6);
 }
 
-// The strongest four joints stay, in order of weight, and share the whole weight. (A real skin's
-// weights reach the model through the import.)
-TEST(ColladaGeometryTest, ReduceInfluencesKeepsTheStrongestFourNormalised)
+// A real exporter's skin gives every vertex its influences and every joint its bind matrix; reduced,
+// the strongest four joints stay, in order of weight, and share the whole weight.
+TEST(ColladaGeometryTest, SkinWeightsAndReduceInfluences)
 {
+	Collada::Document document;
+	std::string error;
+	ASSERT_TRUE(document.Load("../shared/testdata/collada/box_nested_animation.dae", error)) << error;
+	const Collada::Skin& skin = document.GetControllers().at(0).mySkin;
+	ASSERT_NE(document.FindGeometry(skin.mySource), nullptr);
+	EXPECT_EQ(skin.myInfluences.size(), size_t(document.FindGeometry(skin.mySource)
+	                                               ->myMesh.FindSourceBySemantic(Collada::Semantic::Position)
+	                                               ->myCount));
+	EXPECT_EQ(skin.myJointNames.size(), skin.myInverseBindMatrices.size());
+	EXPECT_FALSE(skin.myJointNames.empty());
+
 	Collada::Skin reduced;
 	reduced.myInfluences = {{{0, 0.1f}, {1, 0.4f}, {2, 0.05f}, {3, 0.2f}, {4, 0.15f}, {5, 0.1f}},
 	                        {{7, 0.5f}}};
