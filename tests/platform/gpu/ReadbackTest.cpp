@@ -41,11 +41,17 @@ TEST_F(ReadbackTest, RenderedTargetSurvivesAPngRoundTrip)
 
 	EXPECT_FALSE(Gpu::SavePng("/proc/lumora/none.png", 64, 32, pixels.data()));
 	EXPECT_FALSE(Gpu::SavePng(path, 0, 32, pixels.data()));
-	// A float target reads back as floats only.
-	Gpu::Texture* floats = MakeTarget(Dds::Format::R16G16B16A16_FLOAT, 4, 4);
+	// A float target reads back as floats only, beyond 0..1 both ways (values a half holds exactly).
+	Gpu::Texture* floats = MakeTarget(Dds::Format::R16G16B16A16_FLOAT, 1, 1);
 	ASSERT_NE(floats, nullptr);
+	Gpu::RenderTargetView* floatView = floats->CreateRenderTargetView();
+	const std::vector<float> color = {0.25f, -2.0f, 1000.0f, 1.0f};
+	GetContext().ClearRenderTargetView(*floatView, color.data());
+	std::vector<float> values;
+	EXPECT_TRUE(Gpu::ReadRenderTarget(GetContext(), *floatView, values));
+	EXPECT_EQ(values, color);
 	std::vector<uint8_t> bytes;
-	EXPECT_FALSE(Gpu::ReadRenderTarget(GetContext(), *floats->CreateRenderTargetView(), bytes));
+	EXPECT_FALSE(Gpu::ReadRenderTarget(GetContext(), *floatView, bytes));
 	ExpectReports({{"/proc/lumora/none.png"}, {}, {"Format 10 is not an 8-bit RGBA target"}});
 }
 
