@@ -15,7 +15,6 @@ int LumoraFuzz::Dds(const uint8_t* someData, size_t aSize)
 		Require(!error.empty() && image.IsEmpty());
 		return 0;
 	}
-	++ourAcceptedCount;
 	std::vector<uint8_t> saved;
 	::Dds::Image again;
 	Require(::Dds::SaveToMemory(image, saved, error) &&

@@ -32,12 +32,9 @@ int Ambient(const uint8_t* someData, size_t aSize);
 // saved and loaded again. Without an OpenGL context it does nothing.
 int Level(const uint8_t* someData, size_t aSize);
 
-// How many inputs the entries above accepted as valid files (the level entry counts none), so
-// that a test can tell that its mutations reached both the accepting and the refusing paths.
-inline int ourAcceptedCount = 0;
-
 // Whether the level entry has its facade (made on first use).
 bool LevelAvailable();
-// Takes the level entry's facade down and returns to the working directory it started in.
+// Takes the level entry's facade down and returns to the working directory it started in; the
+// level entry is not called again after it.
 void ShutDownLevel();
 } // namespace LumoraFuzz

@@ -8,6 +8,7 @@
 
 #include <array>
 #include <bitset>
+#include <cstdio>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -32,66 +33,46 @@ constexpr std::array<const char*, 7> ourFiles = {
     "data/XML/DecalTypes.xml",
 };
 
-struct LevelState
-{
-	bool myTriedFlag = false;
-	Lumora::LumoraWrapper* myFacade = nullptr;
-	fs::path myScratch;
-	fs::path myPreviousDirectory;
-};
+// The scratch working directory, and the one the process started in.
+fs::path ourScratch;
+fs::path ourPreviousDirectory;
 
-// How many point lights, spot lights, decals, path nodes and edges the facade holds.
-std::array<int, 5> Records(const Lumora::LumoraWrapper& aFacade)
-{
-	return {aFacade.GetPointLights().Count(), aFacade.GetSpotLights().Count(), aFacade.GetDecals().Count(),
-	        aFacade.GetNodes().Count(), aFacade.GetEdges().Count()};
-}
-
-LevelState& State()
-{
-	static LevelState ourState;
-	return ourState;
-}
-
+// The facade, made on the first call (null without an OpenGL context).
 Lumora::LumoraWrapper* Facade()
 {
-	LevelState& state = State();
-	if (state.myTriedFlag)
-	{
-		return state.myFacade;
-	}
-	state.myTriedFlag = true;
-	Gpu::Device probe;
-	if (!probe.Init(16, 16))
-	{
-		return nullptr;
-	}
-	probe.Destroy();
-	const fs::path source = fs::path(LUMORA_FUZZ_SOURCE_ROOT) / "data";
-	state.myScratch = fs::temp_directory_path() / ("lumora-fuzz-level-" + std::to_string(::getpid()));
-	fs::remove_all(state.myScratch);
-	fs::create_directories(state.myScratch / "data/XML/levels/fuzz");
-	for (const fs::directory_entry& entry : fs::directory_iterator(source))
-	{
-		if (entry.path().filename() != "XML")
+	static Lumora::LumoraWrapper* const ourFacade = []() -> Lumora::LumoraWrapper* {
+		Gpu::Device probe;
+		if (!probe.Init(16, 16))
 		{
-			fs::create_directory_symlink(entry.path(), state.myScratch / "data" / entry.path().filename());
+			return nullptr;
 		}
-	}
-	fs::copy(source / "XML/EntityTypes.xml", state.myScratch / "data/XML/EntityTypes.xml");
-	fs::copy(source / "XML/DecalTypes.xml", state.myScratch / "data/XML/DecalTypes.xml");
-	state.myPreviousDirectory = fs::current_path();
-	fs::current_path(state.myScratch);
-	// A fuzzer ends by exit(), never through ShutDownLevel: the scratch folder (with a log of
-	// every input's reports) goes then. After a crash it stays, for a look at the log.
-	std::atexit([] {
-		std::error_code ignored;
-		fs::remove_all(State().myScratch, ignored);
-	});
-	Lumora::LumoraWrapper::SetFatalReportLevels(std::bitset<4>(0));
-	LumoraFuzz::Require(Lumora::LumoraWrapper::Create(0, 64, 64)); // a context was there a moment ago
-	state.myFacade = Lumora::LumoraWrapper::GetInstance();
-	return state.myFacade;
+		probe.Destroy();
+		const fs::path source = fs::path(LUMORA_FUZZ_SOURCE_ROOT) / "data";
+		ourScratch = fs::temp_directory_path() / ("lumora-fuzz-level-" + std::to_string(::getpid()));
+		fs::remove_all(ourScratch);
+		fs::create_directories(ourScratch / "data/XML/levels/fuzz");
+		for (const fs::directory_entry& entry : fs::directory_iterator(source))
+		{
+			if (entry.path().filename() != "XML")
+			{
+				fs::create_directory_symlink(entry.path(), ourScratch / "data" / entry.path().filename());
+			}
+		}
+		fs::copy(source / "XML/EntityTypes.xml", ourScratch / "data/XML/EntityTypes.xml");
+		fs::copy(source / "XML/DecalTypes.xml", ourScratch / "data/XML/DecalTypes.xml");
+		ourPreviousDirectory = fs::current_path();
+		fs::current_path(ourScratch);
+		// A fuzzer ends by exit(), never through ShutDownLevel: the scratch folder (with a log of
+		// every input's reports) goes then. After a crash it stays, for a look at the log.
+		std::atexit([] {
+			std::error_code ignored;
+			fs::remove_all(ourScratch, ignored);
+		});
+		Lumora::LumoraWrapper::SetFatalReportLevels(std::bitset<4>(0));
+		LumoraFuzz::Require(Lumora::LumoraWrapper::Create(0, 64, 64)); // a context was there a moment ago
+		return Lumora::LumoraWrapper::GetInstance();
+	}();
+	return ourFacade;
 }
 } // namespace
 
@@ -102,16 +83,13 @@ bool LumoraFuzz::LevelAvailable()
 
 void LumoraFuzz::ShutDownLevel()
 {
-	LevelState& state = State();
-	if (state.myFacade != nullptr)
+	if (Facade() != nullptr)
 	{
 		Lumora::LumoraWrapper::ShutDown();
 		Lumora::LumoraWrapper::SetFatalReportLevels(std::bitset<4>(12));
-		fs::current_path(state.myPreviousDirectory);
-		std::error_code ignored;
-		fs::remove_all(state.myScratch, ignored);
+		fs::current_path(ourPreviousDirectory);
+		fs::remove_all(ourScratch);
 	}
-	state = LevelState();
 }
 
 int LumoraFuzz::Level(const uint8_t* someData, size_t aSize)
@@ -126,8 +104,7 @@ int LumoraFuzz::Level(const uint8_t* someData, size_t aSize)
 	{
 		if (rest.data() == nullptr)
 		{
-			std::error_code ignored;
-			fs::remove(file, ignored);
+			std::remove(file);
 			continue;
 		}
 		const size_t end = rest.find('\0');
@@ -138,10 +115,15 @@ int LumoraFuzz::Level(const uint8_t* someData, size_t aSize)
 	facade->ParseLevel(u"fuzz");
 	// What the editor saves loads again, with the same records (what the loader left out stays
 	// left out, and stays in the files).
-	const std::array<int, 5> loaded = Records(*facade);
+	const auto records = [facade] {
+		return std::array{facade->GetPointLights().Count(), facade->GetSpotLights().Count(),
+		                  facade->GetDecals().Count(), facade->GetNodes().Count(),
+		                  facade->GetEdges().Count()};
+	};
+	const std::array<int, 5> loaded = records();
 	facade->SaveLights(u"fuzz");
 	facade->SaveDecals(u"fuzz");
 	facade->ParseLevel(u"fuzz");
-	Require(Records(*facade) == loaded);
+	Require(records() == loaded);
 	return 0;
 }
