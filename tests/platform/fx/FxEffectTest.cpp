@@ -1,6 +1,6 @@
-// Drawing with effects: lookups by name, variables reaching their passes, the render
-// states a pass declares, samplers, and damaged files. (The engine matrices of the
-// shipped effects show in every rendered frame.)
+// Effects on the device: lookups by name, the render states a pass declares, and damaged
+// files. (What the shipped effects draw, with their matrices, initializers, samplers and
+// several passes sharing variables, shows in every golden frame.)
 
 #include <array>
 #include <deque>
@@ -8,43 +8,14 @@
 
 #include "GpuTest.h"
 #include "platform/fx/CompiledFormat.h"
-#include "platform/fx/Compiler.h"
 #include "platform/fx/Effect.h"
 #include "support/TestSupport.h"
-
-namespace
-{
-struct SpriteVertex
-{
-	float myPosition[3];
-	float myTexCoord[2];
-};
-
-const Pixel ourOrange = {255, 128, 0, 255};
-const Pixel ourRed = {255, 0, 0, 255};
-const Pixel ourGreen = {0, 255, 0, 255};
-} // namespace
 
 class FxEffectTest : public GpuTest
 {
 protected:
-	void SetUpGpu() override
-	{
-		Gpu::Texture* depth = MakeTarget(Dds::Format::D32_FLOAT, 64, 64);
-		ASSERT_NE(depth, nullptr);
-		myDepth = depth->CreateDepthStencilView();
-		myTarget = BindTarget(Dds::Format::R8G8B8A8_UNORM, 64, 64, myDepth);
-		ASSERT_NE(myTarget, nullptr);
-		GetContext().ClearRenderTargetView(*myTarget, myClearColor);
-		GetContext().ClearDepthStencilView(*myDepth, true, false, 1.0f, 0);
-	}
-
 	void TearDown() override
 	{
-		for (Gpu::InputLayout& layout : myLayouts)
-		{
-			layout.Destroy();
-		}
 		for (Fx::Effect& effect : myEffects)
 		{
 			effect.Destroy();
@@ -52,51 +23,17 @@ protected:
 		GpuTest::TearDown();
 	}
 
-	// An effect from a compiled file under data/, or from source; null (test failed) when it does not load.
+	// An effect from a compiled file under data/; null (test failed) when it does not load.
 	Fx::Effect* Load(const std::string& aCompiledPath)
 	{
-		const std::string bytes = TestSupport::ReadWholeFile(aCompiledPath);
-		return Make({bytes.begin(), bytes.end()}, aCompiledPath);
-	}
-
-	Fx::Effect* Compile(const std::string& aSource)
-	{
-		Fx::CompileOutput output;
-		EXPECT_TRUE(Fx::CompileFromMemory(aSource, "Test.fx", output)) << output.myMessages;
-		return Make(output.myCompiled, "Test.fx");
-	}
-
-	Fx::Effect* Make(const std::vector<uint8_t>& someCompiled, const std::string& aName)
-	{
+		const std::string text = TestSupport::ReadWholeFile(aCompiledPath);
+		const std::vector<uint8_t> bytes(text.begin(), text.end());
 		Fx::Effect& effect = myEffects.emplace_back();
-		EXPECT_TRUE(effect.Init(GetContext(), someCompiled, aName)) << Joined();
+		EXPECT_TRUE(effect.Init(GetContext(), bytes, aCompiledPath)) << Joined();
 		return effect.GetTechniqueCount() > 0 ? &effect : nullptr;
 	}
 
-	// Applies the pass and draws the vertices as quads through an input layout made from its inputs.
-	template <typename Vertex> void Draw(Fx::Pass* aPass, const std::vector<Vertex>& someVertices)
-	{
-		ASSERT_NE(aPass, nullptr);
-		const bool colorFlag = std::is_same_v<Vertex, ColorVertex>;
-		const Gpu::InputElement elements[] = {
-		    {"POSITION", 0, Dds::Format::R32G32B32_FLOAT, 0, 0},
-		    {colorFlag ? "COLOR" : "TEXCOORD", 0,
-		     colorFlag ? Dds::Format::R8G8B8A8_UNORM : Dds::Format::R32G32_FLOAT, 0, 12},
-		};
-		Gpu::InputLayout& layout = myLayouts.emplace_back();
-		ASSERT_TRUE(layout.Init(GetContext(), elements, aPass->GetVertexInputs(), "test vertices"));
-		ASSERT_TRUE(aPass->Apply(GetContext()));
-		GetContext().SetInputLayout(&layout);
-		DrawVertices(someVertices);
-	}
-
-	Pixel At(int anX, int aY) { return PixelAt(ReadPixels(*myTarget), 64, anX, aY); }
-
-	const float myClearColor[4] = {0.0f, 0.0f, 1.0f, 1.0f};
-	Gpu::RenderTargetView* myTarget = nullptr;
-	Gpu::DepthStencilView* myDepth = nullptr;
 	std::deque<Fx::Effect> myEffects;
-	std::deque<Gpu::InputLayout> myLayouts;
 };
 
 TEST_F(FxEffectTest, LooksUpTechniquesPassesAndVariablesByName)
@@ -124,38 +61,6 @@ TEST_F(FxEffectTest, LooksUpTechniquesPassesAndVariablesByName)
 	EXPECT_FALSE(world->SetResource(nullptr));
 	ExpectReports({{"Variable 'World' is a mat4, not a float"}, {}, {"outside variable 'World'"}, {}});
 	EXPECT_EQ(world->GetVersion(), 0u);
-}
-
-TEST_F(FxEffectTest, VariablesKeepTheirInitializerUntilSetAndReachEveryPass)
-{
-	Fx::Effect* effect = Compile(R"(
-uniform vec4 Tint = vec4(0.0, 1.0, 0.0, 1.0);
-uniform float Unused;
-vertex V { in vec3 POSITION; void main() { gl_Position = vec4(POSITION, 1.0); } }
-fragment F { out vec4 o; void main() { o = Tint; } }
-technique T
-{
-	pass Left { VertexShader = V; PixelShader = F; CullMode = None; DepthEnable = false; }
-	pass Right { VertexShader = V; PixelShader = F; }
-}
-)");
-	ASSERT_NE(effect, nullptr);
-	Fx::Technique* technique = effect->GetTechniqueByName("T");
-	ASSERT_EQ(technique->GetPassCount(), 2);
-	// Declared but used by no pass: still a variable, which nobody receives.
-	Fx::Variable* unused = effect->GetVariableByName("Unused");
-	EXPECT_TRUE(unused->SetFloat(3.0f));
-	EXPECT_EQ(unused->GetFloats()[0], 3.0f);
-	EXPECT_EQ(technique->GetPassByIndex(0)->GetLocation(1), -1);
-
-	Draw(technique->GetPassByIndex(0), Quad(-1, 1, 0, -1, ourOrange));
-	EXPECT_EQ(At(16, 32), ourGreen);
-	const float red[4] = {1.0f, 0.0f, 0.0f, 1.0f};
-	ASSERT_TRUE(effect->GetVariableByName("Tint")->SetFloatVector(red));
-	Draw(technique->GetPassByIndex(0), Quad(-1, 1, 0, -1, ourOrange));
-	Draw(technique->GetPassByIndex(1), Quad(0, 1, 1, -1, ourOrange));
-	EXPECT_EQ(At(16, 32), ourRed);
-	EXPECT_EQ(At(48, 32), ourRed);
 }
 
 // Applied in this order: Vertex_PosCol's Render declares depth and rasterizer states, not blending,
@@ -186,46 +91,6 @@ TEST_F(FxEffectTest, PassesSetOnlyTheStateGroupsTheyDeclare)
 		                                glIsEnabled(GL_CULL_FACE), polygonMode[0]}),
 		          pass.myStates);
 	}
-}
-
-TEST_F(FxEffectTest, SpriteSamplesWithItsClampSamplerAndDeclaredSamplersWrap)
-{
-	Fx::Effect* sprite = Load("data/Shaders/Sprite/Sprite.fxal");
-	ASSERT_NE(sprite, nullptr);
-	// Two texels, red then green.
-	Gpu::Texture* texture = MakeTexture(
-	    {.myWidth = 2, .myHeight = 1, .myFormat = Dds::Format::R8G8B8A8_UNORM, .myLabel = "red green"});
-	ASSERT_NE(texture, nullptr);
-	const uint8_t texels[8] = {255, 0, 0, 255, 0, 255, 0, 255};
-	ASSERT_TRUE(texture->Upload(0, 0, texels, 8));
-
-	// A full-screen quad with u running 0..2 from left to right.
-	auto vertex = [](float anX, float aY, float aU) {
-		return SpriteVertex{{anX, aY, 0.5f}, {aU, aY > 0 ? 0.0f : 1.0f}};
-	};
-	const std::vector<SpriteVertex> quad = {vertex(-1, 1, 0), vertex(1, 1, 2), vertex(1, -1, 2),
-	                                        vertex(-1, -1, 0)};
-	const float opaque[4] = {1, 1, 1, 1};
-	ASSERT_TRUE(
-	    sprite->GetVariableByName("SpriteTexture")->SetResource(texture->GetDefaultShaderResourceView()));
-	ASSERT_TRUE(sprite->GetVariableByName("SpriteColor")->SetFloatVector(opaque));
-	Draw(sprite->GetTechniqueByName("Render")->GetPassByIndex(0), quad);
-	EXPECT_EQ(At(2, 32), ourRed);
-	EXPECT_EQ(At(38, 32), ourGreen); // u = 1.2: past the edge, the last texel
-
-	// The same texture through a point sampler that wraps: u = 1.2 is the first texel again.
-	Fx::Effect* wrapping = Compile(R"(
-uniform sampler2D Texture;
-sampler Texture { Filter = MIN_MAG_MIP_POINT; AddressU = Wrap; }
-vertex V { in vec3 POSITION; in vec2 TEXCOORD0; out vec2 vUv; void main() { vUv = TEXCOORD0; gl_Position = vec4(POSITION, 1); } }
-fragment F { in vec2 vUv; out vec4 o; void main() { o = texture(Texture, vUv); } }
-technique T { pass P { VertexShader = V; PixelShader = F; CullMode = None; DepthEnable = false; } }
-)");
-	ASSERT_NE(wrapping, nullptr);
-	ASSERT_TRUE(wrapping->GetVariableByName("Texture")->SetResource(texture->GetDefaultShaderResourceView()));
-	Draw(wrapping->GetTechniqueByName("T")->GetPassByIndex(0), quad);
-	EXPECT_EQ(At(38, 32), ourRed);
-	EXPECT_EQ(At(60, 32), ourGreen);
 }
 
 TEST_F(FxEffectTest, DamagedAndUnlinkableEffectsAreReported)
