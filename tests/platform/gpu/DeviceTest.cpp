@@ -1,11 +1,7 @@
 #include "platform/gpu/Buffer.h"
 #include "platform/gpu/Readback.h"
 
-#include <cstdio>
-#include <filesystem>
-#include <sys/wait.h>
 #include <thread>
-#include <unistd.h>
 
 #include "GpuTest.h"
 
@@ -13,17 +9,10 @@ namespace
 {
 using DeviceTest = GpuTest;
 
-// Direct3D's conventions are set once on the context; the renderer never sets them again.
+// Direct3D's conventions are set once on the context (its clip origin, depth range and front
+// faces show in every rendered frame; cube maps filter across their seams, as Direct3D's do).
 TEST_F(DeviceTest, ContextFollowsDirect3DAndBadInitIsReportedNotFatal)
 {
-	for (const auto& [query, expected] : {std::pair<GLenum, GLint>{GL_CLIP_ORIGIN, GL_UPPER_LEFT},
-	                                      {GL_CLIP_DEPTH_MODE, GL_ZERO_TO_ONE},
-	                                      {GL_FRONT_FACE, GL_CW}})
-	{
-		GLint value = 0;
-		glGetIntegerv(query, &value);
-		EXPECT_EQ(value, expected) << std::hex << query;
-	}
 	EXPECT_TRUE(glIsEnabled(GL_TEXTURE_CUBE_MAP_SEAMLESS));
 
 	EXPECT_FALSE(myDevice.Init(64, 64));
@@ -110,69 +99,3 @@ TEST_F(DeviceTest, BuffersStartZeroAndOnlyDynamicOnesChange)
 	}
 }
 } // namespace
-
-// Mesa reads MESA_GL_VERSION_OVERRIDE once per process, so a driver that offers
-// only an older GL is played by a child process: this test's binary again, run
-// for this test alone with the variable set, which reports how Init failed.
-namespace
-{
-constexpr const char* ourProbeVariable = "LUMORA_DEVICE_PROBE";
-
-struct ProbeResult
-{
-	int myExitCode = -1;
-	std::string myOutput;
-};
-
-// Runs this test alone in a child process whose driver offers only aGlVersion.
-ProbeResult RunProbe(const char* aGlVersion)
-{
-	const testing::TestInfo* test = testing::UnitTest::GetInstance()->current_test_info();
-	const std::string command = std::string(ourProbeVariable) + "=1 MESA_GL_VERSION_OVERRIDE=" + aGlVersion +
-	                            " '" + std::filesystem::read_symlink("/proc/self/exe").string() +
-	                            "' --gtest_filter=" + test->test_suite_name() + "." + test->name() + " 2>&1";
-	ProbeResult result;
-	FILE* child = popen(command.c_str(), "r");
-	if (child == nullptr)
-	{
-		return result;
-	}
-	char buffer[4096];
-	for (size_t count; (count = std::fread(buffer, 1, sizeof(buffer), child)) > 0;)
-	{
-		result.myOutput.append(buffer, count);
-	}
-	const int status = pclose(child);
-	result.myExitCode = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-	return result;
-}
-} // namespace
-
-TEST(DeviceFailureTest, OlderGlIsVersionTooLowNotNoDevice)
-{
-	if (std::getenv(ourProbeVariable) != nullptr)
-	{
-		// The child: report through standard error, answer with the failure's number.
-		Gpu::Device device;
-		const bool initializedFlag = device.Init(16, 16);
-		std::printf("probe: %s; version '%s'; %s\n", initializedFlag ? "initialized" : "failed",
-		            device.GetVersionName().c_str(), device.GetFailureText().c_str());
-		std::fflush(stdout);
-		device.Destroy();
-		_exit(static_cast<int>(device.GetFailure()));
-	}
-	{
-		Gpu::Device device;
-		if (!device.Init(16, 16))
-		{
-			LUMORA_SKIP_OR_FAIL("No OpenGL 4.5 core context");
-		}
-		EXPECT_EQ(device.GetFailure(), Gpu::DeviceFailure::None);
-		device.Destroy();
-	}
-
-	const ProbeResult older = RunProbe("4.1");
-	EXPECT_EQ(older.myExitCode, static_cast<int>(Gpu::DeviceFailure::VersionTooLow)) << older.myOutput;
-	EXPECT_NE(older.myOutput.find("OpenGL 4.5 core profile is needed"), std::string::npos) << older.myOutput;
-	EXPECT_NE(older.myOutput.find("version '4.1"), std::string::npos) << older.myOutput;
-}
