@@ -16,12 +16,16 @@
 //   }
 
 #include <array>
+#include <atomic>
+#include <chrono>
+#include <epoxy/egl.h>
 #include <filesystem>
+#include <functional>
 #include <gmock/gmock-matchers.h>
 #include <gtest/gtest.h>
 #include <sstream>
 #include <string>
-#include <system_error>
+#include <thread>
 #include <vector>
 
 #include "core/Matrix44.h"
@@ -217,6 +221,69 @@ inline std::vector<float> Values(const Zeph::SpotLightData& aLight)
 	values.insert(values.end(), aLight.myOrientation.myMatrix, aLight.myOrientation.myMatrix + 16);
 	return values;
 }
+
+// A render loop on its own thread, as the editor has one: Update and Render without pause until
+// Stop. Frames are counted inside the frame (after anObserver, where one is given); a frame step
+// that leaves the GL context current on the loop's thread counts as a leak.
+class RenderLoop
+{
+public:
+	explicit RenderLoop(Lumora::LumoraWrapper& aFacade,
+	                    const std::function<void(const Lumora::LumoraWrapper&)>& anObserver = {})
+	    : myFacade(aFacade)
+	{
+		myFacade.SetFrameObserver([this, anObserver](const Lumora::LumoraWrapper& aFrameFacade) {
+			if (anObserver)
+			{
+				anObserver(aFrameFacade);
+			}
+			myFrames.fetch_add(1);
+		});
+		myThread = std::thread([this] {
+			while (!myStopFlag.load())
+			{
+				myFacade.Update(16.0f);
+				myFacade.Render();
+				if (eglGetCurrentContext() != EGL_NO_CONTEXT)
+				{
+					myContextLeaks.fetch_add(1);
+				}
+			}
+		});
+	}
+	~RenderLoop() { Stop(); }
+
+	int Frames() const { return myFrames.load(); }
+	int ContextLeaks() const { return myContextLeaks.load(); }
+
+	// Waits until aCount frames more than now have been drawn (30 s at most).
+	void WaitForFrames(int aCount) const
+	{
+		const int target = myFrames.load() + aCount;
+		const auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(30);
+		while (myFrames.load() < target && std::chrono::steady_clock::now() < deadline)
+		{
+			std::this_thread::sleep_for(std::chrono::milliseconds(1));
+		}
+	}
+
+	void Stop()
+	{
+		if (myThread.joinable())
+		{
+			myStopFlag = true;
+			myThread.join();
+			myFacade.SetFrameObserver({});
+		}
+	}
+
+private:
+	Lumora::LumoraWrapper& myFacade;
+	std::atomic<int> myFrames{0};
+	std::atomic<int> myContextLeaks{0};
+	std::atomic<bool> myStopFlag{false};
+	std::thread myThread;
+};
 
 // Decals need the shipped catalogue's "brick", the type every new decal takes; without
 // it the test is skipped.
