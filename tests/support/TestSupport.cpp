@@ -1,5 +1,7 @@
 #include "support/TestSupport.h"
 
+#include <filesystem>
+
 #include <cstdlib>
 #include <fstream>
 #include <sstream>
@@ -35,5 +37,11 @@ void WriteWholeFile(const std::string& aPath, const std::string& someBytes)
 {
 	std::ofstream out(aPath, std::ios::binary | std::ios::trunc);
 	out << someBytes;
+}
+
+bool HasSharedTestData()
+{
+	std::error_code ignored;
+	return std::filesystem::is_directory("../shared/testdata", ignored);
 }
 }

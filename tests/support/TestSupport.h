@@ -27,6 +27,13 @@ private:
 	std::filesystem::path myPath;
 };
 
+// Whether ../shared/testdata (real files from other exporters, beside the repository as CI has
+// it) is there; a bare clone lacks it and the tests that read it skip.
+bool HasSharedTestData();
+#define LUMORA_SKIP_WITHOUT_SHARED_TESTDATA()                                                            \
+	if (!TestSupport::HasSharedTestData())                                                               \
+	GTEST_SKIP() << "../shared/testdata is absent (CI has it beside the repository)"
+
 // The bytes of a file, or an empty string when it cannot be read.
 std::string ReadWholeFile(const std::string& aPath);
 

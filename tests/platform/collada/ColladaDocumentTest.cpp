@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "platform/collada/Document.h"
+#include "support/TestSupport.h"
 
 namespace
 {
@@ -47,6 +48,7 @@ Counts CountsOf(const Collada::Document& aDocument)
 
 TEST(ColladaDocumentTest, RealDocumentsLoadWithTheirCounts)
 {
+	LUMORA_SKIP_WITHOUT_SHARED_TESTDATA();
 	const std::pair<const char*, Counts> documents[] = {
 	    {"Cinema4D.dae", {"Y_UP", {{1, 3, 756}, {1, 3, 528}, {1, 3, 12}}, {3, 0, 0, 0, 1, 0}}},
 	    {"ConcavePolygon.dae", {"Y_UP", {{1, 1, 64}}, {1, 0, 0, 0, 1, 0}}},
@@ -70,6 +72,7 @@ TEST(ColladaDocumentTest, RealDocumentsLoadWithTheirCounts)
 
 TEST(ColladaDocumentTest, MaterialsLeadToImageFilesAndCamerasAndLightsKeepTheirParameters)
 {
+	LUMORA_SKIP_WITHOUT_SHARED_TESTDATA();
 	Collada::Document document;
 	std::string error;
 	ASSERT_TRUE(document.Load("../shared/testdata/collada/kwxport_test_vcolors.dae", error)) << error;

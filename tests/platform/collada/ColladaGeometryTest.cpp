@@ -6,6 +6,7 @@
 #include <vector>
 
 #include "platform/collada/Document.h"
+#include "support/TestSupport.h"
 
 namespace
 {
@@ -120,6 +121,7 @@ TEST(ColladaGeometryTest, NodeTransformsComposeInFileOrderAndInstanceNodesResolv
 // the strongest four joints stay, in order of weight, and share the whole weight.
 TEST(ColladaGeometryTest, SkinWeightsAndReduceInfluences)
 {
+	LUMORA_SKIP_WITHOUT_SHARED_TESTDATA();
 	Collada::Document document;
 	std::string error;
 	ASSERT_TRUE(document.Load("../shared/testdata/collada/box_nested_animation.dae", error)) << error;
