@@ -1,7 +1,6 @@
 #include "support/Golden.h"
 
 #include <algorithm>
-#include <cstdio>
 #include <cstdlib>
 #include <filesystem>
 #include <png.h>
@@ -20,14 +19,11 @@ bool ReadPng(const std::string& aPath, int& aWidth, int& aHeight, std::vector<ui
 	}
 	image.format = PNG_FORMAT_RGBA;
 	someRgba.resize(PNG_IMAGE_SIZE(image));
-	if (!png_image_finish_read(&image, nullptr, someRgba.data(), 0, nullptr))
-	{
-		png_image_free(&image);
-		return false;
-	}
+	const bool readFlag = png_image_finish_read(&image, nullptr, someRgba.data(), 0, nullptr) != 0;
+	png_image_free(&image); // nothing to free after a finished read; safe either way
 	aWidth = static_cast<int>(image.width);
 	aHeight = static_cast<int>(image.height);
-	return true;
+	return readFlag;
 }
 
 std::string CompareWithGolden(const std::string& aName, int aWidth, int aHeight,
@@ -52,27 +48,20 @@ std::string CompareWithGolden(const std::string& aName, int aWidth, int aHeight,
 		return golden + " is " + std::to_string(width) + "x" + std::to_string(height) + ", the render " +
 		       std::to_string(aWidth) + "x" + std::to_string(aHeight);
 	}
-	std::vector<uint8_t> difference(someRgba.size(), 0);
+	// The difference image: grey levels 16 times the pixel's largest channel difference, opaque.
+	std::vector<uint8_t> difference(someRgba.size(), 255);
 	size_t differing = 0;
 	int largest = 0;
 	for (size_t pixel = 0; pixel < someRgba.size() / 4; ++pixel)
 	{
-		int worst = 0;
-		for (size_t channel = 0; channel < 4; ++channel)
-		{
-			const size_t at = pixel * 4 + channel;
-			worst = std::max(worst, std::abs(someRgba[at] - expected[at]));
-		}
+		const auto channel = [&](size_t anIndex) {
+			return std::abs(someRgba[pixel * 4 + anIndex] - expected[pixel * 4 + anIndex]);
+		};
+		const int worst = std::max({channel(0), channel(1), channel(2), channel(3)});
 		largest = std::max(largest, worst);
-		const uint8_t shade = static_cast<uint8_t>(std::min(255, worst * 16));
-		difference[pixel * 4] = shade;
-		difference[pixel * 4 + 1] = shade;
-		difference[pixel * 4 + 2] = shade;
-		difference[pixel * 4 + 3] = 255;
-		if (worst > aTolerance.myChannel)
-		{
-			++differing;
-		}
+		std::fill_n(difference.begin() + static_cast<std::ptrdiff_t>(pixel * 4), 3,
+		            static_cast<uint8_t>(std::min(255, worst * 16)));
+		differing += worst > aTolerance.myChannel ? 1 : 0;
 	}
 	const size_t allowed =
 	    static_cast<size_t>(aTolerance.myPixelFraction * static_cast<double>(someRgba.size() / 4));
@@ -80,13 +69,12 @@ std::string CompareWithGolden(const std::string& aName, int aWidth, int aHeight,
 	{
 		return "";
 	}
-	const std::filesystem::path out = std::filesystem::temp_directory_path() / "lumora-golden";
-	const std::string actualPath = (out / (aName + "-actual.png")).string();
-	const std::string differencePath = (out / (aName + "-difference.png")).string();
-	Gpu::SavePng(actualPath, aWidth, aHeight, someRgba.data());
-	Gpu::SavePng(differencePath, aWidth, aHeight, difference.data());
+	const std::string out = (std::filesystem::temp_directory_path() / "lumora-golden" / aName).string();
+	Gpu::SavePng(out + "-actual.png", aWidth, aHeight, someRgba.data());
+	Gpu::SavePng(out + "-difference.png", aWidth, aHeight, difference.data());
 	return std::to_string(differing) + " pixels differ from " + golden + " by more than " +
 	       std::to_string(aTolerance.myChannel) + "/255 (largest " + std::to_string(largest) + ", " +
-	       std::to_string(allowed) + " allowed); actual: " + actualPath + ", difference: " + differencePath;
+	       std::to_string(allowed) + " allowed); actual: " + out + "-actual.png, difference: " + out +
+	       "-difference.png";
 }
 } // namespace TestSupport
