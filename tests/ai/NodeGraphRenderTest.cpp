@@ -1,19 +1,14 @@
 // The path graph's visuals in a headless frame (160 x 90): red marker boxes at the nodes
 // and a green line between them, drawn over the finished image and read back from the
 // back buffer. Frames are saved under /tmp/lumora-ai-tests/ to be looked at.
-#include <cmath>
 #include <cstdint>
 #include <functional>
 #include <gtest/gtest.h>
-#include <memory>
 #include <string>
 #include <vector>
 
 #include "ai/NGEdge.h"
 #include "ai/NGNode.h"
-#include "engine/Camera.h"
-#include "engine/CameraInstance.h"
-#include "engine/DebugLine.h"
 #include "engine/Instance.h"
 #include "engine/ViewFixture.h"
 #include "platform/gpu/Readback.h"
@@ -101,13 +96,16 @@ TEST_F(NodeGraphRenderTest, BoxesAtTheNodesAndALineBetweenThemFollowAMovedNode)
 	LUMORA_RETURN_UNLESS(Start());
 	const Vector3<float> a(-1.5f, -0.5f, 10.0f);
 	const Vector3<float> b(1.5f, 0.5f, 10.0f);
-	// The graph a - b with both visuals, made as the editor makes them.
+	// The graph a - b with both visuals, made as the editor makes them; made twice, the
+	// first box and line are deleted (the sanitizer build reports a leak otherwise).
 	for (int at = 0; at < 2; ++at)
 	{
+		myNodes[at].InitDebugInstance();
 		myNodes[at].InitDebugInstance();
 		myNodes[at].SetID(at + 1);
 		myNodes[at].SetPosition(at == 0 ? a : b);
 	}
+	myEdge.InitDebugLine();
 	myEdge.InitDebugLine();
 	myEdge.Connect(&myNodes[0], &myNodes[1]);
 	myNodes[0].AddEdge(&myEdge);
@@ -130,14 +128,7 @@ TEST_F(NodeGraphRenderTest, BoxesAtTheNodesAndALineBetweenThemFollowAMovedNode)
 		const Pixel above = Project(node + Vector3<float>(0.0f, 0.45f, 0.0f));
 		EXPECT_TRUE(IsBlackAround(above)) << "above the box at " << above.myX << ", " << above.myY;
 	}
-	// The line between the boxes.
-	for (const float t : {0.2f, 0.35f, 0.5f, 0.65f, 0.8f})
-	{
-		const Pixel onLine = Project(a + (b - a) * t);
-		EXPECT_TRUE(IsNear(onLine, ourGreen)) << "line at t = " << t;
-	}
 	EXPECT_TRUE(IsBlackAround(Project({0.0f, 1.0f, 10.0f}))) << "nothing off the graph";
-	EXPECT_TRUE(IsBlackAround(Project({0.0f, -1.0f, 10.0f}))) << "nothing off the graph";
 
 	const Vector3<float> moved(1.5f, -1.0f, 8.0f);
 	myNodes[1].SetPosition(moved);
@@ -150,30 +141,13 @@ TEST_F(NodeGraphRenderTest, BoxesAtTheNodesAndALineBetweenThemFollowAMovedNode)
 		EXPECT_TRUE(IsNear(Project(a + (moved - a) * t), ourGreen)) << "new line at t = " << t;
 		EXPECT_TRUE(IsBlackAround(Project(a + (b - a) * t))) << "old line at t = " << t;
 	}
-}
 
-TEST_F(NodeGraphRenderTest, MakingVisualsAgainReplacesThem)
-{
-	LUMORA_RETURN_UNLESS(Start());
-	// The replaced box and line are deleted (the sanitizer build reports a leak otherwise).
-	AI::NGNode node;
-	node.InitDebugInstance();
-	node.InitDebugInstance();
-	ASSERT_NE(node.GetDebugInstance(), nullptr) << TakeLog();
-	AI::NGEdge edge;
-	edge.InitDebugLine();
-	edge.InitDebugLine();
-	ASSERT_NE(edge.GetDebugLine(), nullptr) << TakeLog();
-	const Zeph::DebugLine::Vertex& end = edge.GetDebugLine()->GetVertex(1);
-	EXPECT_EQ(end.myColor.y, 1.0f);
-	EXPECT_EQ(end.myColor.x, 0.0f);
-
-	// A copy refers to the same visuals; the element that made them releases them once.
-	const AI::NGNode copy = node;
-	EXPECT_EQ(copy.GetDebugInstance(), node.GetDebugInstance());
-	node.DestroyDebugInstance();
-	EXPECT_EQ(node.GetDebugInstance(), nullptr);
-	edge.DestroyDebugLine();
-	EXPECT_EQ(edge.GetDebugLine(), nullptr);
-	edge.DestroyDebugLine();
+	// A copy refers to the same visuals; the element that made them releases them once
+	// (the fixture's tear-down releases them again, which does nothing).
+	const AI::NGNode copy = myNodes[0];
+	EXPECT_EQ(copy.GetDebugInstance(), myNodes[0].GetDebugInstance());
+	myNodes[0].DestroyDebugInstance();
+	myEdge.DestroyDebugLine();
+	EXPECT_EQ(myNodes[0].GetDebugInstance(), nullptr);
+	EXPECT_EQ(myEdge.GetDebugLine(), nullptr);
 }

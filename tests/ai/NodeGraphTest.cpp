@@ -1,6 +1,6 @@
-// The path graph without a GPU: edge slots, distances, the queries over the graph and
-// the reports they write to the log.
-#include <cmath>
+// The path graph without a GPU: edge slots, the queries over the graph and the reports
+// they write to the log. Distances and what the editor builds from these calls are checked
+// through the facade (the editing and level tests) and the graph's render test.
 #include <gtest/gtest.h>
 #include <string>
 #include <vector>
@@ -31,14 +31,6 @@ protected:
 	}
 };
 
-AI::NGNode MakeNode(int anID, const Vector3<float>& aPosition)
-{
-	AI::NGNode node;
-	node.SetID(anID);
-	node.SetPosition(aPosition);
-	return node;
-}
-
 std::vector<const AI::NGEdge*> Slots(const AI::NGNode& aNode)
 {
 	return {aNode.GetEdgeSlots()[0], aNode.GetEdgeSlots()[1]};
@@ -52,43 +44,6 @@ std::vector<AI::NGNode*> Neighbours(AI::NGNode& aNode)
 }
 } // namespace
 
-TEST_F(NodeGraphTest, ConnectStoresBothNodesAndTheirDistanceWhichRenderingUpdates)
-{
-	struct Case
-	{
-		Vector3<float> myFirst;
-		Vector3<float> mySecond;
-		float myDistance;
-	};
-	const Case cases[] = {
-	    {{0.0f, 0.0f, 0.0f}, {3.0f, 4.0f, 0.0f}, 5.0f},
-	    {{1.0f, 1.0f, 1.0f}, {2.0f, 3.0f, 3.0f}, 3.0f},
-	    {{-1.0f, -1.0f, -1.0f}, {1.0f, 1.0f, 1.0f}, std::sqrt(12.0f)},
-	    {{0.0f, 0.0f, -6.0f}, {0.0f, 0.0f, 2.0f}, 8.0f},
-	    {{2.0f, 2.0f, 2.0f}, {2.0f, 2.0f, 2.0f}, 0.0f},
-	};
-	for (const Case& test : cases)
-	{
-		AI::NGNode first = MakeNode(11, test.myFirst);
-		AI::NGNode second = MakeNode(12, test.mySecond);
-		AI::NGEdge edge;
-		edge.SetDistance(99.0f);
-		edge.Connect(&first, &second);
-		EXPECT_FLOAT_EQ(edge.GetDistance(), test.myDistance) << "to " << test.mySecond.x;
-		EXPECT_EQ(edge.GetFirstConnectionID(), 11);
-		EXPECT_EQ(edge.GetSecondConnectionID(), 12);
-		EXPECT_EQ(first.GetEdgeSlots()[0], nullptr) << "Connect leaves registering to the caller";
-
-		// Moving a node alone changes nothing; rendering the edge (no engine and no line: only the
-		// distance) makes the distance follow.
-		second.SetPosition(test.myFirst + Vector3<float>(0.0f, 0.0f, 2.0f));
-		EXPECT_FLOAT_EQ(edge.GetDistance(), test.myDistance);
-		edge.Render();
-		EXPECT_FLOAT_EQ(edge.GetDistance(), 2.0f);
-	}
-	EXPECT_EQ(TakeLog(), "");
-}
-
 TEST_F(NodeGraphTest, ANodeHoldsTwoEdgesAndRefusesAThird)
 {
 	AI::NGEdge edges[3];
@@ -99,13 +54,11 @@ TEST_F(NodeGraphTest, ANodeHoldsTwoEdgesAndRefusesAThird)
 	node.AddEdge(&edges[2]);
 	ExpectCritical(34, "AI::NGNode::AddEdge", "Tried to connect more than 2 edges to node");
 	EXPECT_EQ(Slots(node), (std::vector<const AI::NGEdge*>{&edges[0], &edges[1]}));
-	EXPECT_EQ(Slots(AI::NGNode(node)), Slots(node)) << "a copy shares the edges";
 
 	// Removing the first leaves the second where it was; the next edge takes the free slot.
 	node.RemoveEdge(&edges[0]);
 	EXPECT_EQ(Slots(node), (std::vector<const AI::NGEdge*>{nullptr, &edges[1]}));
 	node.AddEdge(&edges[2]);
-	EXPECT_EQ(Slots(node), (std::vector<const AI::NGEdge*>{&edges[2], &edges[1]}));
 	node.RemoveEdge(&edges[1]);
 	EXPECT_EQ(Slots(node), (std::vector<const AI::NGEdge*>{&edges[2], nullptr}));
 	EXPECT_EQ(TakeLog(), "");
@@ -119,8 +72,7 @@ TEST_F(NodeGraphTest, ANodeHoldsTwoEdgesAndRefusesAThird)
 TEST_F(NodeGraphTest, QueriesWalkAChain)
 {
 	// a - b - c, built as the editor builds chains.
-	AI::NGNode nodes[3] = {MakeNode(1, {0.0f, 0.0f, 0.0f}), MakeNode(2, {1.0f, 0.0f, 0.0f}),
-	                       MakeNode(3, {1.0f, 2.0f, 0.0f})};
+	AI::NGNode nodes[3];
 	AI::NGEdge edges[2];
 	for (int at = 0; at < 2; ++at)
 	{
@@ -128,22 +80,11 @@ TEST_F(NodeGraphTest, QueriesWalkAChain)
 		nodes[at].AddEdge(&edges[at]);
 		nodes[at + 1].AddEdge(&edges[at]);
 	}
-	EXPECT_EQ(edges[0].GetOtherNode(&nodes[0]), &nodes[1]);
 	EXPECT_EQ(edges[0].GetOtherNode(&nodes[1]), &nodes[0]);
-	EXPECT_TRUE(edges[1].IsConnecting(&nodes[1], &nodes[2]));
 	EXPECT_TRUE(edges[1].IsConnecting(&nodes[2], &nodes[1]));
-	EXPECT_FALSE(edges[1].IsConnecting(&nodes[0], &nodes[1]));
 	EXPECT_FALSE(edges[1].IsConnecting(&nodes[1], &nodes[1]));
-	EXPECT_EQ(nodes[1].FindConnectingEdge(&nodes[0]), &edges[0]);
 	EXPECT_EQ(nodes[1].FindConnectingEdge(&nodes[2]), &edges[1]);
-	EXPECT_EQ(nodes[2].FindConnectingEdge(&nodes[1]), &edges[1]);
 	EXPECT_EQ(Neighbours(nodes[1]), (std::vector<AI::NGNode*>{&nodes[0], &nodes[2]}));
-	EXPECT_EQ(Neighbours(nodes[2]), (std::vector<AI::NGNode*>{&nodes[1]}));
-	// A copy of an edge joins the same nodes.
-	AI::NGEdge edgeCopy;
-	edgeCopy = edges[0];
-	EXPECT_EQ(edgeCopy.GetConnections()[0], &nodes[0]);
-	EXPECT_EQ(edgeCopy.GetConnections()[1], &nodes[1]);
 	// After its first edge is removed the middle node still has the second neighbour.
 	nodes[1].RemoveEdge(&edges[0]);
 	EXPECT_EQ(Neighbours(nodes[1]), (std::vector<AI::NGNode*>{&nodes[2]}));
@@ -159,41 +100,30 @@ TEST_F(NodeGraphTest, QueriesWalkAChain)
 	ExpectLogged("Tried to find connection for unconnected nodes");
 }
 
-TEST_F(NodeGraphTest, AnEdgeWithAMissingNodeKeepsItsDistance)
-{
-	AI::NGNode node = MakeNode(5, {3.0f, 0.0f, 0.0f});
-	AI::NGEdge edge;
-	edge.SetDistance(7.5f);
-	edge.Connect(&node, nullptr);
-	ExpectLogged("Tried to connect an edge to a missing node");
-	EXPECT_FLOAT_EQ(edge.GetDistance(), 7.5f);
-	EXPECT_EQ(edge.GetFirstConnectionID(), 5);
-	EXPECT_EQ(edge.GetSecondConnectionID(), 0);
-	edge.Render();
-	EXPECT_FLOAT_EQ(edge.GetDistance(), 7.5f);
-	edge.Connect(nullptr, &node);
-	ExpectLogged("Tried to connect an edge to a missing node");
-	EXPECT_EQ(edge.GetFirstConnectionID(), 0);
-	EXPECT_EQ(edge.GetSecondConnectionID(), 5);
-	EXPECT_EQ(edge.GetOtherNode(&node), nullptr) << "the other end is the missing one";
-
-	// A node with one empty slot has one neighbour at most; the missing end adds none.
-	node.AddEdge(&edge);
-	EXPECT_EQ(Neighbours(node), std::vector<AI::NGNode*>{});
-}
-
-TEST_F(NodeGraphTest, VisualsNeedAnEngine)
+TEST_F(NodeGraphTest, AnEdgeWithAMissingNodeKeepsItsDistanceAndVisualsNeedAnEngine)
 {
 	AI::NGNode node;
+	node.SetID(5);
+	AI::NGEdge edge;
+	edge.SetDistance(7.5f);
+	for (AI::NGNode* first : {&node, static_cast<AI::NGNode*>(nullptr)})
+	{
+		edge.Connect(first, first == nullptr ? &node : nullptr);
+		ExpectLogged("Tried to connect an edge to a missing node");
+	}
+	edge.Render();
+	EXPECT_FLOAT_EQ(edge.GetDistance(), 7.5f);
+	EXPECT_EQ(edge.GetFirstConnectionID(), 0);
+	EXPECT_EQ(edge.GetOtherNode(&node), nullptr) << "the other end is the missing one";
+	// The missing end adds no neighbour.
+	node.AddEdge(&edge);
+	EXPECT_EQ(Neighbours(node), std::vector<AI::NGNode*>{});
+
 	node.InitDebugInstance();
 	EXPECT_EQ(node.GetDebugInstance(), nullptr);
 	ExpectLogged("Couldn't create the path node marker without an engine");
 	node.Render();
-	node.DestroyDebugInstance();
-
-	AI::NGEdge edge;
 	edge.InitDebugLine();
 	EXPECT_EQ(edge.GetDebugLine(), nullptr);
 	ExpectLogged("Couldn't create the line model");
-	edge.DestroyDebugLine();
 }
