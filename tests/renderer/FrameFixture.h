@@ -38,8 +38,7 @@ protected:
 		{
 			return false;
 		}
-		Zeph::Engine* engine = Zeph::Engine::GetInstance();
-		engine->GetSetupInfo().myShadowQuality = aShadowQuality;
+		Zeph::Engine::GetInstance()->GetSetupInfo().myShadowQuality = aShadowQuality;
 		EXPECT_TRUE(Renderer().Init(ourWidth, ourHeight)) << TakeLog();
 		MakeCamera();
 		return true;
