@@ -8,6 +8,7 @@
 #include <filesystem>
 #include <functional>
 #include <numbers>
+#include <ostream>
 #include <string>
 #include <tuple>
 #include <utility>
@@ -589,6 +590,87 @@ TEST_F(PickingTest, OnlyTheModesCandidatesArePicked)
 	Facade().SetIsLightMode(LIGHT_MODE);
 	ClickCentre();
 	EXPECT_EQ(Selection(), (std::array{-1, 0, -1, -1}));
+}
+
+struct NearestCase
+{
+	const char* myName;
+	std::vector<Placed> myLights;
+	std::array<int, 4> mySelection;
+};
+
+void PrintTo(const NearestCase& aCase, std::ostream* anOut)
+{
+	*anOut << aCase.myName;
+}
+
+class NearestLightTest : public PickingTest, public testing::WithParamInterface<NearestCase>
+{
+};
+
+// A click at the centre of the view picks along the line through the camera (+z): the nearest
+// light, ties to the lower index and to the point light, the box round the camera and anything
+// past the far plane passed over, behind the camera counting as on the line.
+TEST_P(NearestLightTest, CentreClickSelectsTheNearestLightOnTheLine)
+{
+	PlaceLights(GetParam().myLights);
+	ClickCentre();
+	EXPECT_EQ(Selection(), GetParam().mySelection);
+}
+
+Placed Ahead(bool aSpotFlag, float aDistance)
+{
+	return Placed{aSpotFlag, Vector3<float>(0.0f, 10.0f, aDistance)};
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Cases, NearestLightTest,
+    testing::Values(
+        NearestCase{"SpotNearer", {Ahead(false, 5), Ahead(true, 3)}, {-1, 0, -1, -1}},
+        NearestCase{"PointNearer", {Ahead(true, 5), Ahead(false, 3)}, {0, -1, -1, -1}},
+        NearestCase{"TieToTheLowerIndex", {Ahead(false, 4), Ahead(false, 4)}, {0, -1, -1, -1}},
+        NearestCase{"TieToThePointLight", {Ahead(true, 4), Ahead(false, 4)}, {0, -1, -1, -1}},
+        NearestCase{"NearestOfThree", {Ahead(false, 9), Ahead(false, 2), Ahead(false, 6)}, {1, -1, -1, -1}},
+        NearestCase{"BoxRoundTheCamera", {Ahead(false, 0.1f), Ahead(false, 7)}, {1, -1, -1, -1}},
+        NearestCase{"PastTheFarPlane", {Ahead(false, 1000.5f)}, {-1, -1, -1, -1}},
+        NearestCase{"InsideTheFarPlane", {Ahead(false, 999.0f)}, {0, -1, -1, -1}},
+        NearestCase{"BehindAndNearest", {Ahead(false, 5), Ahead(false, -3)}, {1, -1, -1, -1}},
+        NearestCase{"OffTheLine", {{false, Vector3<float>(1.0f, 10.0f, 5.0f)}}, {-1, -1, -1, -1}}),
+    [](const testing::TestParamInfo<NearestCase>& anInfo) { return std::string(anInfo.param.myName); });
+
+// The queries report the stored values of the selection, whatever the mode, and leave the
+// caller's record alone when nothing of their kind is selected.
+TEST_F(PickingTest, QueriesReportTheSelectionOrLeaveTheRecordAlone)
+{
+	Lumora::PointLightStruct point;
+	point.falloff = -7.0f;
+	Lumora::SpotLightStruct spot;
+	spot.angles = {-4.0f, -5.0f};
+	EXPECT_FALSE(Facade().TryGetCurrentPointLight(point));
+	EXPECT_FALSE(Facade().TryGetCurrentSpotLight(spot));
+	EXPECT_EQ(std::tuple(point.falloff, spot.angles), std::tuple(-7.0f, std::array<float, 2>{-4.0f, -5.0f}));
+
+	Facade().AddPointLight();
+	Facade().ChangeColorPointLight(0.25f, 0.5f, 0.75f);
+	Facade().ChangeFalloffPointLight(3.0f);
+	ASSERT_TRUE(Facade().TryGetCurrentPointLight(point));
+	EXPECT_EQ(std::tuple(point.pos, point.col, point.falloff),
+	          std::tuple(std::array<float, 3>{0.0f, 10.0f, 10.0f},
+	                     std::array<float, 4>{0.25f, 0.5f, 0.75f, 1.0f}, 3.0f));
+	Facade().AddSpotLight();
+	Facade().MoveSelectedVector(1.0f, 2.0f, 3.0f);
+	Facade().ChangeAnglesSpotLight(0.8f, 0.6f);
+	Facade().ChangeFalloffSpotLight(2.5f);
+	ASSERT_TRUE(Facade().TryGetCurrentSpotLight(spot));
+	EXPECT_EQ(std::tuple(spot.pos, spot.direction, spot.angles, spot.falloff),
+	          std::tuple(std::array<float, 3>{1.0f, 12.0f, 13.0f}, std::array<float, 3>{0.0f, 1.0f, 0.0f},
+	                     std::array<float, 2>{0.8f, 0.6f}, 2.5f));
+	// The queries do not look at the mode.
+	Facade().SetIsLightMode(NODE_MODE);
+	Facade().AddSpotLight();
+	EXPECT_FALSE(Facade().TryGetCurrentPointLight(point));
+	ASSERT_TRUE(Facade().TryGetCurrentSpotLight(spot));
+	EXPECT_EQ(spot.pos, (std::array<float, 3>{0.0f, 10.0f, 10.0f}));
 }
 
 } // namespace
