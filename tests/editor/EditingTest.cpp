@@ -673,4 +673,24 @@ TEST_F(PickingTest, QueriesReportTheSelectionOrLeaveTheRecordAlone)
 	EXPECT_EQ(spot.pos, (std::array<float, 3>{0.0f, 10.0f, 10.0f}));
 }
 
+// The decal's pick box is plus and minus its size across and 0.5 along z, whatever its direction.
+TEST_F(DecalEditingTest, ThePickBoxIgnoresTheDirection)
+{
+	Facade().SetIsLightMode(DECAL_MODE);
+	Facade().AddDecal(); // at (0, 10, 10), size 1
+	Facade().ChangeDecalSize(2.0f);
+	Facade().YawSpotLight(1.0f);
+	Facade().PitchSpotLight(0.5f);
+	const std::pair<Vector3<float>, int> clicks[] = {{{1.9f, 11.9f, 10.0f}, 0},
+	                                                 {{-1.9f, 8.1f, 10.0f}, 0},
+	                                                 {{2.3f, 10.0f, 10.0f}, -1},
+	                                                 {{0.0f, 7.6f, 10.0f}, -1},
+	                                                 {{1.5f, 10.0f, 10.45f}, 0}};
+	for (const auto& [target, selected] : clicks)
+	{
+		ClickAt(target);
+		EXPECT_EQ(Facade().GetSelectedDecal(), selected) << target.x << " " << target.y << " " << target.z;
+	}
+}
+
 } // namespace
