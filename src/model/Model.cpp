@@ -155,7 +155,7 @@ bool Model::InitVertexBuffer()
 	desc.myDynamicFlag = myDynamicVertexBufferFlag;
 	desc.myLabel = "model vertices";
 	myVertexBuffer = std::make_unique<Gpu::Buffer>();
-	if (!myVertexBuffer->Init(desc, myVertexData.data()))
+	if (!myVertexBuffer->Init(engine->GetContext(), desc, myVertexData.data()))
 	{
 		myVertexBuffer.reset();
 		ReportCritical(__LINE__, function, "Cant Create Vertex Buffer");
@@ -194,7 +194,7 @@ bool Model::InitIndexBuffer()
 	desc.mySize = myIndexData.size();
 	desc.myLabel = "model indices";
 	myIndexBuffer = std::make_unique<Gpu::Buffer>();
-	if (!myIndexBuffer->Init(desc, myIndexData.data()))
+	if (!myIndexBuffer->Init(Engine::GetInstance()->GetContext(), desc, myIndexData.data()))
 	{
 		myIndexBuffer.reset();
 		ReportCritical(__LINE__, "Zeph::Model::InitIndexBuffer", "Cant Create Index Buffer");

@@ -2,11 +2,12 @@
 
 #include <vector>
 
+#include "platform/gpu/Context.h"
 #include "platform/gpu/Report.h"
 
 namespace Gpu
 {
-bool Buffer::Init(const BufferDesc& aDesc, const void* someData)
+bool Buffer::Init(Context& aContext, const BufferDesc& aDesc, const void* someData)
 {
 	if (myName != 0 || aDesc.mySize == 0)
 	{
@@ -22,6 +23,7 @@ bool Buffer::Init(const BufferDesc& aDesc, const void* someData)
 		someData = zeros.data();
 	}
 	myDesc = aDesc;
+	myContext = &aContext;
 	glCreateBuffers(1, &myName);
 	glNamedBufferStorage(myName, static_cast<GLsizeiptr>(aDesc.mySize), someData,
 	                     aDesc.myDynamicFlag ? GL_DYNAMIC_STORAGE_BIT : 0);
@@ -34,6 +36,7 @@ void Buffer::Destroy()
 {
 	if (myName != 0)
 	{
+		myContext->ForgetBuffer(myName);
 		glDeleteBuffers(1, &myName);
 		myName = 0;
 	}

@@ -4,12 +4,15 @@
 //   Gpu::BufferDesc desc{.myKind = Gpu::BufferKind::Constant, .mySize = sizeof(FrameConstants),
 //                        .myDynamicFlag = true, .myLabel = "frame constants"};
 //   Gpu::Buffer constants;
-//   constants.Init(desc, nullptr);
+//   constants.Init(device.GetContext(), desc, nullptr);
 //   constants.Update(&frame, sizeof(frame));      // dynamic buffers only
 //
 // Storage is immutable in size (glNamedBufferStorage); only a dynamic buffer may
 // change its contents afterwards, as with Direct3D's usage flags. The kind picks
 // where it binds later (vertex/index/uniform block); GL itself does not care.
+// Destroying a buffer unbinds it from the context it was made for, as releasing a bound
+// Direct3D buffer never left a dangling binding: GL reuses the name at once, and a later
+// draw would otherwise read the new buffer (or none) where the old one was bound.
 
 #include <cstddef>
 #include <epoxy/gl.h>
@@ -17,6 +20,8 @@
 
 namespace Gpu
 {
+class Context;
+
 enum class BufferKind
 {
 	Vertex,
@@ -41,7 +46,7 @@ public:
 	Buffer& operator=(const Buffer&) = delete;
 
 	// someData: mySize bytes of initial contents; null leaves them zero.
-	bool Init(const BufferDesc& aDesc, const void* someData);
+	bool Init(Context& aContext, const BufferDesc& aDesc, const void* someData);
 	void Destroy();
 	bool Update(const void* someData, size_t aSize, size_t anOffset = 0);
 
@@ -50,6 +55,7 @@ public:
 
 private:
 	BufferDesc myDesc;
+	Context* myContext = nullptr;
 	GLuint myName = 0;
 };
 } // namespace Gpu

@@ -307,6 +307,25 @@ void Context::ForgetInputLayout(const InputLayout& aLayout)
 	}
 }
 
+void Context::ForgetBuffer(GLuint aBuffer)
+{
+	for (VertexBinding& binding : myVertexBuffers)
+	{
+		if (binding.myBuffer == aBuffer)
+		{
+			binding = VertexBinding{};
+			myBuffersDirtyFlag = true;
+		}
+	}
+	if (myIndexBuffer == aBuffer)
+	{
+		myIndexBuffer = 0;
+		myIndexBufferSize = 0;
+		myIndexOffset = 0;
+		myBuffersDirtyFlag = true;
+	}
+}
+
 void Context::PrepareDraw()
 {
 	const GLuint vertexArray = myInputLayout ? myInputLayout->GetVertexArray() : myEmptyVertexArray;

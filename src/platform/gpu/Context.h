@@ -80,6 +80,8 @@ public:
 	bool DrawIndexed(uint32_t anIndexCount, uint32_t aStartIndex, int32_t aBaseVertex);
 	// Called by InputLayout::Destroy, so a destroyed layout is never drawn with.
 	void ForgetInputLayout(const InputLayout& aLayout);
+	// A destroyed buffer leaves every vertex slot and the index binding it held empty.
+	void ForgetBuffer(GLuint aBuffer);
 
 	void ClearRenderTargetView(const RenderTargetView& aView, const float aColor[4]);
 	void ClearDepthStencilView(const DepthStencilView& aView, bool aDepthFlag, bool aStencilFlag,

@@ -107,7 +107,7 @@ bool FullScreenHelper::CreateQuad()
 	desc.myKind = Gpu::BufferKind::Vertex;
 	desc.mySize = sizeof(ourQuad);
 	desc.myLabel = "full-screen quad";
-	if (!myVertexBuffer.Init(desc, ourQuad))
+	if (!myVertexBuffer.Init(Engine::GetInstance()->GetContext(), desc, ourQuad))
 	{
 		ReportCritical(__LINE__, function, "Failed to create the full-screen quad");
 		return false;

@@ -80,9 +80,9 @@ TEST_F(DeviceTest, BuffersStartZeroAndOnlyDynamicOnesChange)
 {
 	const uint32_t initial[4] = {1, 2, 3, 4};
 	Gpu::Buffer& fixed = myBuffers.emplace_back();
-	ASSERT_TRUE(fixed.Init({.mySize = sizeof(initial), .myLabel = "fixed"}, initial));
+	ASSERT_TRUE(fixed.Init(GetContext(), {.mySize = sizeof(initial), .myLabel = "fixed"}, initial));
 	Gpu::Buffer& dynamic = myBuffers.emplace_back();
-	ASSERT_TRUE(dynamic.Init(
+	ASSERT_TRUE(dynamic.Init(GetContext(),
 	    {.myKind = Gpu::BufferKind::Constant, .mySize = 16, .myDynamicFlag = true, .myLabel = "dynamic"},
 	    nullptr));
 	const uint32_t update[2] = {7, 8};

@@ -69,7 +69,8 @@ TEST_F(DrawTest, AlphaBlendingMixesInLinearSpace)
 }
 
 // One refusal per kind of object: two elements at one location, a draw past the index buffer's
-// end (which would read outside it), a sampler without anisotropy.
+// end (which would read outside it), a draw from an index buffer destroyed while bound (GL
+// hands its name straight to the next buffer made), a sampler without anisotropy.
 TEST_F(DrawTest, BadInputIsReportedNotDrawn)
 {
 	Gpu::InputLayout layout;
@@ -79,10 +80,15 @@ TEST_F(DrawTest, BadInputIsReportedNotDrawn)
 	EXPECT_FALSE(layout.Init(GetContext(), sameLocation, locations, "same location"));
 	Gpu::Buffer& indices = myBuffers.emplace_back();
 	ASSERT_TRUE(
-	    indices.Init({.myKind = Gpu::BufferKind::Index, .mySize = 12, .myLabel = "six indices"}, nullptr));
+	    indices.Init(GetContext(), {.myKind = Gpu::BufferKind::Index, .mySize = 12, .myLabel = "six indices"}, nullptr));
 	ASSERT_TRUE(GetContext().SetIndexBuffer(&indices, Gpu::IndexFormat::UInt16, 0));
 	EXPECT_FALSE(GetContext().DrawIndexed(4, 3, 0)); // indices 3..6 of 6
+	indices.Destroy();
+	Gpu::Buffer& successor = myBuffers.emplace_back();
+	ASSERT_TRUE(successor.Init(GetContext(), {.myKind = Gpu::BufferKind::Index, .mySize = 12, .myLabel = "next"},
+	                           nullptr));
+	EXPECT_FALSE(GetContext().DrawIndexed(3, 0, 0));
 	Gpu::SamplerState sampler;
 	EXPECT_FALSE(sampler.Init(GetContext(), {.myMaxAnisotropy = 0.0f}, "no anisotropy"));
-	EXPECT_EQ(TakeReports().size(), 3u);
+	EXPECT_EQ(TakeReports().size(), 4u);
 }
