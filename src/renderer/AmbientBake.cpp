@@ -7,6 +7,7 @@
 #include <chrono>
 #include <cmath>
 #include <cstring>
+#include <functional>
 #include <string>
 #include <vector>
 
@@ -20,6 +21,7 @@
 #include "platform/gpu/Texture.h"
 #include "platform/sh/ShProjection.h"
 #include "renderer/AmbientGrid.h"
+#include "renderer/AmbientPartFile.h"
 #include "renderer/AmbientVolumeFile.h"
 #include "renderer/DynamicCubemap.h"
 #include "renderer/ProbeHelper.h"
@@ -192,11 +194,190 @@ void Renderer::SaveProbeCapture(DynamicCubemap& aCube, const std::string& aPath)
 	}
 }
 
+struct Renderer::SHBakeJob
+{
+	const GrowingArray<Room*>* myRooms = nullptr;
+	AmbientGrid myGrid;
+	// Whether the probe at a position (and cell) is baked; null: every probe.
+	std::function<bool(const Vector3<float>&, size_t)> mySelected;
+	// The volume the first bounce is lit by; null: the neutral one (direct light only).
+	const std::vector<uint32_t>* myFirstLight = nullptr;
+	int myFirstBounce = 1;
+	int myBounceCount = 1;
+	bool myDebugFlag = false;
+	// Where the volume goes, for the log.
+	std::string myTarget;
+};
+
+Renderer::SHBakeRun Renderer::RunSHBake(const SHBakeJob& aJob, std::vector<uint32_t>* someBlocks)
+{
+	Engine* engine = Engine::GetInstance();
+	const GrowingArray<Room*>& rooms = *aJob.myRooms;
+	const AmbientGrid& grid = aJob.myGrid;
+	const int* counts = grid.myCounts;
+	DynamicCubemap* cube = myProbeHelper->GetSHCubemap();
+	DeferredRenderTargetHelper gbuffer;
+	if (engine == nullptr || cube == nullptr || !gbuffer.Init(cube->GetSize(), cube->GetSize()))
+	{
+		return SHBakeRun::NOT_RUN;
+	}
+	const auto selected = [&aJob](const Vector3<float>& aProbe, size_t aCell) {
+		return !aJob.mySelected || aJob.mySelected(aProbe, aCell);
+	};
+	long long selectedCells = 0;
+	long long selectedProbes = 0;
+	grid.ForEachProbe([&](const Vector3<float>& aProbe, int, int, int, size_t aCell) {
+		if (selected(aProbe, aCell))
+		{
+			++selectedCells;
+			selectedProbes += AmbientGrid::StrictlyInsideAnyRoom(rooms, aProbe) ? 1 : 0;
+		}
+	});
+	myBakeMonitor.Begin(BakePhase::AMBIENT, selectedProbes * aJob.myBounceCount, 0, aJob.myBounceCount);
+	// A large level bakes for hours: say how much there is to do before starting.
+	if (aJob.myBounceCount > 0)
+	{
+		ReportDebug(__LINE__, "Zeph::Renderer::GenerateSH", "Baking %lld probes (of %d x %d x %d cells) over %d bounce%s into %s",
+		            selectedProbes, counts[0], counts[1], counts[2], aJob.myBounceCount,
+		            aJob.myBounceCount == 1 ? "" : "s", aJob.myTarget.c_str());
+	}
+	SetVolumeBounds(grid.myWorldMin, grid.myWorldSize);
+	if (aJob.myFirstLight != nullptr)
+	{
+		UploadSHToGPU(false, aJob.myFirstLight, counts[0], counts[1], counts[2]);
+	}
+	else
+	{
+		std::vector<uint32_t> neutral[ProbeHelper::ourBlockCount];
+		for (std::vector<uint32_t>& block : neutral)
+		{
+			block.assign(static_cast<size_t>(grid.GetCellCount()), ourNeutralSHTexel);
+		}
+		UploadSHToGPU(false, neutral, counts[0], counts[1], counts[2]);
+	}
+
+	Gpu::Context& context = engine->GetContext();
+	ProbeAtlas atlas;
+	const bool batchedFlag =
+	    myProbeReadback == ProbeReadback::BATCHED && atlas.Init(context, cube->GetSize());
+	// The probes in the atlas are counted as done once read back.
+	long long pending = 0;
+	const auto flush = [&] {
+		if (!atlas.Flush(someBlocks, myBakeTimings))
+		{
+			ReportCritical(1154, "Zeph::Renderer::AddScalars", "FAILED TO REFRESH CUBEMAP");
+		}
+		myBakeMonitor.AddProbes(pending);
+		pending = 0;
+	};
+	// The progress counts cells: every cell of the grid in a whole bake (layers beyond the
+	// last probe position are never visited), the selected ones otherwise.
+	const double cellsToVisit = aJob.mySelected ? static_cast<double>(selectedCells)
+	                                            : static_cast<double>(grid.GetCellCount());
+	const double total = cellsToVisit * std::max(aJob.myBounceCount, 1);
+	bool cancelledFlag = false;
+	for (int run = 0; run < aJob.myBounceCount && !cancelledFlag; ++run)
+	{
+		const int bounce = aJob.myFirstBounce + run;
+		myBakeMonitor.SetBounce(run + 1);
+		context.SetViewport(cube->GetViewport());
+		grid.ForEachProbe([&](const Vector3<float>& aProbe, int anX, int aY, int aZ, size_t aCell) {
+			cancelledFlag = cancelledFlag || myBakeMonitor.IsCancelRequested();
+			if (cancelledFlag || !selected(aProbe, aCell))
+			{
+				return;
+			}
+			if (AmbientGrid::StrictlyInsideAnyRoom(rooms, aProbe))
+			{
+				Stopwatch watch;
+				for (int face = 0; face < 6; ++face)
+				{
+					RenderProbeFace(*cube, face, aProbe, gbuffer, false);
+				}
+				myBakeTimings.myRendering += watch.Lap();
+				if (aJob.myDebugFlag)
+				{
+					SaveProbeCapture(*cube, "data/cubemaps/sh debug/" + std::to_string(aCell) + "bounce" +
+					                            std::to_string(bounce - 1) + ".dds");
+				}
+				// Batched where the atlas could be made, else one read-back per probe.
+				if (batchedFlag && cube->GetTexture() != nullptr &&
+				    atlas.Add(context, *cube->GetTexture(), aCell))
+				{
+					myBakeTimings.myRendering += watch.Lap();
+					++pending;
+					if (atlas.IsFull())
+					{
+						flush();
+					}
+				}
+				else
+				{
+					AddScalars(*cube, someBlocks, anX, aY, aZ, counts[0], counts[1], counts[2]);
+					myBakeMonitor.AddProbes(1);
+				}
+				++myBakedProbeCount;
+			}
+			else
+			{
+				for (int block = 0; block < ProbeHelper::ourBlockCount; ++block)
+				{
+					someBlocks[block][aCell] = ourNeutralSHTexel;
+				}
+			}
+			++myBakingProgressCounter;
+			myBakingProgress =
+			    std::min(100, static_cast<int>(static_cast<double>(myBakingProgressCounter) / total * 100.0));
+		});
+		flush();
+		// Only now does the next bounce see this one: within a bounce every probe is lit
+		// by the previous bounce's volume.
+		if (!cancelledFlag)
+		{
+			UploadSHToGPU(true, someBlocks, counts[0], counts[1], counts[2]);
+		}
+	}
+	myCollector.Reset();
+	gbuffer.Destroy();
+	return cancelledFlag ? SHBakeRun::CANCELLED : SHBakeRun::DONE;
+}
+
+
+namespace
+{
+bool SameGrid(const AmbientVolume& aVolume, const AmbientGrid& aGrid)
+{
+	const auto same = [](const Vector3<float>& aLeft, const Vector3<float>& aRight) {
+		return aLeft.x == aRight.x && aLeft.y == aRight.y && aLeft.z == aRight.z;
+	};
+	return same(aVolume.myWorldMin, aGrid.myWorldMin) && same(aVolume.myWorldSize, aGrid.myWorldSize) &&
+	       std::equal(aVolume.myCounts, aVolume.myCounts + 3, aGrid.myCounts);
+}
+
+std::string DescribeCounts(const int* someCounts)
+{
+	return std::to_string(someCounts[0]) + " x " + std::to_string(someCounts[1]) + " x " +
+	       std::to_string(someCounts[2]);
+}
+} // namespace
+
 void Renderer::GenerateSH(const GrowingArray<Room*>& someRooms, const std::string& aPath, int aBounces,
                           bool aDebugFlag)
 {
-	Engine* engine = Engine::GetInstance();
-	if (engine == nullptr)
+	GenerateSHVolume(someRooms, nullptr, aPath, aBounces, aDebugFlag);
+}
+
+void Renderer::GenerateSHForRooms(const GrowingArray<Room*>& someRooms, const GrowingArray<Room*>& someBakedRooms,
+                                  const std::string& aPath, int aBounces)
+{
+	GenerateSHVolume(someRooms, &someBakedRooms, aPath, aBounces, false);
+}
+
+void Renderer::GenerateSHVolume(const GrowingArray<Room*>& someRooms, const GrowingArray<Room*>* someBakedRooms,
+                                const std::string& aPath, int aBounces, bool aDebugFlag)
+{
+	const char* function = "Zeph::Renderer::GenerateSH";
+	if (Engine::GetInstance() == nullptr)
 	{
 		return;
 	}
@@ -209,10 +390,29 @@ void Renderer::GenerateSH(const GrowingArray<Room*>& someRooms, const std::strin
 	// and the file on disk stay as they were.
 	if (const std::string problem = grid.GetSizeProblem(); !problem.empty())
 	{
-		ReportError(__LINE__, "Zeph::Renderer::GenerateSH", "%s; %s is left as it was", problem.c_str(),
-		            aPath.c_str());
+		ReportError(__LINE__, function, "%s; %s is left as it was", problem.c_str(), aPath.c_str());
 		myCollector.Reset();
+		myBakeMonitor.End(BakeResult::FAILED, problem + "; " + aPath + " is left as it was");
 		return;
+	}
+	// A room re-bake keeps every other cell of the file, which must be of this grid.
+	AmbientVolume kept;
+	bool keepFlag = false;
+	std::string note;
+	if (someBakedRooms != nullptr && aBounces > 0 && !grid.IsEmpty())
+	{
+		std::string problem;
+		const AmbientVolumeRead read = ReadAmbientVolume(aPath, kept, problem);
+		keepFlag = read == AmbientVolumeRead::OK && SameGrid(kept, grid);
+		if (!keepFlag)
+		{
+			note = (read == AmbientVolumeRead::OK ? aPath + " is of a grid of " + DescribeCounts(kept.myCounts) +
+			                                            ", the rooms' is " + DescribeCounts(grid.myCounts)
+			        : read == AmbientVolumeRead::CANNOT_OPEN ? aPath + " does not exist"
+			                                                 : problem) +
+			       ": the whole volume was baked";
+			ReportDebug(__LINE__, function, "%s", note.c_str());
+		}
 	}
 	myProbeHelper.reset();
 	myProbeHelper = std::make_unique<ProbeHelper>();
@@ -225,100 +425,53 @@ void Renderer::GenerateSH(const GrowingArray<Room*>& someRooms, const std::strin
 	{
 		SetVolumeBounds(Vector3<float>(0.0f, 0.0f, 0.0f), Vector3<float>(0.0f, 0.0f, 0.0f));
 		myCollector.Reset();
+		myBakeMonitor.End(BakeResult::FINISHED, "no rooms with extent: nothing baked");
 		return;
 	}
-	DynamicCubemap* cube = myProbeHelper->GetSHCubemap();
-	DeferredRenderTargetHelper gbuffer;
-	if (cube == nullptr || !gbuffer.Init(cube->GetSize(), cube->GetSize()))
-	{
-		myCollector.Reset();
-		return;
-	}
-	const int* counts = grid.myCounts;
-	const long long cells = grid.GetCellCount();
-	if (aBounces > 0)
-	{
-		// A large level bakes for hours: say how much there is to do before starting.
-		ReportDebug(__LINE__, "Zeph::Renderer::GenerateSH",
-		            "Baking %lld probes (of %d x %d x %d cells) over %d bounce%s into %s",
-		            grid.CountProbesInside(someRooms), counts[0], counts[1], counts[2], aBounces,
-		            aBounces == 1 ? "" : "s", aPath.c_str());
-	}
-	SetVolumeBounds(grid.myWorldMin, grid.myWorldSize);
 	std::vector<uint32_t> blocks[ProbeHelper::ourBlockCount];
-	for (std::vector<uint32_t>& block : blocks)
+	for (int block = 0; block < ProbeHelper::ourBlockCount; ++block)
 	{
-		block.assign(static_cast<size_t>(cells), ourNeutralSHTexel);
-	}
-	// The first bounce sees a neutral volume (about no irradiance): direct light only.
-	UploadSHToGPU(false, blocks, counts[0], counts[1], counts[2]);
-
-	Gpu::Context& context = engine->GetContext();
-	ProbeAtlas atlas;
-	const bool batchedFlag =
-	    myProbeReadback == ProbeReadback::BATCHED && atlas.Init(context, cube->GetSize());
-	const auto flush = [&] {
-		if (!atlas.Flush(blocks, myBakeTimings))
+		if (keepFlag)
 		{
-			ReportCritical(1154, "Zeph::Renderer::AddScalars", "FAILED TO REFRESH CUBEMAP");
+			blocks[block] = std::move(kept.myBlocks[block]);
 		}
-	};
-	const double total = static_cast<double>(cells) * std::max(aBounces, 1);
-	for (int bounce = 0; bounce < aBounces; ++bounce)
+		else
+		{
+			blocks[block].assign(static_cast<size_t>(grid.GetCellCount()), ourNeutralSHTexel);
+		}
+	}
+	SHBakeJob job;
+	job.myRooms = &someRooms;
+	job.myGrid = grid;
+	if (keepFlag)
 	{
-		context.SetViewport(cube->GetViewport());
-		grid.ForEachProbe([&](const Vector3<float>& aProbe, int anX, int aY, int aZ, size_t aCell) {
-			if (AmbientGrid::StrictlyInsideAnyRoom(someRooms, aProbe))
-			{
-				Stopwatch watch;
-				for (int face = 0; face < 6; ++face)
-				{
-					RenderProbeFace(*cube, face, aProbe, gbuffer, false);
-				}
-				myBakeTimings.myRendering += watch.Lap();
-				if (aDebugFlag)
-				{
-					SaveProbeCapture(*cube, "data/cubemaps/sh debug/" + std::to_string(aCell) + "bounce" +
-					                            std::to_string(bounce) + ".dds");
-				}
-				// Batched where the atlas could be made, else one read-back per probe.
-				if (batchedFlag && cube->GetTexture() != nullptr &&
-				    atlas.Add(context, *cube->GetTexture(), aCell))
-				{
-					myBakeTimings.myRendering += watch.Lap();
-					if (atlas.IsFull())
-					{
-						flush();
-					}
-				}
-				else
-				{
-					AddScalars(*cube, blocks, anX, aY, aZ, counts[0], counts[1], counts[2]);
-				}
-				++myBakedProbeCount;
-			}
-			else
-			{
-				for (std::vector<uint32_t>& block : blocks)
-				{
-					block[aCell] = ourNeutralSHTexel;
-				}
-			}
-			++myBakingProgressCounter;
-			myBakingProgress =
-			    std::min(100, static_cast<int>(static_cast<double>(myBakingProgressCounter) / total * 100.0));
-		});
-		flush();
-		// Only now does the next bounce see this one: within a bounce every probe is lit
-		// by the previous bounce's volume.
-		UploadSHToGPU(true, blocks, counts[0], counts[1], counts[2]);
+		job.mySelected = [someBakedRooms](const Vector3<float>& aProbe, size_t) {
+			return AmbientGrid::StrictlyInsideAnyRoom(*someBakedRooms, aProbe);
+		};
+	}
+	job.myBounceCount = aBounces;
+	job.myDebugFlag = aDebugFlag;
+	job.myTarget = aPath;
+	const SHBakeRun run = RunSHBake(job, blocks);
+	if (run == SHBakeRun::CANCELLED)
+	{
+		// What the editor shows goes back to what the file holds.
+		SetSH(aPath);
+		myBakeMonitor.End(BakeResult::CANCELLED, aPath + " is left as it was");
+		return;
+	}
+	if (run == SHBakeRun::NOT_RUN)
+	{
+		myBakeMonitor.End(BakeResult::FAILED, "the probe cubemap could not be made; " + aPath +
+		                                          " is left as it was");
+		return;
 	}
 	if (aBounces > 0)
 	{
 		AmbientVolume volume;
 		volume.myWorldSize = grid.myWorldSize;
 		volume.myWorldMin = grid.myWorldMin;
-		std::copy(counts, counts + 3, volume.myCounts);
+		std::copy(grid.myCounts, grid.myCounts + 3, volume.myCounts);
 		for (int block = 0; block < ProbeHelper::ourBlockCount; ++block)
 		{
 			volume.myBlocks[block] = std::move(blocks[block]);
@@ -328,12 +481,96 @@ void Renderer::GenerateSH(const GrowingArray<Room*>& someRooms, const std::strin
 		std::string problem;
 		if (!WriteAmbientVolume(aPath, volume, problem))
 		{
-			ReportError(__LINE__, "Zeph::Renderer::GenerateSH", "Could not write the ambient light: %s",
-			            problem.c_str());
+			ReportError(__LINE__, function, "Could not write the ambient light: %s", problem.c_str());
+			myBakeMonitor.End(BakeResult::FAILED, problem);
+			return;
 		}
 	}
-	myCollector.Reset();
-	gbuffer.Destroy();
+	myBakeMonitor.End(BakeResult::FINISHED, note);
+}
+
+bool Renderer::GenerateSHPart(const GrowingArray<Room*>& someRooms, int aBounce, const AmbientVolume* aPrevious,
+                              long long aFirst, long long aCount, AmbientPart& aPartOut)
+{
+	const char* function = "Zeph::Renderer::GenerateSHPart";
+	myBakingProgressCounter = 0;
+	myBakingProgress = 0;
+	myBakedProbeCount = 0;
+	myBakeTimings = BakeTimings();
+	const AmbientGrid grid = AmbientGrid::FromRooms(someRooms);
+	std::string problem = grid.GetSizeProblem();
+	const long long cells = grid.GetCellCount();
+	if (problem.empty() && grid.IsEmpty())
+	{
+		problem = "the level has no rooms with extent: there is no grid to bake";
+	}
+	else if (problem.empty() && (aFirst < 0 || aCount < 1 || aFirst > cells - aCount))
+	{
+		problem = "cells " + std::to_string(aFirst) + " to " + std::to_string(aFirst + aCount - 1) +
+		          " are not all in the grid of " + DescribeCounts(grid.myCounts) + " (" + std::to_string(cells) +
+		          " cells, 0 to " + std::to_string(cells - 1) + ")";
+	}
+	else if (problem.empty() && aBounce < 1)
+	{
+		problem = "bounce " + std::to_string(aBounce) + ": bounces count from 1";
+	}
+	else if (problem.empty() && aBounce > 1 && aPrevious == nullptr)
+	{
+		problem = "bounce " + std::to_string(aBounce) + " needs the volume of bounce " + std::to_string(aBounce - 1);
+	}
+	else if (problem.empty() && aBounce > 1 && !SameGrid(*aPrevious, grid))
+	{
+		problem = "the previous bounce's volume is of a grid of " + DescribeCounts(aPrevious->myCounts) +
+		          ", the rooms' is " + DescribeCounts(grid.myCounts);
+	}
+	if (!problem.empty())
+	{
+		ReportError(__LINE__, function, "%s", problem.c_str());
+		myCollector.Reset();
+		myBakeMonitor.End(BakeResult::FAILED, problem);
+		return false;
+	}
+	myProbeHelper.reset();
+	myProbeHelper = std::make_unique<ProbeHelper>();
+	myProbeHelper->Init();
+	mySHLoadedFlag = false;
+	std::vector<uint32_t> blocks[ProbeHelper::ourBlockCount];
+	for (std::vector<uint32_t>& block : blocks)
+	{
+		block.assign(static_cast<size_t>(cells), ourNeutralSHTexel);
+	}
+	SHBakeJob job;
+	job.myRooms = &someRooms;
+	job.myGrid = grid;
+	job.mySelected = [aFirst, aCount](const Vector3<float>&, size_t aCell) {
+		return static_cast<long long>(aCell) >= aFirst && static_cast<long long>(aCell) < aFirst + aCount;
+	};
+	job.myFirstLight = aBounce > 1 ? aPrevious->myBlocks : nullptr;
+	job.myFirstBounce = aBounce;
+	job.myBounceCount = 1;
+	job.myTarget = "cells " + std::to_string(aFirst) + " to " + std::to_string(aFirst + aCount - 1) +
+	               " of bounce " + std::to_string(aBounce);
+	const SHBakeRun run = RunSHBake(job, blocks);
+	if (run != SHBakeRun::DONE)
+	{
+		myBakeMonitor.End(run == SHBakeRun::CANCELLED ? BakeResult::CANCELLED : BakeResult::FAILED,
+		                  run == SHBakeRun::CANCELLED ? "no part written" : "the probe cubemap could not be made");
+		return false;
+	}
+	AmbientPart part;
+	part.myBounce = aBounce;
+	part.myWorldSize = grid.myWorldSize;
+	part.myWorldMin = grid.myWorldMin;
+	std::copy(grid.myCounts, grid.myCounts + 3, part.myCounts);
+	part.myFirst = aFirst;
+	part.myCount = aCount;
+	for (int block = 0; block < ProbeHelper::ourBlockCount; ++block)
+	{
+		part.myBlocks[block].assign(blocks[block].begin() + aFirst, blocks[block].begin() + aFirst + aCount);
+	}
+	aPartOut = std::move(part);
+	myBakeMonitor.End(BakeResult::FINISHED, "");
+	return true;
 }
 
 void Renderer::AddScalars(DynamicCubemap& aCube, std::vector<uint32_t>* someBlocks, int anX, int aY, int aZ,

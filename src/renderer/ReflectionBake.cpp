@@ -3,6 +3,7 @@
 // surfaces, saved as "data/Cubemaps/" + level + "/" + room id + ".dds".
 #include <algorithm>
 #include <cmath>
+#include <filesystem>
 #include <memory>
 #include <numbers>
 
@@ -108,22 +109,43 @@ void DrawCross(FullScreenHelper& aHelper, Fx::Variable* aScaleMatrix,
 }
 } // namespace
 
-void Renderer::GenerateReflections(const GrowingArray<Room*>& someRooms, const std::string& aLevel)
+void Renderer::GenerateReflections(const GrowingArray<Room*>& someRooms, const std::string& aLevel,
+                                   const std::vector<std::string>* someBakedRooms)
 {
 	Engine* engine = Engine::GetInstance();
 	DynamicCubemap* cube = myProbeHelper ? myProbeHelper->GetReflectionCubemap() : nullptr;
 	if (engine == nullptr || cube == nullptr || cube->GetTexture() == nullptr)
 	{
+		myBakeMonitor.End(BakeResult::FAILED, "the reflection cubemap could not be made");
 		return;
 	}
+	const auto baked = [someBakedRooms](const Room& aRoom) {
+		return someBakedRooms == nullptr ||
+		       std::find(someBakedRooms->begin(), someBakedRooms->end(), aRoom.GetID()) != someBakedRooms->end();
+	};
+	const int count = someRooms.Count();
+	int bakedCount = 0;
+	for (int index = 0; index < count; ++index)
+	{
+		bakedCount += baked(*someRooms[index]) ? 1 : 0;
+	}
+	myBakeMonitor.Begin(BakePhase::REFLECTIONS, 0, bakedCount, 0);
 	Gpu::Context& context = engine->GetContext();
 	DeferredRenderTargetHelper gbuffer;
 	gbuffer.Init(cube->GetSize(), cube->GetSize());
 	myBakingProgress = 0;
-	const int count = someRooms.Count();
-	for (int index = 0; index < count; ++index)
+	// Each cubemap goes to a temporary beside its file; they replace the files together
+	// once every room is done, so a cancelled bake leaves every file as it was.
+	std::vector<std::pair<std::string, std::string>> staged;
+	bool cancelledFlag = false;
+	int done = 0;
+	for (int index = 0; index < count && !cancelledFlag; ++index)
 	{
 		const Room* room = someRooms[index];
+		if (!baked(*room))
+		{
+			continue;
+		}
 		// A room ID such as "../cubemap" would write over a file outside the level's folder.
 		const std::string file = CubemapContainer::GetRoomFile(aLevel, room->GetID());
 		if (file.empty())
@@ -131,23 +153,52 @@ void Renderer::GenerateReflections(const GrowingArray<Room*>& someRooms, const s
 			ReportError(__LINE__, "Zeph::Renderer::GenerateReflections",
 			            "Room %d has the ID [%s], which cannot name a cubemap file: not baked", index,
 			            room->GetID().c_str());
-			myBakingProgress = BakeProgress(index + 1, count);
+			myBakingProgress = BakeProgress(++done, bakedCount);
+			myBakeMonitor.AddRoom();
 			continue;
 		}
 		// The filter of the previous room drew through viewports of its own.
 		context.SetViewport(cube->GetViewport());
-		for (int face = 0; face < DynamicCubemap::ourFaceCount; ++face)
+		for (int face = 0; face < DynamicCubemap::ourFaceCount && !cancelledFlag; ++face)
 		{
-			RenderProbeFace(*cube, face, room->GetCenterPosition(), gbuffer, true);
+			cancelledFlag = myBakeMonitor.IsCancelRequested();
+			if (!cancelledFlag)
+			{
+				RenderProbeFace(*cube, face, room->GetCenterPosition(), gbuffer, true);
+			}
+		}
+		cancelledFlag = cancelledFlag || myBakeMonitor.IsCancelRequested();
+		if (cancelledFlag)
+		{
+			break;
 		}
 		PrefilterReflection(*cube);
 		// A file that cannot be written leaves the room with its old cubemap; the save
 		// reports it, the bake goes on.
-		Gpu::SaveTextureToDds(context, *cube->GetTexture(), file);
-		myBakingProgress = BakeProgress(index + 1, count);
+		std::string temporary;
+		if (Gpu::SaveTextureToDds(context, *cube->GetTexture(), file, &temporary))
+		{
+			staged.emplace_back(temporary, file);
+		}
+		myBakingProgress = BakeProgress(++done, bakedCount);
+		myBakeMonitor.AddRoom();
+	}
+	for (const auto& [temporary, target] : staged)
+	{
+		if (cancelledFlag)
+		{
+			std::error_code ignored;
+			std::filesystem::remove(temporary, ignored);
+		}
+		else
+		{
+			Gpu::ReplaceWithStaged(temporary, target);
+		}
 	}
 	myCollector.Reset();
 	gbuffer.Destroy();
+	myBakeMonitor.End(cancelledFlag ? BakeResult::CANCELLED : BakeResult::FINISHED,
+	                  cancelledFlag ? "every cubemap is left as it was" : "");
 }
 
 void Renderer::PrefilterReflection(DynamicCubemap& aCube)

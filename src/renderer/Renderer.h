@@ -23,6 +23,7 @@
 
 #include "core/GrowingArray.h"
 #include "platform/gpu/StateCache.h"
+#include "renderer/BakeMonitor.h"
 #include "renderer/DecalMeshRenderTargetHelper.h"
 #include "renderer/DeferredRenderTargetHelper.h"
 #include "renderer/LateRenderItem.h"
@@ -58,6 +59,8 @@ class TimestampQueries;
 
 namespace Zeph
 {
+struct AmbientPart;
+struct AmbientVolume;
 class CameraInstance;
 class Instance;
 class ProbeHelper;
@@ -146,14 +149,38 @@ public:
 	// one is kept. Neither ends the process.
 	void GenerateSH(const GrowingArray<Room*>& someRooms, const std::string& aPath, int aBounces,
 	                bool aDebugFlag);
+	// The probes strictly inside someBakedRooms re-baked over every bounce, every other cell
+	// kept as aPath holds it. Within the re-baked rooms the first bounce sees direct light
+	// only, as in a whole bake; later bounces see the kept cells as they are on disk (the
+	// last bounce of the bake that wrote them) around the rooms' previous bounce. When
+	// aPath is missing, damaged or of another grid the whole volume is baked instead, and
+	// the status's message says so.
+	void GenerateSHForRooms(const GrowingArray<Room*>& someRooms, const GrowingArray<Room*>& someBakedRooms,
+	                        const std::string& aPath, int aBounces);
+	// One bounce (aBounce, from 1) of the cells aFirst .. aFirst + aCount - 1 (in ambient.sh's
+	// order; those outside every room are neutral), lit by aPrevious (the volume of bounce
+	// aBounce - 1; null, and unused, for bounce 1), into aPartOut's grid, range and blocks.
+	// False when refused (reported at the error level) or cancelled. The volume shown
+	// afterwards is the one the bounce was lit by: the caller loads the level's own back.
+	bool GenerateSHPart(const GrowingArray<Room*>& someRooms, int aBounce, const AmbientVolume* aPrevious,
+	                    long long aFirst, long long aCount, AmbientPart& aPartOut);
 	// Projects the SH probe cubemap onto SH and stores the seven packed vectors of
 	// cell (anX, aY, aZ) of a volume of aCountX x aCountY x aCountZ cells.
 	void AddScalars(DynamicCubemap& aCube, std::vector<uint32_t>* someBlocks, int anX, int aY, int aZ,
 	                int aCountX, int aCountY, int aCountZ);
 	// GenerateReflections: a 256-texel cubemap at every room's centre, pre-filtered
 	// into its mips, saved to "data/Cubemaps/" + aLevel + "/" + room id + ".dds".
-	void GenerateReflections(const GrowingArray<Room*>& someRooms, const std::string& aLevel);
+	// With someBakedRooms, only the rooms whose ID it holds are rendered and written. The
+	// cubemaps are written when the last is done, so a cancelled bake writes none.
+	void GenerateReflections(const GrowingArray<Room*>& someRooms, const std::string& aLevel,
+	                         const std::vector<std::string>* someBakedRooms = nullptr);
 	int GetBakingProgress() const { return myBakingProgress.load(); }
+	// Any thread: the running bake stops within one probe (ambient) or one cube face
+	// (reflections) and writes nothing; the volume shown is reloaded from the file. A
+	// no-op when no bake runs. Only sets a flag, so a signal handler may call it.
+	void CancelBake() { myBakeMonitor.RequestCancel(); }
+	// Any thread: where the running bake is, or how the last one ended.
+	BakeStatus GetBakeStatus() const { return myBakeMonitor.GetStatus(); }
 	// How the ambient bake reads its probes back: many probes' faces gathered in an
 	// atlas and read at once (the default), each probe's cube at once, or each face
 	// alone. The volume is the same either way; the modes are there to be compared.
@@ -213,6 +240,19 @@ private:
 	// The reflection cubemap's mips 1..8 filtered from mip 0 through the cross of each
 	// face and its neighbours (the ProbeHelper's filter target).
 	void PrefilterReflection(DynamicCubemap& aCube);
+	// The ambient bakes' common run: bounces of the selected probes into someBlocks
+	// (AmbientBake.cpp). False when cancelled.
+	struct SHBakeJob;
+	enum class SHBakeRun
+	{
+		DONE,
+		CANCELLED,
+		NOT_RUN, // the probe cubemap or its G-buffer could not be made (reported)
+	};
+	SHBakeRun RunSHBake(const SHBakeJob& aJob, std::vector<uint32_t>* someBlocks);
+	// GenerateSH, and GenerateSHForRooms with someBakedRooms.
+	void GenerateSHVolume(const GrowingArray<Room*>& someRooms, const GrowingArray<Room*>* someBakedRooms,
+	                      const std::string& aPath, int aBounces, bool aDebugFlag);
 	// The SH bake's debug capture: the probe cubemap's faces written as a DDS.
 	void SaveProbeCapture(DynamicCubemap& aCube, const std::string& aPath);
 
@@ -252,6 +292,7 @@ private:
 	long long myBakedProbeCount = 0;
 	ProbeReadback myProbeReadback = ProbeReadback::BATCHED;
 	BakeTimings myBakeTimings;
+	BakeMonitor myBakeMonitor;
 	bool myProbeCullingFlag = true;
 	bool mySHLoadedFlag = false;
 	std::unique_ptr<ProbeHelper> myProbeHelper;

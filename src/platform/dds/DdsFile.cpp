@@ -2,6 +2,7 @@
 
 #include <cstdio>
 #include <cstring>
+#include <filesystem>
 #include <fstream>
 
 #include "platform/paths/Paths.h"
@@ -487,7 +488,8 @@ bool SaveToMemory(const Image& anImage, std::vector<uint8_t>& someBytesOut, std:
 	return true;
 }
 
-bool SaveToFile(const std::string& aFileName, const Image& anImage, std::string& anErrorOut)
+bool SaveToTemporary(const std::string& aFileName, const Image& anImage, std::string& aTemporaryOut,
+                     std::string& anErrorOut)
 {
 	std::vector<uint8_t> bytes;
 	std::string what;
@@ -500,6 +502,13 @@ bool SaveToFile(const std::string& aFileName, const Image& anImage, std::string&
 	if (target.empty())
 	{
 		anErrorOut = "Dds::SaveToFile: " + aFileName + ": cannot create its directory";
+		return false;
+	}
+	// Known before anything is written: a folder (or device) by that name is never replaced.
+	std::error_code error;
+	if (std::filesystem::exists(target, error) && !std::filesystem::is_regular_file(target, error))
+	{
+		anErrorOut = "Dds::SaveToFile: " + aFileName + ": cannot replace the file: something else has its name";
 		return false;
 	}
 	const std::string temporary = Paths::TemporaryFor(target);
@@ -518,11 +527,24 @@ bool SaveToFile(const std::string& aFileName, const Image& anImage, std::string&
 		    "Dds::SaveToFile: " + aFileName + ": cannot write " + std::to_string(bytes.size()) + " bytes";
 		return false;
 	}
-	if (!Paths::ReplaceWith(temporary, target))
+	aTemporaryOut = temporary;
+	return true;
+}
+
+bool ReplaceWithTemporary(const std::string& aTemporary, const std::string& aFileName, std::string& anErrorOut)
+{
+	if (!Paths::ReplaceWith(aTemporary, Paths::Resolve(aFileName)))
 	{
 		anErrorOut = "Dds::SaveToFile: " + aFileName + ": cannot replace the file";
 		return false;
 	}
 	return true;
+}
+
+bool SaveToFile(const std::string& aFileName, const Image& anImage, std::string& anErrorOut)
+{
+	std::string temporary;
+	return SaveToTemporary(aFileName, anImage, temporary, anErrorOut) &&
+	       ReplaceWithTemporary(temporary, aFileName, anErrorOut);
 }
 } // namespace Dds

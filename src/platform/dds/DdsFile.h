@@ -34,6 +34,12 @@ bool LoadFromFile(const std::string& aFileName, Image& anImageOut, std::string& 
 bool LoadFromMemory(const void* someBytes, size_t aSize, Image& anImageOut, std::string& anErrorOut);
 
 bool SaveToFile(const std::string& aFileName, const Image& anImage, std::string& anErrorOut);
+// SaveToFile in two steps, for writers that replace several files together: the image
+// written whole to a new temporary beside aFileName (its name returned), then renamed over
+// it. A temporary that is not used is the caller's to remove.
+bool SaveToTemporary(const std::string& aFileName, const Image& anImage, std::string& aTemporaryOut,
+                     std::string& anErrorOut);
+bool ReplaceWithTemporary(const std::string& aTemporary, const std::string& aFileName, std::string& anErrorOut);
 // The bytes SaveToFile() writes.
 bool SaveToMemory(const Image& anImage, std::vector<uint8_t>& someBytesOut, std::string& anErrorOut);
 } // namespace Dds

@@ -30,7 +30,8 @@ Dds::ImageInfo DescribeForFile(const Texture& aTexture)
 }
 } // namespace
 
-bool SaveTextureToDds(Context& aContext, const Texture& aTexture, const std::string& aPath)
+bool SaveTextureToDds(Context& aContext, const Texture& aTexture, const std::string& aPath,
+                      std::string* aStagedOut)
 {
 	static_cast<void>(aContext); // the reads below name the texture directly
 	const char* function = "Gpu::SaveTextureToDds";
@@ -72,9 +73,22 @@ bool SaveTextureToDds(Context& aContext, const Texture& aTexture, const std::str
 		}
 	}
 	LUMORA_GL_CHECK(function);
-	if (!Dds::SaveToFile(aPath, image, error))
+	const bool saved = aStagedOut != nullptr ? Dds::SaveToTemporary(aPath, image, *aStagedOut, error)
+	                                         : Dds::SaveToFile(aPath, image, error);
+	if (!saved)
 	{
 		ReportError(__LINE__, function, "%s", error.c_str());
+		return false;
+	}
+	return true;
+}
+
+bool ReplaceWithStaged(const std::string& aStaged, const std::string& aPath)
+{
+	std::string error;
+	if (!Dds::ReplaceWithTemporary(aStaged, aPath, error))
+	{
+		ReportError(__LINE__, "Gpu::ReplaceWithStaged", "%s", error.c_str());
 		return false;
 	}
 	return true;

@@ -19,5 +19,10 @@ namespace Gpu
 class Context;
 class Texture;
 
-bool SaveTextureToDds(Context& aContext, const Texture& aTexture, const std::string& aPath);
+// With aStagedOut the file is written whole to a temporary beside aPath, whose name is
+// returned there, and ReplaceWithStaged later puts it in aPath's place (or the caller
+// removes it): writers that replace several files together stage them all first.
+bool SaveTextureToDds(Context& aContext, const Texture& aTexture, const std::string& aPath,
+                      std::string* aStagedOut = nullptr);
+bool ReplaceWithStaged(const std::string& aStaged, const std::string& aPath);
 } // namespace Gpu
