@@ -3,14 +3,113 @@
 // renderer's bake on the calling thread while the facade is held.
 #include "editor/LumoraWrapper.h"
 
+#include <algorithm>
+
+#include "editor/BakeInputs.h"
+#include "editor/BakeRecord.h"
+#include "editor/StringConversion.h"
 #include "engine/Engine.h"
+#include "engine/EngineReport.h"
+#include "engine/Room.h"
+#include "renderer/AmbientGrid.h"
+#include "renderer/AmbientPartFile.h"
+#include "renderer/CubemapContainer.h"
 #include "renderer/Renderer.h"
 
 namespace Lumora
 {
-void LumoraWrapper::BakeAmbient(const std::u16string& aLevel, int aNumOfBounces, bool aSaveToDDSFlag)
+namespace
 {
-	Claim();
+std::string AmbientPath(const std::u16string& aLevel)
+{
+	return "data/XML/levels/" + SysSTringToStdString(aLevel) + "/ambient.sh";
+}
+
+// The rooms named by someIDs, or the first ID that names none.
+std::string FindRooms(const GrowingArray<Zeph::Room*>& someRooms, const std::vector<std::string>& someIDs,
+                      GrowingArray<Zeph::Room*>& aFoundOut)
+{
+	for (const std::string& id : someIDs)
+	{
+		bool foundFlag = false;
+		for (int index = 0; index < someRooms.Count(); ++index)
+		{
+			if (someRooms[index]->GetID() == id)
+			{
+				aFoundOut.Add(someRooms[index]);
+				foundFlag = true;
+			}
+		}
+		if (!foundFlag)
+		{
+			return "the level has no room with the ID '" + id + "'";
+		}
+	}
+	return someIDs.empty() ? "no room IDs given" : std::string();
+}
+
+// After a bake that finished, what it wrote and what it was made from go into the level's
+// bake.json. A record that cannot be written is an error entry; the baked files stand.
+void RecordPhase(const std::u16string& aLevel, BakePhase aPhase, const std::vector<std::string>& someRooms,
+                 const GrowingArray<Zeph::Room*>& someLevelRooms, int aBounces)
+{
+	const Zeph::Renderer& renderer = Zeph::Engine::GetInstance()->GetRenderer();
+	const Zeph::BakeStatus status = renderer.GetBakeStatus();
+	if (status.myLastResult != Zeph::BakeResult::FINISHED || (aPhase == BakePhase::AMBIENT && aBounces <= 0))
+	{
+		return;
+	}
+	const std::string level = SysSTringToStdString(aLevel);
+	std::vector<std::string> written;
+	std::map<std::string, double> timings{{"total", status.myElapsedSeconds}};
+	if (aPhase == BakePhase::AMBIENT)
+	{
+		written.push_back(AmbientPath(aLevel));
+		timings["rendering"] = renderer.GetBakeTimings().myRendering;
+		timings["readback"] = renderer.GetBakeTimings().myReadback;
+		timings["projection"] = renderer.GetBakeTimings().myProjection;
+	}
+	else
+	{
+		for (int index = 0; index < someLevelRooms.Count(); ++index)
+		{
+			const std::string& id = someLevelRooms[index]->GetID();
+			const std::string file = Zeph::CubemapContainer::GetRoomFile(level, id);
+			if (!file.empty() && (someRooms.empty() || std::find(someRooms.begin(), someRooms.end(), id) != someRooms.end()))
+			{
+				written.push_back(file);
+			}
+		}
+	}
+	BakePhaseRecord record = MakeBakePhaseRecord(someRooms, written, timings, CollectBakeInputs(level));
+	if (aPhase == BakePhase::AMBIENT)
+	{
+		const Zeph::AmbientGrid grid = Zeph::AmbientGrid::FromRooms(someLevelRooms);
+		record.myBounces = aBounces;
+		std::copy(grid.myCounts, grid.myCounts + 3, record.myGrid.myCounts);
+		record.myGrid.myWorldMin = grid.myWorldMin;
+		record.myGrid.myWorldSize = grid.myWorldSize;
+	}
+	std::string message;
+	if (!RecordBakePhase(level, aPhase, record, message))
+	{
+		Zeph::ReportError(__LINE__, "Lumora::LumoraWrapper::RecordBake", "%s", message.c_str());
+	}
+	else if (!message.empty())
+	{
+		Zeph::ReportDebug(__LINE__, "Lumora::LumoraWrapper::RecordBake", "%s", message.c_str());
+	}
+}
+
+// One hash over every file the loaded level's bake reads.
+std::string HashOfInputs(const std::u16string& aLevel)
+{
+	return CombineInputHashes(HashBakeInputs(CollectBakeInputs(SysSTringToStdString(aLevel))));
+}
+} // namespace
+
+void LumoraWrapper::QueueBakeScene()
+{
 	const LumoraMode mode = myMode;
 	myMode = LIGHT_MODE;
 	// The light gizmos are grown first, so the queued scene has one for every light
@@ -18,26 +117,158 @@ void LumoraWrapper::BakeAmbient(const std::u16string& aLevel, int aNumOfBounces,
 	UpdateScene(0.0f);
 	RenderScene();
 	myMode = mode;
-	const std::string path = "data/XML/levels/" + SysSTringToStdString(aLevel) + "/ambient.sh";
+}
+
+void LumoraWrapper::BakeAmbient(const std::u16string& aLevel, int aNumOfBounces, bool aSaveToDDSFlag)
+{
+	Claim();
+	QueueBakeScene();
 	Zeph::Renderer& renderer = Zeph::Engine::GetInstance()->GetRenderer();
-	renderer.GenerateSH(myRooms, path, aNumOfBounces, aSaveToDDSFlag);
+	renderer.GenerateSH(myRooms, AmbientPath(aLevel), aNumOfBounces, aSaveToDDSFlag);
 	// The queued scene's markers were never drawn; a later load may delete them.
 	renderer.DiscardLateItems();
+	RecordPhase(aLevel, BakePhase::AMBIENT, {}, myRooms, aNumOfBounces);
 	Release();
 }
 
 void LumoraWrapper::BakeSpecular(const std::u16string& aLevel)
 {
 	Claim();
-	const LumoraMode mode = myMode;
-	myMode = LIGHT_MODE;
-	UpdateScene(0.0f);
-	RenderScene();
-	myMode = mode;
+	QueueBakeScene();
 	Zeph::Renderer& renderer = Zeph::Engine::GetInstance()->GetRenderer();
 	renderer.GenerateReflections(myRooms, SysSTringToStdString(aLevel));
 	renderer.DiscardLateItems();
+	RecordPhase(aLevel, BakePhase::REFLECTIONS, {}, myRooms, 0);
 	Release();
+}
+
+bool LumoraWrapper::BakeAmbientRooms(const std::u16string& aLevel, int aNumOfBounces,
+                                     const std::vector<std::string>& someRoomIDs, std::string& aProblemOut)
+{
+	Claim();
+	GrowingArray<Zeph::Room*> rooms(4, 4);
+	aProblemOut = FindRooms(myRooms, someRoomIDs, rooms);
+	Zeph::Renderer& renderer = Zeph::Engine::GetInstance()->GetRenderer();
+	if (aProblemOut.empty())
+	{
+		QueueBakeScene();
+		renderer.GenerateSHForRooms(myRooms, rooms, AmbientPath(aLevel), aNumOfBounces);
+		renderer.DiscardLateItems();
+		// A room bake that had to bake the whole volume (its message says why) is recorded as one.
+		const bool wholeFlag = !renderer.GetBakeStatus().myLastMessage.empty();
+		RecordPhase(aLevel, BakePhase::AMBIENT, wholeFlag ? std::vector<std::string>() : someRoomIDs, myRooms,
+		            aNumOfBounces);
+		const Zeph::BakeStatus status = renderer.GetBakeStatus();
+		if (status.myLastResult != Zeph::BakeResult::FINISHED)
+		{
+			aProblemOut = "the ambient bake " + std::string(Zeph::GetBakeResultName(status.myLastResult)) + ": " +
+			              status.myLastMessage;
+		}
+	}
+	Release();
+	return aProblemOut.empty();
+}
+
+bool LumoraWrapper::BakeSpecularRooms(const std::u16string& aLevel, const std::vector<std::string>& someRoomIDs,
+                                      std::string& aProblemOut)
+{
+	Claim();
+	GrowingArray<Zeph::Room*> rooms(4, 4);
+	aProblemOut = FindRooms(myRooms, someRoomIDs, rooms);
+	Zeph::Renderer& renderer = Zeph::Engine::GetInstance()->GetRenderer();
+	if (aProblemOut.empty())
+	{
+		QueueBakeScene();
+		renderer.GenerateReflections(myRooms, SysSTringToStdString(aLevel), &someRoomIDs);
+		renderer.DiscardLateItems();
+		RecordPhase(aLevel, BakePhase::REFLECTIONS, someRoomIDs, myRooms, 0);
+		const Zeph::BakeStatus status = renderer.GetBakeStatus();
+		if (status.myLastResult != Zeph::BakeResult::FINISHED)
+		{
+			aProblemOut = "the reflection bake " + std::string(Zeph::GetBakeResultName(status.myLastResult)) +
+			              ": " + status.myLastMessage;
+		}
+	}
+	Release();
+	return aProblemOut.empty();
+}
+
+bool LumoraWrapper::BakeAmbientPart(const std::u16string& aLevel, int aBounce, const std::string& aPreviousFile,
+                                    long long aFirst, long long aCount, const std::string& anOutFile,
+                                    std::string& aProblemOut)
+{
+	Zeph::AmbientVolume previous;
+	std::string previousHash;
+	if (aBounce > 1)
+	{
+		if (aPreviousFile.empty())
+		{
+			aProblemOut = "bounce " + std::to_string(aBounce) + " needs the merged volume of bounce " +
+			              std::to_string(aBounce - 1);
+			return false;
+		}
+		if (Zeph::ReadAmbientVolume(aPreviousFile, previous, aProblemOut) != Zeph::AmbientVolumeRead::OK)
+		{
+			aProblemOut = aProblemOut.empty() ? aPreviousFile + " cannot be opened" : aProblemOut;
+			return false;
+		}
+		previousHash = HashBakeInputs({aPreviousFile}).begin()->second;
+	}
+	else if (!aPreviousFile.empty())
+	{
+		aProblemOut = "bounce 1 is lit by direct light only: it takes no previous volume";
+		return false;
+	}
+	Claim();
+	const std::string inputsHash = HashOfInputs(aLevel);
+	Zeph::Renderer& renderer = Zeph::Engine::GetInstance()->GetRenderer();
+	QueueBakeScene();
+	Zeph::AmbientPart part;
+	bool bakedFlag = renderer.GenerateSHPart(myRooms, aBounce, aBounce > 1 ? &previous : nullptr, aFirst, aCount, part);
+	renderer.DiscardLateItems();
+	// The part's light is not the level's: the editor shows the level's own again.
+	renderer.SetSH(AmbientPath(aLevel));
+	Release();
+	if (!bakedFlag)
+	{
+		const Zeph::BakeStatus status = renderer.GetBakeStatus();
+		aProblemOut = "the part bake " + std::string(Zeph::GetBakeResultName(status.myLastResult)) + ": " +
+		              status.myLastMessage;
+		return false;
+	}
+	part.myInputsHash = inputsHash;
+	part.myPreviousHash = previousHash;
+	return Zeph::WriteAmbientPart(anOutFile, part, aProblemOut);
+}
+
+bool LumoraWrapper::MergeAmbientParts(const std::u16string& aLevel, const std::vector<std::string>& someParts,
+                                      const std::string& anOutFile, std::string& aProblemOut)
+{
+	Claim();
+	const Zeph::AmbientGrid grid = Zeph::AmbientGrid::FromRooms(myRooms);
+	Zeph::AmbientPart expected;
+	expected.myWorldMin = grid.myWorldMin;
+	expected.myWorldSize = grid.myWorldSize;
+	std::copy(grid.myCounts, grid.myCounts + 3, expected.myCounts);
+	expected.myInputsHash = HashOfInputs(aLevel);
+	Release();
+	Zeph::AmbientVolume volume;
+	return Zeph::MergeAmbientParts(someParts, expected, volume, aProblemOut) &&
+	       Zeph::WriteAmbientVolume(anOutFile, volume, aProblemOut);
+}
+
+void LumoraWrapper::CancelBake()
+{
+	if (Zeph::Engine* engine = Zeph::Engine::GetInstance())
+	{
+		engine->GetRenderer().CancelBake();
+	}
+}
+
+Zeph::BakeStatus LumoraWrapper::GetBakeStatus() const
+{
+	Zeph::Engine* engine = Zeph::Engine::GetInstance();
+	return engine != nullptr ? engine->GetRenderer().GetBakeStatus() : Zeph::BakeStatus();
 }
 
 int LumoraWrapper::GetBakeProgress() const

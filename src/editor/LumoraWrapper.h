@@ -29,6 +29,7 @@
 #include <map>
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "ai/NGEdge.h"
 #include "ai/NGNode.h"
@@ -40,6 +41,7 @@
 #include "editor/PointLightStruct.h"
 #include "editor/SpotLightStruct.h"
 #include "level/KeptContent.h"
+#include "renderer/BakeStatus.h"
 #include "renderer/DecalData.h"
 #include "renderer/PointLightData.h"
 #include "renderer/SpotLightData.h"
@@ -128,6 +130,35 @@ public:
 	void BakeAmbient(const std::u16string& aLevel, int aNumOfBounces, bool aSaveToDDSFlag);
 	void BakeSpecular(const std::u16string& aLevel);
 	int GetBakeProgress() const;
+	// Any thread: stops the running bake within one probe or cube face; it writes nothing
+	// (every file as it was, no temporary left) and frees the facade. A no-op when no bake
+	// runs.
+	void CancelBake();
+	// Any thread: the running bake's phase, bounce, counts and time left, or how the last
+	// one ended (BakeStatus.h).
+	Zeph::BakeStatus GetBakeStatus() const;
+	// The same bakes for the rooms with the given IDs only: their probes re-baked over every
+	// bounce, every other cell of ambient.sh kept (the whole volume when the file does not
+	// match the rooms' grid; the status's message says so); their cubemaps alone rendered
+	// and written. False, with the reason, when an ID names no room (nothing is baked) or
+	// the bake did not finish (the status tells).
+	bool BakeAmbientRooms(const std::u16string& aLevel, int aNumOfBounces,
+	                      const std::vector<std::string>& someRoomIDs, std::string& aProblemOut);
+	bool BakeSpecularRooms(const std::u16string& aLevel, const std::vector<std::string>& someRoomIDs,
+	                       std::string& aProblemOut);
+	// A bake spread over machines: bounce aBounce (from 1) of the cells aFirst .. aFirst +
+	// aCount - 1 of the loaded level's grid, lit by aPreviousFile (the merged volume of the
+	// bounce before; empty for bounce 1), into the part file anOutFile, whose header ties it
+	// to the grid, the level's inputs and the previous volume. The level's ambient.sh is
+	// untouched and shown again afterwards.
+	bool BakeAmbientPart(const std::u16string& aLevel, int aBounce, const std::string& aPreviousFile,
+	                     long long aFirst, long long aCount, const std::string& anOutFile,
+	                     std::string& aProblemOut);
+	// One bounce's parts of the loaded level assembled into anOutFile (ambient.sh's format),
+	// refusing parts of another grid or other inputs, of different bounces or previous
+	// volumes, overlaps and gaps.
+	bool MergeAmbientParts(const std::u16string& aLevel, const std::vector<std::string>& someParts,
+	                       const std::string& anOutFile, std::string& aProblemOut);
 
 	// Post-processing settings.
 	void UpdateSSAO(float aScale, float aSampleRadius, float aBias, float anIntensity);
@@ -182,6 +213,8 @@ private:
 	void DestroyScene();
 	void UpdateScene(float someElapsedTime);
 	void RenderScene();
+	// Queues the scene a bake renders (BakeCommands.cpp).
+	void QueueBakeScene();
 	void ResetIndices();
 	std::string SysSTringToStdString(const std::u16string& aString) const;
 

@@ -18,7 +18,7 @@
 #include <string>
 #include <vector>
 
-#include "FrameFixture.h"
+#include "BakeFixture.h"
 #include "core/CoreReport.h"
 #include "core/GrowingArray.h"
 #include "engine/Room.h"
@@ -167,57 +167,14 @@ void RecordFailedSave(int aLine, const char* aFunctionName, const char* aMessage
 	}
 }
 
-class ReflectionBakeTest : public FrameTest
+class ReflectionBakeTest : public BakeTest
 {
 protected:
-	ReflectionBakeTest() { myFatalLevels = 12; }
-
-	void SetUp() override
-	{
-		FrameTest::SetUp();
-		const fs::path source = fs::path(LUMORA_TEST_SOURCE_ROOT) / "data";
-		const fs::path data = myWorkDirectory.Path() / "data";
-		fs::create_directories(data / "Cubemaps");
-		for (const fs::directory_entry& entry : fs::directory_iterator(source))
-		{
-			if (entry.path().filename() != "Cubemaps")
-			{
-				fs::create_directory_symlink(entry.path(), data / entry.path().filename());
-			}
-		}
-		for (const char* file : {"cubemap.dds", "normaltest.dds"})
-		{
-			fs::copy_file(source / "Cubemaps" / file, data / "Cubemaps" / file);
-		}
-		myPreviousDirectory = fs::current_path();
-		fs::current_path(myWorkDirectory.Path());
-	}
-
-	void TearDown() override
-	{
-		FrameTest::TearDown();
-		fs::current_path(myPreviousDirectory);
-	}
-
-	// A room box of room_small's size (4 x 3 x 4, floor at y 0) around aCentre's foot.
-	void AddRoom(const std::string& anID, const Vector3<float>& aFoot)
-	{
-		myRoomOwners.push_back(std::make_unique<Zeph::Room>(aFoot + Vector3<float>(-2.0f, 0.0f, -2.0f),
-		                                                    aFoot + Vector3<float>(2.0f, 3.0f, 2.0f)));
-		myRoomOwners.back()->SetID(anID);
-		myRooms.Add(myRoomOwners.back().get());
-	}
-
 	// Queues the scene as the editor does before a bake, and bakes.
 	void Bake(const std::string& aLevel)
 	{
 		Queue();
 		Renderer().GenerateReflections(myRooms, aLevel);
-	}
-
-	static std::string CubePath(const std::string& aLevel, const std::string& anID)
-	{
-		return "data/Cubemaps/" + aLevel + "/" + anID + ".dds";
 	}
 
 	static bool Load(const std::string& aPath, CubeFile& aCubeOut)
@@ -228,10 +185,6 @@ protected:
 		return loaded;
 	}
 
-	TestSupport::ScratchDir myWorkDirectory;
-	fs::path myPreviousDirectory;
-	std::vector<std::unique_ptr<Zeph::Room>> myRoomOwners;
-	GrowingArray<Zeph::Room*> myRooms{4, 4};
 };
 } // namespace
 

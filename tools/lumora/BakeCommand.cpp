@@ -1,4 +1,6 @@
+#include <algorithm>
 #include <chrono>
+#include <csignal>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
@@ -18,6 +20,51 @@ namespace LumoraTool
 {
 namespace
 {
+// The signal that asked the bake to stop (SIGINT, SIGTERM), or 0.
+volatile std::sig_atomic_t ourStopSignal = 0;
+
+void AskToStop(int aSignal)
+{
+	ourStopSignal = aSignal;
+	// Sets one atomic flag of the running bake; a second signal ends the process.
+	if (Lumora::LumoraWrapper* editor = Lumora::LumoraWrapper::GetInstance())
+	{
+		editor->CancelBake();
+	}
+}
+
+// Ctrl-C and SIGTERM cancel the bake for as long as it runs; the handlers reset
+// themselves, so a second one stops the process the usual way.
+class StopSignals
+{
+public:
+	StopSignals()
+	{
+		struct sigaction action = {};
+		action.sa_handler = &AskToStop;
+		action.sa_flags = SA_RESETHAND;
+		sigemptyset(&action.sa_mask);
+		sigaction(SIGINT, &action, &myPreviousInterrupt);
+		sigaction(SIGTERM, &action, &myPreviousTerminate);
+	}
+	~StopSignals()
+	{
+		sigaction(SIGINT, &myPreviousInterrupt, nullptr);
+		sigaction(SIGTERM, &myPreviousTerminate, nullptr);
+	}
+	StopSignals(const StopSignals&) = delete;
+	StopSignals& operator=(const StopSignals&) = delete;
+
+private:
+	struct sigaction myPreviousInterrupt = {};
+	struct sigaction myPreviousTerminate = {};
+};
+
+bool StopAsked()
+{
+	return ourStopSignal != 0;
+}
+
 double SecondsSince(std::chrono::steady_clock::time_point aStart)
 {
 	return std::chrono::duration<double>(std::chrono::steady_clock::now() - aStart).count();
@@ -30,18 +77,82 @@ std::string SizeOf(const std::string& aPath)
 	return error ? std::string("missing") : std::to_string(bytes) + " bytes";
 }
 
+std::string Duration(double aSeconds)
+{
+	const long long seconds = static_cast<long long>(aSeconds + 0.5);
+	char text[48];
+	if (seconds >= 3600)
+	{
+		std::snprintf(text, sizeof(text), "%lld h %02lld min", seconds / 3600, seconds / 60 % 60);
+	}
+	else if (seconds >= 60)
+	{
+		std::snprintf(text, sizeof(text), "%lld min %02lld s", seconds / 60, seconds % 60);
+	}
+	else
+	{
+		std::snprintf(text, sizeof(text), "%lld s", seconds);
+	}
+	return text;
+}
+
+// The bar's detail: the bounce and probes (ambient) or the room (reflections), and the
+// time left once the bake has measured some of its work.
+ProgressBar::Progress PollBake(const Lumora::LumoraWrapper& anEditor)
+{
+	const Zeph::BakeStatus status = anEditor.GetBakeStatus();
+	ProgressBar::Progress progress{anEditor.GetBakeProgress(), ""};
+	char text[160] = "";
+	if (status.myPhase == Zeph::BakePhase::AMBIENT)
+	{
+		std::snprintf(text, sizeof(text), "bounce %d/%d, %lld/%lld probes", status.myBounce, status.myBounceCount,
+		              status.myProbesDone, status.myProbesTotal);
+	}
+	else if (status.myPhase == Zeph::BakePhase::REFLECTIONS)
+	{
+		std::snprintf(text, sizeof(text), "%d/%d rooms", status.myRoomsDone, status.myRoomsTotal);
+	}
+	progress.myDetail = text;
+	if (status.myPhase != Zeph::BakePhase::IDLE)
+	{
+		progress.myDetail += status.mySecondsLeft >= 0.0 ? ", " + Duration(status.mySecondsLeft) + " left"
+		                                                 : ", " + Duration(status.myElapsedSeconds) + " so far";
+	}
+	return progress;
+}
+
+// What the last bake of the facade ended with, when it did not finish.
+bool Finished(EditorSession& aSession)
+{
+	return aSession.Editor().GetBakeStatus().myLastResult == Zeph::BakeResult::FINISHED;
+}
+
 bool BakeAmbient(EditorSession& aSession, const BakeOptions& someOptions)
 {
 	Lumora::LumoraWrapper& editor = aSession.Editor();
 	const std::string path = "data/XML/levels/" + someOptions.myLevel + "/ambient.sh";
 	const auto start = std::chrono::steady_clock::now();
 	const size_t problemsBefore = aSession.GetProblemCount();
+	std::string refusal;
 	{
-		ProgressBar bar("ambient", [&editor] { return editor.GetBakeProgress(); });
-		editor.BakeAmbient(Lumora::ToWide(someOptions.myLevel), someOptions.myBounces,
-		                   someOptions.myDebugCapturesFlag);
+		ProgressBar bar("ambient", [&editor] { return PollBake(editor); });
+		if (someOptions.myRooms.empty())
+		{
+			editor.BakeAmbient(Lumora::ToWide(someOptions.myLevel), someOptions.myBounces,
+			                   someOptions.myDebugCapturesFlag);
+		}
+		else
+		{
+			editor.BakeAmbientRooms(Lumora::ToWide(someOptions.myLevel), someOptions.myBounces,
+			                        someOptions.myRooms, refusal);
+		}
 	}
 	const double seconds = SecondsSince(start);
+	const Zeph::BakeStatus status = editor.GetBakeStatus();
+	if (status.myLastResult == Zeph::BakeResult::CANCELLED)
+	{
+		return false;
+	}
 	// A volume too large to bake, or a file the disk would not take: the old file (if
 	// any) is still there and readable, so its reading below would look like success.
 	if (aSession.GetProblemCount() > problemsBefore)
@@ -49,6 +160,15 @@ bool BakeAmbient(EditorSession& aSession, const BakeOptions& someOptions)
 		PrintError("the ambient bake did not write " + path + ": " +
 		           Describe(aSession.GetProblems()[problemsBefore]));
 		return false;
+	}
+	if (status.myLastResult != Zeph::BakeResult::FINISHED)
+	{
+		PrintError("the ambient bake did not write " + path + ": " + status.myLastMessage);
+		return false;
+	}
+	if (!status.myLastMessage.empty())
+	{
+		std::printf("ambient: %s\n", status.myLastMessage.c_str());
 	}
 	const long long probes = Zeph::Engine::GetInstance()->GetRenderer().GetBakedProbeCount();
 	if (someOptions.myBounces == 0)
@@ -80,17 +200,36 @@ bool BakeReflections(EditorSession& aSession, const BakeOptions& someOptions)
 	Lumora::LumoraWrapper& editor = aSession.Editor();
 	const auto start = std::chrono::steady_clock::now();
 	{
-		ProgressBar bar("reflections", [&editor] { return editor.GetBakeProgress(); });
-		editor.BakeSpecular(Lumora::ToWide(someOptions.myLevel));
+		ProgressBar bar("reflections", [&editor] { return PollBake(editor); });
+		std::string refusal;
+		if (someOptions.myRooms.empty())
+		{
+			editor.BakeSpecular(Lumora::ToWide(someOptions.myLevel));
+		}
+		else
+		{
+			editor.BakeSpecularRooms(Lumora::ToWide(someOptions.myLevel), someOptions.myRooms, refusal);
+		}
+	}
+	if (!Finished(aSession))
+	{
+		return false;
 	}
 	const double seconds = SecondsSince(start);
 	const auto& rooms = editor.GetRooms();
 	bool allWritten = true;
+	int baked = 0;
 	for (int index = 0; index < rooms.Count(); ++index)
 	{
+		const std::string& id = rooms[index]->GetID();
+		if (!someOptions.myRooms.empty() &&
+		    std::find(someOptions.myRooms.begin(), someOptions.myRooms.end(), id) == someOptions.myRooms.end())
+		{
+			continue;
+		}
+		++baked;
 		// A room whose ID names no file is not baked (the bake said so).
-		const std::string path =
-		    Zeph::CubemapContainer::GetRoomFile(someOptions.myLevel, rooms[index]->GetID());
+		const std::string path = Zeph::CubemapContainer::GetRoomFile(someOptions.myLevel, id);
 		if (path.empty())
 		{
 			allWritten = false;
@@ -99,13 +238,66 @@ bool BakeReflections(EditorSession& aSession, const BakeOptions& someOptions)
 		allWritten = allWritten && std::filesystem::is_regular_file(path);
 		std::printf("reflections: %s (%s)\n", path.c_str(), SizeOf(path).c_str());
 	}
-	std::printf("reflections: %d room%s in %.1f s (%.2f s per room)\n", rooms.Count(),
-	            rooms.Count() == 1 ? "" : "s", seconds, rooms.Count() > 0 ? seconds / rooms.Count() : 0.0);
+	std::printf("reflections: %d room%s in %.1f s (%.2f s per room)\n", baked, baked == 1 ? "" : "s", seconds,
+	            baked > 0 ? seconds / baked : 0.0);
 	if (!allWritten)
 	{
 		PrintError("the reflection bake did not write every room's cubemap");
 	}
 	return allWritten;
+}
+
+// One range of one bounce into a part file.
+bool BakePart(EditorSession& aSession, const BakeOptions& someOptions)
+{
+	Lumora::LumoraWrapper& editor = aSession.Editor();
+	const auto start = std::chrono::steady_clock::now();
+	std::string problem;
+	bool bakedFlag = false;
+	{
+		ProgressBar bar("ambient part", [&editor] { return PollBake(editor); });
+		bakedFlag = editor.BakeAmbientPart(Lumora::ToWide(someOptions.myLevel), someOptions.myPartBounce,
+		                                   someOptions.myPrevious, someOptions.myFirst, someOptions.myCount,
+		                                   someOptions.myPartOutput, problem);
+	}
+	if (editor.GetBakeStatus().myLastResult == Zeph::BakeResult::CANCELLED)
+	{
+		return false;
+	}
+	if (!bakedFlag)
+	{
+		PrintError(problem);
+		return false;
+	}
+	std::printf("ambient part: bounce %d, cells %lld to %lld (%lld probes) into %s (%s) in %.1f s\n",
+	            someOptions.myPartBounce, someOptions.myFirst, someOptions.myFirst + someOptions.myCount - 1,
+	            Zeph::Engine::GetInstance()->GetRenderer().GetBakedProbeCount(), someOptions.myPartOutput.c_str(),
+	            SizeOf(someOptions.myPartOutput).c_str(), SecondsSince(start));
+	return true;
+}
+
+// The one line a cancelled bake leaves: what was written before the cancel, and that
+// the rest is as it was.
+int ReportCancel(const BakeOptions& someOptions, bool anAmbientWrittenFlag)
+{
+	const char* signal = ourStopSignal == SIGTERM ? "SIGTERM" : "SIGINT";
+	std::string kept;
+	if (someOptions.myPartBounce > 0)
+	{
+		kept = "no part written";
+	}
+	else if (anAmbientWrittenFlag)
+	{
+		kept = "ambient.sh was written; every room cubemap is as it was";
+	}
+	else
+	{
+		kept = someOptions.myAmbientOnlyFlag    ? "ambient.sh is as it was"
+		       : someOptions.mySpecularOnlyFlag ? "every room cubemap is as it was"
+		                                        : "ambient.sh and every room cubemap are as they were";
+	}
+	PrintError("bake cancelled (" + std::string(signal) + "): " + kept);
+	return 130;
 }
 } // namespace
 
@@ -116,6 +308,7 @@ int RunBake(const BakeOptions& someOptions)
 	// threads save (the ambient bake runs about 1.7 times faster without them, the
 	// reflections as fast). Only when nobody chose otherwise; other drivers ignore it.
 	setenv("LP_NUM_THREADS", "0", 0);
+	const StopSignals signals;
 	EditorSession session;
 	if (!session.Start(someOptions.myLevel, 320, 180, true))
 	{
@@ -140,18 +333,45 @@ int RunBake(const BakeOptions& someOptions)
 		}
 		std::printf("level %s: %s, baked anyway (--force)\n", someOptions.myLevel.c_str(), count.c_str());
 	}
-	const auto& editor = session.Editor();
+	auto& editor = session.Editor();
+	// Room IDs are checked before anything is baked: a misspelt one bakes nothing.
+	for (const std::string& id : someOptions.myRooms)
+	{
+		bool foundFlag = false;
+		for (int index = 0; index < editor.GetRooms().Count(); ++index)
+		{
+			foundFlag = foundFlag || editor.GetRooms()[index]->GetID() == id;
+		}
+		if (!foundFlag)
+		{
+			PrintError("level '" + someOptions.myLevel + "' has no room with the ID '" + id + "'");
+			return 2;
+		}
+	}
 	std::printf("level %s: %d rooms, %d point and %d spot lights\n", someOptions.myLevel.c_str(),
 	            editor.GetRooms().Count(), editor.GetPointLights().Count(), editor.GetSpotLights().Count());
 	const size_t before = session.GetProblemCount();
 	bool done = true;
-	if (!someOptions.mySpecularOnlyFlag)
+	bool ambientWrittenFlag = false;
+	if (someOptions.myPartBounce > 0)
 	{
-		done = BakeAmbient(session, someOptions) && done;
+		done = !StopAsked() && BakePart(session, someOptions);
 	}
-	if (!someOptions.myAmbientOnlyFlag)
+	else
 	{
-		done = BakeReflections(session, someOptions) && done;
+		if (!someOptions.mySpecularOnlyFlag && !StopAsked())
+		{
+			done = BakeAmbient(session, someOptions);
+			ambientWrittenFlag = done && someOptions.myBounces > 0;
+		}
+		if (!someOptions.myAmbientOnlyFlag && !StopAsked())
+		{
+			done = BakeReflections(session, someOptions) && done;
+		}
+	}
+	if (StopAsked())
+	{
+		return ReportCancel(someOptions, ambientWrittenFlag);
 	}
 	if (session.GetProblemCount() > before)
 	{
@@ -160,5 +380,25 @@ int RunBake(const BakeOptions& someOptions)
 		return 1;
 	}
 	return done ? 0 : 1;
+}
+
+int RunBakeMerge(const MergeOptions& someOptions)
+{
+	EditorSession session;
+	if (!session.Start(someOptions.myLevel, 64, 64, true) || !session.Load(someOptions.myLevel))
+	{
+		return 1;
+	}
+	std::string problem;
+	if (!session.Editor().MergeAmbientParts(Lumora::ToWide(someOptions.myLevel), someOptions.myParts,
+	                                        someOptions.myOutput, problem))
+	{
+		PrintError("not merged: " + problem);
+		return 1;
+	}
+	std::printf("merged %zu part%s into %s (%s)\n", someOptions.myParts.size(),
+	            someOptions.myParts.size() == 1 ? "" : "s", someOptions.myOutput.c_str(),
+	            SizeOf(someOptions.myOutput).c_str());
+	return 0;
 }
 } // namespace LumoraTool

@@ -3,6 +3,7 @@
 // job failed or found problems (said on standard error or listed), 2 bad arguments.
 #include <optional>
 #include <string>
+#include <vector>
 
 #include "core/Vector3.h"
 
@@ -17,11 +18,31 @@ struct BakeOptions
 	bool myDebugCapturesFlag = false;
 	// Bake a level in which check finds problems.
 	bool myForceFlag = false;
+	// Only these rooms: their cubemaps, and the ambient volume's probes inside them.
+	std::vector<std::string> myRooms;
+	// A part of a bake spread over machines (myPartBounce > 0): cells myFirst .. myFirst +
+	// myCount - 1 of that bounce, lit by myPrevious (the merged volume of the bounce before),
+	// into myPartOutput.
+	int myPartBounce = 0;
+	std::string myPrevious;
+	long long myFirst = 0;
+	long long myCount = 0;
+	std::string myPartOutput;
 };
 // Loads the level, bakes its ambient volume and/or its room reflections with a
 // progress bar, and prints what was written. A level in which check finds problems
 // (other than in its baked files) is refused, unless forced.
+// Ctrl-C or SIGTERM cancels it: nothing more is written, exit 130.
 int RunBake(const BakeOptions& someOptions);
+
+struct MergeOptions
+{
+	std::string myLevel;
+	std::vector<std::string> myParts;
+	std::string myOutput;
+};
+// One bounce's part files assembled into an ambient.sh-format file.
+int RunBakeMerge(const MergeOptions& someOptions);
 
 struct RenderOptions
 {

@@ -12,21 +12,21 @@ namespace
 constexpr int ourWidth = 40;
 } // namespace
 
-ProgressBar::ProgressBar(std::string aLabel, std::function<int()> aPoll)
+ProgressBar::ProgressBar(std::string aLabel, std::function<Progress()> aPoll)
     : myLabel(std::move(aLabel)), myPoll(std::move(aPoll)), myTerminalFlag(isatty(fileno(stdout)) != 0)
 {
 	// The value before the work starts may be the last job's: nothing is drawn until
 	// the value moves (or the work ends).
-	const int initial = myPoll();
+	const int initial = myPoll().myPercent;
 	myThread = std::thread([this, initial] {
 		bool movedFlag = false;
 		while (!myStopFlag.load())
 		{
-			const int percent = myPoll();
-			movedFlag = movedFlag || percent != initial;
+			const Progress progress = myPoll();
+			movedFlag = movedFlag || progress.myPercent != initial;
 			if (movedFlag)
 			{
-				Draw(percent);
+				Draw(progress);
 			}
 			std::this_thread::sleep_for(std::chrono::milliseconds(100));
 		}
@@ -54,19 +54,22 @@ void ProgressBar::Stop()
 	std::fflush(stdout);
 }
 
-void ProgressBar::Draw(int aPercent)
+void ProgressBar::Draw(const Progress& aProgress)
 {
-	const int percent = std::clamp(aPercent, 0, 100);
+	const int percent = std::clamp(aProgress.myPercent, 0, 100);
+	const std::string detail = aProgress.myDetail.empty() ? std::string() : "  " + aProgress.myDetail;
 	if (myTerminalFlag)
 	{
-		if (percent == myLastDrawn)
+		if (percent == myLastDrawn && detail == myLastDetail)
 		{
 			return;
 		}
 		const int filled = percent * ourWidth / 100;
-		std::printf("\r%-12s [%s%s] %3d%%", myLabel.c_str(),
+		// Padded to the last line's length, so a shorter detail leaves nothing behind.
+		std::printf("\r%-12s [%s%s] %3d%%%-*s", myLabel.c_str(),
 		            std::string(static_cast<size_t>(filled), '#').c_str(),
-		            std::string(static_cast<size_t>(ourWidth - filled), '.').c_str(), percent);
+		            std::string(static_cast<size_t>(ourWidth - filled), '.').c_str(), percent,
+		            static_cast<int>(std::max(detail.size(), myLastDetail.size())), detail.c_str());
 	}
 	else
 	{
@@ -75,9 +78,10 @@ void ProgressBar::Draw(int aPercent)
 		{
 			return;
 		}
-		std::printf("%-12s %3d%%\n", myLabel.c_str(), percent);
+		std::printf("%-12s %3d%%%s\n", myLabel.c_str(), percent, detail.c_str());
 	}
 	myLastDrawn = percent;
+	myLastDetail = detail;
 	std::fflush(stdout);
 }
 } // namespace LumoraTool

@@ -1,10 +1,11 @@
 #pragma once
-// ProgressBar: a second thread that polls a percentage (the facade's GetBakeProgress)
-// ten times a second and draws it on standard output while the calling thread works:
-// redrawn in place on a terminal, a line per tenth otherwise (logs, pipes). The value
-// found at the start is drawn only once it has moved: it may be the last job's.
+// ProgressBar: a second thread that polls a percentage (the facade's GetBakeProgress) and
+// a line of detail (bounce, counts, time left) ten times a second and draws them on
+// standard output while the calling thread works: redrawn in place on a terminal, a line
+// per tenth otherwise (logs, pipes). The value found at the start is drawn only once it
+// has moved: it may be the last job's.
 //
-//   LumoraTool::ProgressBar bar("ambient", [&] { return editor.GetBakeProgress(); });
+//   LumoraTool::ProgressBar bar("ambient", [&] { return ProgressBar::Progress{editor.GetBakeProgress(), ""}; });
 //   editor.BakeAmbient(level, 2, false);   // blocks; the bar moves meanwhile
 //   bar.Stop();                            // last value drawn, line ended
 #include <atomic>
@@ -17,7 +18,12 @@ namespace LumoraTool
 class ProgressBar
 {
 public:
-	ProgressBar(std::string aLabel, std::function<int()> aPoll);
+	struct Progress
+	{
+		int myPercent = 0;
+		std::string myDetail;
+	};
+	ProgressBar(std::string aLabel, std::function<Progress()> aPoll);
 	~ProgressBar();
 	ProgressBar(const ProgressBar&) = delete;
 	ProgressBar& operator=(const ProgressBar&) = delete;
@@ -25,13 +31,14 @@ public:
 	void Stop();
 
 private:
-	void Draw(int aPercent);
+	void Draw(const Progress& aProgress);
 
 	std::string myLabel;
-	std::function<int()> myPoll;
+	std::function<Progress()> myPoll;
 	std::atomic<bool> myStopFlag{false};
 	bool myTerminalFlag = false;
 	int myLastDrawn = -1;
+	std::string myLastDetail;
 	std::thread myThread;
 };
 } // namespace LumoraTool

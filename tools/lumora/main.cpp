@@ -70,6 +70,35 @@ int main(int argc, char** argv)
 	                      "Also save every probe's capture to data/cubemaps/sh debug/");
 	bakeCommand->add_flag("--force", bake.myForceFlag,
 	                      "Bake even a level in which check finds problems (they are baked in)");
+	CLI::Option* rooms =
+	    bakeCommand
+	        ->add_option("--rooms", bake.myRooms,
+	                     "Re-bake only these rooms (IDs, comma-separated): their cubemaps, and the ambient "
+	                     "probes inside them (every other cell of ambient.sh is kept)")
+	        ->delimiter(',');
+	std::string probes;
+	CLI::Option* partBounce =
+	    bakeCommand
+	        ->add_option("--bounce", bake.myPartBounce,
+	                     "Bake one bounce (from 1) of a range of cells into a part file, for a bake spread "
+	                     "over machines (with --probes and --out; lumora bake-merge joins the parts)")
+	        ->check(CLI::Range(1, 16));
+	CLI::Option* previous = bakeCommand->add_option(
+	    "--previous", bake.myPrevious, "The merged volume of the bounce before (--bounce 2 and on)");
+	CLI::Option* probeRange = bakeCommand->add_option(
+	    "--probes", probes, "FIRST:COUNT: the cells of the part, in ambient.sh's order (x, then y, then z)");
+	CLI::Option* partOutput = bakeCommand->add_option("--out", bake.myPartOutput, "The part file to write");
+	partBounce->needs(probeRange)->needs(partOutput)->excludes(rooms)->excludes(specularOnly);
+	previous->needs(partBounce);
+	probeRange->needs(partBounce);
+	partOutput->needs(partBounce);
+
+	LumoraTool::MergeOptions merge;
+	CLI::App* mergeCommand = app.add_subcommand(
+	    "bake-merge", "Join one bounce's part files (lumora bake --bounce) into an ambient.sh-format file");
+	mergeCommand->add_option("LEVEL", merge.myLevel, "Level folder name under data/XML/levels/")->required();
+	mergeCommand->add_option("PART", merge.myParts, "The bounce's part files")->required();
+	mergeCommand->add_option("--out", merge.myOutput, "The volume to write")->required();
 
 	LumoraTool::RenderOptions render;
 	std::string size = "1280x720";
@@ -133,9 +162,36 @@ int main(int argc, char** argv)
 	bake.myLevel = LumoraTool::LevelSpelledOnDisk(bake.myLevel);
 	render.myLevel = LumoraTool::LevelSpelledOnDisk(render.myLevel);
 	checkLevel = LumoraTool::LevelSpelledOnDisk(checkLevel);
+	merge.myLevel = LumoraTool::LevelSpelledOnDisk(merge.myLevel);
 	if (*bakeCommand)
 	{
+		if (*partBounce)
+		{
+			char rest = 0;
+			if (std::sscanf(probes.c_str(), "%lld:%lld%c", &bake.myFirst, &bake.myCount, &rest) != 2 ||
+			    bake.myFirst < 0 || bake.myCount < 1)
+			{
+				LumoraTool::PrintError("--probes takes FIRST:COUNT, a first cell from 0 and a count from 1 (as "
+				                       "0:5000), not '" +
+				                       probes + "'");
+				return 2;
+			}
+			if ((bake.myPartBounce > 1) != !bake.myPrevious.empty())
+			{
+				LumoraTool::PrintError(bake.myPartBounce > 1
+				                           ? "--bounce " + std::to_string(bake.myPartBounce) +
+				                                 " needs --previous, the merged volume of bounce " +
+				                                 std::to_string(bake.myPartBounce - 1)
+				                           : std::string("--bounce 1 is lit by direct light only: it takes no --previous"));
+				return 2;
+			}
+			bake.myAmbientOnlyFlag = true;
+		}
 		return LumoraTool::RunBake(bake);
+	}
+	if (*mergeCommand)
+	{
+		return LumoraTool::RunBakeMerge(merge);
 	}
 	if (*renderCommand)
 	{
