@@ -10,6 +10,8 @@ PACKAGES=(
 	libgcc-12-dev
 	# XML files
 	libtinyxml-dev
+	# the bake record: JSON, and XXH3-128 content hashes of a bake's inputs
+	nlohmann-json3-dev libxxhash-dev
 	# the command line tool's argument parsing
 	libcli11-dev
 	# tests and benchmarks (the tests use GoogleMock's matchers, header-only)

@@ -52,4 +52,15 @@ void TextureContainer::Clear()
 {
 	myTextures.clear();
 }
+
+std::vector<std::string> TextureContainer::GetFileNames() const
+{
+	std::vector<std::string> names;
+	names.reserve(myTextures.size());
+	for (const auto& [name, texture] : myTextures)
+	{
+		names.push_back(name);
+	}
+	return names;
+}
 } // namespace Zeph

@@ -31,6 +31,8 @@ public:
 	void Clear();
 
 	size_t GetCount() const { return myTextures.size(); }
+	// The file names of the loaded textures, sorted (a bake's inputs).
+	std::vector<std::string> GetFileNames() const;
 	const std::vector<std::string>& GetAcceptedExtensions() const { return myAcceptedExtensions; }
 
 private:

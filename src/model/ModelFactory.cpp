@@ -251,6 +251,18 @@ Intersection::Sphere ModelFactory::GetCullShapeFromModel(const std::string& aNam
 	return Intersection::Sphere(Vector3<float>(0.0f, 0.0f, 0.0f), 1.0f);
 }
 
+std::vector<std::string> ModelFactory::GetFileNames() const
+{
+	// Only trees read from files get a cull shape (Store).
+	std::vector<std::string> names;
+	names.reserve(myCullShapes.size());
+	for (const auto& [name, shape] : myCullShapes)
+	{
+		names.push_back(name);
+	}
+	return names;
+}
+
 void ModelFactory::Clear()
 {
 	myModels.clear();

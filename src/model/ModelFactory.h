@@ -12,6 +12,7 @@
 #include <map>
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "core/Sphere.h"
 #include "core/Vector3.h"
@@ -45,6 +46,9 @@ public:
 	// Deletes every tree and sphere.
 	void Clear();
 	size_t GetCount() const { return myModels.size(); }
+	// The file names of the trees read from files, sorted (a bake's inputs); boxes made by
+	// CreateAABB are no files and are not named.
+	std::vector<std::string> GetFileNames() const;
 
 	// The bounding sphere of a tree: of the root's model, or of the first model found
 	// depth-first (a node's model before its children's). Positions are read for the

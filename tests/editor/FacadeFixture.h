@@ -141,6 +141,7 @@ private:
 				for (const fs::directory_entry& level : fs::directory_iterator(data / "XML/levels"))
 				{
 					fs::remove(level.path() / "ambient.sh");
+					fs::remove(level.path() / "bake.json");
 				}
 			}
 			else if (name == "Cubemaps")

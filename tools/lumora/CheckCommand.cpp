@@ -24,7 +24,8 @@ int RunCheck(const std::string& aLevel)
 	}
 	const LevelReport report = CheckLevel(session, aLevel);
 	std::printf("level %s: the catalogues data/XML/EntityTypes.xml and DecalTypes.xml, and rooms.xml, "
-	            "entities.xml, lights.xml, nodegraph.xml, decals.xml, ambient.sh and the rooms' cubemaps\n",
+	            "entities.xml, lights.xml, nodegraph.xml, decals.xml, ambient.sh, bake.json and the rooms' "
+	            "cubemaps\n",
 	            aLevel.c_str());
 	for (const std::string& note : report.myNotes)
 	{

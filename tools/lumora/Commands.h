@@ -62,6 +62,6 @@ int RunRender(const RenderOptions& someOptions);
 // Reads the level's files and both catalogues and lists every problem.
 int RunCheck(const std::string& aLevel);
 
-// Describes an ambient.sh, a DDS or an .al model.
+// Describes an ambient.sh, a DDS, an .al model or a bake record (bake.json).
 int RunInfo(const std::string& aPath);
 } // namespace LumoraTool

@@ -1,15 +1,18 @@
-// lumora info: what an ambient.sh, a DDS or an .al model holds, read with the
-// library's own readers (no GPU needed).
+// lumora info: what an ambient.sh, a DDS, an .al model or a bake record (bake.json) holds,
+// read with the library's own readers (no GPU needed).
 #include <algorithm>
 #include <cstdio>
 #include <filesystem>
 #include <fstream>
 #include <iterator>
+#include <map>
 #include <string>
 #include <vector>
 
 #include "Commands.h"
 #include "EditorSession.h"
+#include "editor/BakeInputs.h"
+#include "editor/BakeRecord.h"
 #include "model/AlFile.h"
 #include "model/Model.h"
 #include "model/ModelNode.h"
@@ -194,6 +197,111 @@ int DescribeAl(const std::string& aPath)
 	}
 	return 0;
 }
+std::string Joined(const std::vector<std::string>& someTexts)
+{
+	std::string text;
+	for (const std::string& each : someTexts)
+	{
+		text += (text.empty() ? "" : ", ") + each;
+	}
+	return text;
+}
+
+// One phase of a record; someCurrentHashes is empty when no data/ folder is here to compare with.
+void DescribeBakePhase(const char* aName, const Lumora::BakePhaseRecord& aPhase, bool anAmbientFlag,
+                       const std::map<std::string, std::string>& someCurrentHashes)
+{
+	std::printf("  %s: baked %s by Lumora %s, %s\n", aName, aPhase.myDate.c_str(),
+	            aPhase.myToolVersion.c_str(),
+	            aPhase.myRooms.empty() ? "every room" : ("rooms " + Joined(aPhase.myRooms)).c_str());
+	if (anAmbientFlag)
+	{
+		const Lumora::BakeGrid& grid = aPhase.myGrid;
+		const Vector3<float>& minimum = grid.myWorldMin;
+		const Vector3<float> maximum = grid.myWorldMin + grid.myWorldSize;
+		std::printf("    %d bounce%s, %d x %d x %d probes, (%g, %g, %g) to (%g, %g, %g)\n", aPhase.myBounces,
+		            aPhase.myBounces == 1 ? "" : "s", grid.myCounts[0], grid.myCounts[1], grid.myCounts[2],
+		            minimum.x, minimum.y, minimum.z, maximum.x, maximum.y, maximum.z);
+	}
+	for (const Lumora::BakeRoomUpdate& update : aPhase.myRoomUpdates)
+	{
+		std::printf("    baked again %s: rooms %s\n", update.myDate.c_str(), Joined(update.myRooms).c_str());
+	}
+	for (const auto& [path, size] : aPhase.myFiles)
+	{
+		std::printf("    wrote %s (%llu bytes)\n", path.c_str(), static_cast<unsigned long long>(size));
+	}
+	if (!aPhase.myTimings.empty())
+	{
+		std::vector<std::string> timings;
+		for (const auto& [step, seconds] : aPhase.myTimings)
+		{
+			char text[64];
+			std::snprintf(text, sizeof(text), " %.3f s", seconds);
+			timings.push_back(step + text);
+		}
+		std::printf("    timings: %s\n", Joined(timings).c_str());
+	}
+	const size_t count = aPhase.myInputs.size();
+	if (someCurrentHashes.empty())
+	{
+		std::printf("    inputs: %zu file%s (not compared: no data/ folder here)\n", count,
+		            count == 1 ? "" : "s");
+		return;
+	}
+	std::vector<std::string> differing;
+	for (const auto& [path, hash] : aPhase.myInputs)
+	{
+		const std::string now = someCurrentHashes.at(path);
+		if (now != hash)
+		{
+			const bool goneFlag = now == Lumora::ourMissingHash;
+			differing.push_back(path + (goneFlag                         ? " is gone"
+			                            : hash == Lumora::ourMissingHash ? " appeared"
+			                                                             : " changed"));
+		}
+	}
+	std::printf("    inputs: %zu file%s, %zu unchanged\n", count, count == 1 ? "" : "s",
+	            count - differing.size());
+	for (const std::string& line : differing)
+	{
+		std::printf("      %s\n", line.c_str());
+	}
+}
+
+int DescribeBakeRecord(const std::string& aPath)
+{
+	Lumora::BakeRecord record;
+	std::string problem;
+	if (Lumora::ReadBakeRecord(aPath, record, problem) != Lumora::BakeRecordRead::OK)
+	{
+		PrintError(problem);
+		return 1;
+	}
+	std::error_code ignored;
+	const std::map<std::string, std::string> current =
+	    std::filesystem::is_directory("data", ignored)
+	        ? Lumora::HashBakeInputs(Lumora::GetRecordedInputs(record))
+	        : std::map<std::string, std::string>();
+	std::printf("%s: bake record\n", aPath.c_str());
+	if (record.myAmbient)
+	{
+		DescribeBakePhase("ambient", *record.myAmbient, true, current);
+	}
+	else
+	{
+		std::printf("  ambient: not on record\n");
+	}
+	if (record.myReflections)
+	{
+		DescribeBakePhase("reflections", *record.myReflections, false, current);
+	}
+	else
+	{
+		std::printf("  reflections: not on record\n");
+	}
+	return 0;
+}
 } // namespace
 
 int RunInfo(const std::string& aPath)
@@ -219,7 +327,11 @@ int RunInfo(const std::string& aPath)
 	{
 		return DescribeAl(aPath);
 	}
-	PrintError("cannot describe " + aPath + " (it reads an ambient.sh, a .dds or an .al model)");
+	if (EndsWith(lower, "bake.json"))
+	{
+		return DescribeBakeRecord(aPath);
+	}
+	PrintError("cannot describe " + aPath + " (it reads an ambient.sh, a .dds, an .al model or a bake.json)");
 	return 2;
 }
 } // namespace LumoraTool

@@ -5,7 +5,9 @@
 #include <set>
 #include <sstream>
 #include <system_error>
+#include <utility>
 
+#include "editor/BakeRecord.h"
 #include "engine/Room.h"
 #include "platform/paths/Paths.h"
 #include "renderer/CubemapContainer.h"
@@ -136,29 +138,86 @@ void CheckRooms(const std::string& aLevel, const Lumora::LumoraWrapper& anEditor
 }
 
 // What is not baked yet. Damaged files were reported by the load (the ambient volume by
-// Renderer::SetSH, each room's cubemap by the entities' loading).
-void NoteUnbakedFiles(const std::string& aLevel, const Lumora::LumoraWrapper& anEditor, LevelReport& aReport)
+// Renderer::SetSH, each room's cubemap by the entities' loading). Returns, per phase, whether
+// any of its files is there.
+std::pair<bool, bool> NoteUnbakedFiles(const std::string& aLevel, const Lumora::LumoraWrapper& anEditor,
+                                       LevelReport& aReport)
 {
 	const std::string ambient = "data/XML/levels/" + aLevel + "/ambient.sh";
 	std::error_code ignored;
-	if (!std::filesystem::exists(Paths::Resolve(ambient), ignored))
+	const bool ambientFlag = std::filesystem::exists(Paths::Resolve(ambient), ignored);
+	if (!ambientFlag)
 	{
 		aReport.myNotes.push_back(ambient + ": not baked yet");
 	}
+	bool reflectionsFlag = false;
 	std::string resolved;
 	std::string problem;
 	const auto& rooms = anEditor.GetRooms();
 	for (int index = 0; index < rooms.Count(); ++index)
 	{
 		const std::string cubemap = Zeph::CubemapContainer::GetRoomFile(aLevel, rooms[index]->GetID());
-		if (!cubemap.empty() && Zeph::CubemapContainer::CheckFile(cubemap, resolved, problem) ==
-		                            Zeph::CubemapContainer::FileState::MISSING)
+		if (cubemap.empty())
+		{
+			continue;
+		}
+		if (Zeph::CubemapContainer::CheckFile(cubemap, resolved, problem) ==
+		    Zeph::CubemapContainer::FileState::MISSING)
 		{
 			aReport.myNotes.push_back(cubemap + ": not baked yet (room '" + rooms[index]->GetID() +
 			                          "' shows the fallback cubemap)");
 		}
+		else
+		{
+			reflectionsFlag = true;
+		}
+	}
+	return {ambientFlag, reflectionsFlag};
+}
+
+// The bake record: a damaged one, and inputs changed since the bake it records, are the baked
+// files' problems (a bake replaces the record). A phase whose files are there without a record
+// of their bake is a note: whether that bake is stale cannot be told. What is not baked at all
+// was noted above.
+void CheckBakeRecord(const std::string& aLevel, bool anAmbientFlag, bool aReflectionsFlag,
+                     LevelReport& aReport)
+{
+	const std::string path = Lumora::GetBakeRecordPath(aLevel);
+	Lumora::BakeRecord record;
+	std::string problem;
+	const Lumora::BakeRecordRead read = Lumora::ReadBakeRecord(path, record, problem);
+	if (read == Lumora::BakeRecordRead::DAMAGED)
+	{
+		aReport.myBakedProblems.push_back(problem);
+		return;
+	}
+	std::vector<std::string> unrecorded;
+	if (anAmbientFlag && !record.myAmbient)
+	{
+		unrecorded.push_back("ambient");
+	}
+	if (aReflectionsFlag && !record.myReflections)
+	{
+		unrecorded.push_back("reflection");
+	}
+	if (read == Lumora::BakeRecordRead::MISSING && !unrecorded.empty())
+	{
+		aReport.myNotes.push_back(path + ": not written yet (baked before bake records were kept), so "
+		                                 "whether the bake is stale cannot be told");
+	}
+	else if (!unrecorded.empty())
+	{
+		aReport.myNotes.push_back(
+		    path + ": no record of the " +
+		    (unrecorded.size() == 2 ? "ambient and reflection bakes" : unrecorded[0] + " bake") +
+		    ", so whether it is stale cannot be told");
+	}
+	for (const std::string& stale : Lumora::FindStaleInputs(record))
+	{
+		aReport.myBakedProblems.push_back(stale);
 	}
 }
+
 // A file whose section is missing loads as if the section were empty, but the editor cannot
 // save into it (the saver has no section to empty): said here, before a designer's edits are
 // lost to a failed save. Files that do not parse were reported by loading already.
@@ -207,7 +266,8 @@ LevelReport CheckLevel(EditorSession& aSession, const std::string& aLevel)
 	CheckEntityTypes(aLevel, editor, report);
 	CheckRooms(aLevel, editor, report);
 	CheckSavedSections(aLevel, report);
-	NoteUnbakedFiles(aLevel, editor, report);
+	const auto [ambientFlag, reflectionsFlag] = NoteUnbakedFiles(aLevel, editor, report);
+	CheckBakeRecord(aLevel, ambientFlag, reflectionsFlag, report);
 	return report;
 }
 } // namespace LumoraTool

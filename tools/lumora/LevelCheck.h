@@ -3,7 +3,8 @@
 // loaded the way the editor loads it (every report collected, none fatal) and then looked at
 // for what loading passes over in silence but would make a bake wrong: entity types that the
 // catalogue lacks (a misspelt catalogue leaves a level empty), rooms without extent, room IDs
-// that are shared or cannot name a cubemap file.
+// that are shared or cannot name a cubemap file. The bake record (bake.json) says whether the
+// baked files are older than the level's files, catalogues, models and textures.
 //
 //   LumoraTool::EditorSession session;
 //   if (!session.Start(level, 64, 64, true)) return 1;
@@ -20,7 +21,8 @@ struct LevelReport
 {
 	// The level's files and the catalogues, as one line each: a bake of the level would be wrong.
 	std::vector<std::string> myProblems;
-	// The baked outputs (a damaged ambient.sh, a room cubemap that is no cube): a bake replaces them.
+	// The baked outputs (a damaged ambient.sh, a room cubemap that is no cube, a damaged bake record,
+	// an input changed since the bake): a bake replaces them.
 	std::vector<std::string> myBakedProblems;
 	// What is not baked yet: not a problem.
 	std::vector<std::string> myNotes;
