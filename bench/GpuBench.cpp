@@ -76,7 +76,8 @@ void BM_IndexedQuadDraws(benchmark::State& aState)
 	Gpu::Buffer indexBuffer;
 	const GLuint program = MakeQuadProgram();
 	if (program == 0 || !target.Init(context, desc) ||
-	    !indexBuffer.Init(context, {.myKind = Gpu::BufferKind::Index, .mySize = sizeof(indices), .myLabel = "quad"},
+	    !indexBuffer.Init(context,
+	                      {.myKind = Gpu::BufferKind::Index, .mySize = sizeof(indices), .myLabel = "quad"},
 	                      indices))
 	{
 		aState.SkipWithError("setup failed");

@@ -22,7 +22,7 @@ namespace
 {
 std::string AmbientPath(const std::u16string& aLevel)
 {
-	return "data/XML/levels/" + SysSTringToStdString(aLevel) + "/ambient.sh";
+	return "data/XML/levels/" + ToNarrow(aLevel) + "/ambient.sh";
 }
 
 // The rooms named by someIDs, or the first ID that names none.
@@ -59,7 +59,7 @@ void RecordPhase(const std::u16string& aLevel, BakePhase aPhase, const std::vect
 	{
 		return;
 	}
-	const std::string level = SysSTringToStdString(aLevel);
+	const std::string level = ToNarrow(aLevel);
 	std::vector<std::string> written;
 	std::map<std::string, double> timings{{"total", status.myElapsedSeconds}};
 	if (aPhase == BakePhase::AMBIENT)
@@ -75,7 +75,8 @@ void RecordPhase(const std::u16string& aLevel, BakePhase aPhase, const std::vect
 		{
 			const std::string& id = someLevelRooms[index]->GetID();
 			const std::string file = Zeph::CubemapContainer::GetRoomFile(level, id);
-			if (!file.empty() && (someRooms.empty() || std::find(someRooms.begin(), someRooms.end(), id) != someRooms.end()))
+			if (!file.empty() &&
+			    (someRooms.empty() || std::find(someRooms.begin(), someRooms.end(), id) != someRooms.end()))
 			{
 				written.push_back(file);
 			}
@@ -101,10 +102,24 @@ void RecordPhase(const std::u16string& aLevel, BakePhase aPhase, const std::vect
 	}
 }
 
-// One hash over every file the loaded level's bake reads.
-std::string HashOfInputs(const std::u16string& aLevel)
+// One hash over every file a part of the loaded level's ambient bake reads: the bake's inputs
+// and the cubemaps its ambient pass reflects (the rooms' own, the fallback). The record leaves
+// the cubemaps out, as they are the reflection bake's outputs (a whole bake writes them after
+// the volume); parts baked before and after they changed must not be merged.
+std::string HashOfInputs(const std::u16string& aLevel, const GrowingArray<Zeph::Room*>& someRooms)
 {
-	return CombineInputHashes(HashBakeInputs(CollectBakeInputs(SysSTringToStdString(aLevel))));
+	const std::string level = ToNarrow(aLevel);
+	std::vector<std::string> inputs = CollectBakeInputs(level);
+	inputs.push_back(Zeph::CubemapContainer::ourFallbackFile);
+	for (int index = 0; index < someRooms.Count(); ++index)
+	{
+		const std::string file = Zeph::CubemapContainer::GetRoomFile(level, someRooms[index]->GetID());
+		if (!file.empty())
+		{
+			inputs.push_back(file);
+		}
+	}
+	return CombineInputHashes(HashBakeInputs(inputs));
 }
 } // namespace
 
@@ -161,16 +176,16 @@ bool LumoraWrapper::BakeAmbientRooms(const std::u16string& aLevel, int aNumOfBou
 		const Zeph::BakeStatus status = renderer.GetBakeStatus();
 		if (status.myLastResult != Zeph::BakeResult::FINISHED)
 		{
-			aProblemOut = "the ambient bake " + std::string(Zeph::GetBakeResultName(status.myLastResult)) + ": " +
-			              status.myLastMessage;
+			aProblemOut = "the ambient bake " + std::string(Zeph::GetBakeResultName(status.myLastResult)) +
+			              ": " + status.myLastMessage;
 		}
 	}
 	Release();
 	return aProblemOut.empty();
 }
 
-bool LumoraWrapper::BakeSpecularRooms(const std::u16string& aLevel, const std::vector<std::string>& someRoomIDs,
-                                      std::string& aProblemOut)
+bool LumoraWrapper::BakeSpecularRooms(const std::u16string& aLevel,
+                                      const std::vector<std::string>& someRoomIDs, std::string& aProblemOut)
 {
 	Claim();
 	GrowingArray<Zeph::Room*> rooms(4, 4);
@@ -193,9 +208,9 @@ bool LumoraWrapper::BakeSpecularRooms(const std::u16string& aLevel, const std::v
 	return aProblemOut.empty();
 }
 
-bool LumoraWrapper::BakeAmbientPart(const std::u16string& aLevel, int aBounce, const std::string& aPreviousFile,
-                                    long long aFirst, long long aCount, const std::string& anOutFile,
-                                    std::string& aProblemOut)
+bool LumoraWrapper::BakeAmbientPart(const std::u16string& aLevel, int aBounce,
+                                    const std::string& aPreviousFile, long long aFirst, long long aCount,
+                                    const std::string& anOutFile, std::string& aProblemOut)
 {
 	Zeph::AmbientVolume previous;
 	std::string previousHash;
@@ -220,11 +235,12 @@ bool LumoraWrapper::BakeAmbientPart(const std::u16string& aLevel, int aBounce, c
 		return false;
 	}
 	Claim();
-	const std::string inputsHash = HashOfInputs(aLevel);
+	const std::string inputsHash = HashOfInputs(aLevel, myRooms);
 	Zeph::Renderer& renderer = Zeph::Engine::GetInstance()->GetRenderer();
 	QueueBakeScene();
 	Zeph::AmbientPart part;
-	bool bakedFlag = renderer.GenerateSHPart(myRooms, aBounce, aBounce > 1 ? &previous : nullptr, aFirst, aCount, part);
+	bool bakedFlag =
+	    renderer.GenerateSHPart(myRooms, aBounce, aBounce > 1 ? &previous : nullptr, aFirst, aCount, part);
 	renderer.DiscardLateItems();
 	// The part's light is not the level's: the editor shows the level's own again.
 	renderer.SetSH(AmbientPath(aLevel));
@@ -250,7 +266,7 @@ bool LumoraWrapper::MergeAmbientParts(const std::u16string& aLevel, const std::v
 	expected.myWorldMin = grid.myWorldMin;
 	expected.myWorldSize = grid.myWorldSize;
 	std::copy(grid.myCounts, grid.myCounts + 3, expected.myCounts);
-	expected.myInputsHash = HashOfInputs(aLevel);
+	expected.myInputsHash = HashOfInputs(aLevel, myRooms);
 	Release();
 	Zeph::AmbientVolume volume;
 	return Zeph::MergeAmbientParts(someParts, expected, volume, aProblemOut) &&

@@ -237,9 +237,10 @@ Renderer::SHBakeRun Renderer::RunSHBake(const SHBakeJob& aJob, std::vector<uint3
 	// A large level bakes for hours: say how much there is to do before starting.
 	if (aJob.myBounceCount > 0)
 	{
-		ReportDebug(__LINE__, "Zeph::Renderer::GenerateSH", "Baking %lld probes (of %d x %d x %d cells) over %d bounce%s into %s",
-		            selectedProbes, counts[0], counts[1], counts[2], aJob.myBounceCount,
-		            aJob.myBounceCount == 1 ? "" : "s", aJob.myTarget.c_str());
+		ReportDebug(__LINE__, "Zeph::Renderer::GenerateSH",
+		            "Baking %lld probes (of %d x %d x %d cells) over %d bounce%s into %s", selectedProbes,
+		            counts[0], counts[1], counts[2], aJob.myBounceCount, aJob.myBounceCount == 1 ? "" : "s",
+		            aJob.myTarget.c_str());
 	}
 	SetVolumeBounds(grid.myWorldMin, grid.myWorldSize);
 	if (aJob.myFirstLight != nullptr)
@@ -272,8 +273,8 @@ Renderer::SHBakeRun Renderer::RunSHBake(const SHBakeJob& aJob, std::vector<uint3
 	};
 	// The progress counts cells: every cell of the grid in a whole bake (layers beyond the
 	// last probe position are never visited), the selected ones otherwise.
-	const double cellsToVisit = aJob.mySelected ? static_cast<double>(selectedCells)
-	                                            : static_cast<double>(grid.GetCellCount());
+	const double cellsToVisit =
+	    aJob.mySelected ? static_cast<double>(selectedCells) : static_cast<double>(grid.GetCellCount());
 	const double total = cellsToVisit * std::max(aJob.myBounceCount, 1);
 	bool cancelledFlag = false;
 	for (int run = 0; run < aJob.myBounceCount && !cancelledFlag; ++run)
@@ -342,7 +343,6 @@ Renderer::SHBakeRun Renderer::RunSHBake(const SHBakeJob& aJob, std::vector<uint3
 	return cancelledFlag ? SHBakeRun::CANCELLED : SHBakeRun::DONE;
 }
 
-
 namespace
 {
 bool SameGrid(const AmbientVolume& aVolume, const AmbientGrid& aGrid)
@@ -367,14 +367,16 @@ void Renderer::GenerateSH(const GrowingArray<Room*>& someRooms, const std::strin
 	GenerateSHVolume(someRooms, nullptr, aPath, aBounces, aDebugFlag);
 }
 
-void Renderer::GenerateSHForRooms(const GrowingArray<Room*>& someRooms, const GrowingArray<Room*>& someBakedRooms,
-                                  const std::string& aPath, int aBounces)
+void Renderer::GenerateSHForRooms(const GrowingArray<Room*>& someRooms,
+                                  const GrowingArray<Room*>& someBakedRooms, const std::string& aPath,
+                                  int aBounces)
 {
 	GenerateSHVolume(someRooms, &someBakedRooms, aPath, aBounces, false);
 }
 
-void Renderer::GenerateSHVolume(const GrowingArray<Room*>& someRooms, const GrowingArray<Room*>* someBakedRooms,
-                                const std::string& aPath, int aBounces, bool aDebugFlag)
+void Renderer::GenerateSHVolume(const GrowingArray<Room*>& someRooms,
+                                const GrowingArray<Room*>* someBakedRooms, const std::string& aPath,
+                                int aBounces, bool aDebugFlag)
 {
 	const char* function = "Zeph::Renderer::GenerateSH";
 	if (Engine::GetInstance() == nullptr)
@@ -406,11 +408,12 @@ void Renderer::GenerateSHVolume(const GrowingArray<Room*>& someRooms, const Grow
 		keepFlag = read == AmbientVolumeRead::OK && SameGrid(kept, grid);
 		if (!keepFlag)
 		{
-			note = (read == AmbientVolumeRead::OK ? aPath + " is of a grid of " + DescribeCounts(kept.myCounts) +
-			                                            ", the rooms' is " + DescribeCounts(grid.myCounts)
-			        : read == AmbientVolumeRead::CANNOT_OPEN ? aPath + " does not exist"
-			                                                 : problem) +
-			       ": the whole volume was baked";
+			note =
+			    (read == AmbientVolumeRead::OK ? aPath + " is of a grid of " + DescribeCounts(kept.myCounts) +
+			                                         ", the rooms' is " + DescribeCounts(grid.myCounts)
+			     : read == AmbientVolumeRead::CANNOT_OPEN ? aPath + " does not exist"
+			                                              : problem) +
+			    ": the whole volume was baked";
 			ReportDebug(__LINE__, function, "%s", note.c_str());
 		}
 	}
@@ -462,8 +465,8 @@ void Renderer::GenerateSHVolume(const GrowingArray<Room*>& someRooms, const Grow
 	}
 	if (run == SHBakeRun::NOT_RUN)
 	{
-		myBakeMonitor.End(BakeResult::FAILED, "the probe cubemap could not be made; " + aPath +
-		                                          " is left as it was");
+		myBakeMonitor.End(BakeResult::FAILED,
+		                  "the probe cubemap could not be made; " + aPath + " is left as it was");
 		return;
 	}
 	if (aBounces > 0)
@@ -489,8 +492,9 @@ void Renderer::GenerateSHVolume(const GrowingArray<Room*>& someRooms, const Grow
 	myBakeMonitor.End(BakeResult::FINISHED, note);
 }
 
-bool Renderer::GenerateSHPart(const GrowingArray<Room*>& someRooms, int aBounce, const AmbientVolume* aPrevious,
-                              long long aFirst, long long aCount, AmbientPart& aPartOut)
+bool Renderer::GenerateSHPart(const GrowingArray<Room*>& someRooms, int aBounce,
+                              const AmbientVolume* aPrevious, long long aFirst, long long aCount,
+                              AmbientPart& aPartOut)
 {
 	const char* function = "Zeph::Renderer::GenerateSHPart";
 	myBakingProgressCounter = 0;
@@ -507,8 +511,8 @@ bool Renderer::GenerateSHPart(const GrowingArray<Room*>& someRooms, int aBounce,
 	else if (problem.empty() && (aFirst < 0 || aCount < 1 || aFirst > cells - aCount))
 	{
 		problem = "cells " + std::to_string(aFirst) + " to " + std::to_string(aFirst + aCount - 1) +
-		          " are not all in the grid of " + DescribeCounts(grid.myCounts) + " (" + std::to_string(cells) +
-		          " cells, 0 to " + std::to_string(cells - 1) + ")";
+		          " are not all in the grid of " + DescribeCounts(grid.myCounts) + " (" +
+		          std::to_string(cells) + " cells, 0 to " + std::to_string(cells - 1) + ")";
 	}
 	else if (problem.empty() && aBounce < 1)
 	{
@@ -516,7 +520,8 @@ bool Renderer::GenerateSHPart(const GrowingArray<Room*>& someRooms, int aBounce,
 	}
 	else if (problem.empty() && aBounce > 1 && aPrevious == nullptr)
 	{
-		problem = "bounce " + std::to_string(aBounce) + " needs the volume of bounce " + std::to_string(aBounce - 1);
+		problem = "bounce " + std::to_string(aBounce) + " needs the volume of bounce " +
+		          std::to_string(aBounce - 1);
 	}
 	else if (problem.empty() && aBounce > 1 && !SameGrid(*aPrevious, grid))
 	{
@@ -554,7 +559,8 @@ bool Renderer::GenerateSHPart(const GrowingArray<Room*>& someRooms, int aBounce,
 	if (run != SHBakeRun::DONE)
 	{
 		myBakeMonitor.End(run == SHBakeRun::CANCELLED ? BakeResult::CANCELLED : BakeResult::FAILED,
-		                  run == SHBakeRun::CANCELLED ? "no part written" : "the probe cubemap could not be made");
+		                  run == SHBakeRun::CANCELLED ? "no part written"
+		                                              : "the probe cubemap could not be made");
 		return false;
 	}
 	AmbientPart part;

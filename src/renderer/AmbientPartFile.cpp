@@ -99,8 +99,8 @@ bool WriteAmbientPart(const std::string& aPath, const AmbientPart& aPart, std::s
 	               WriteVector(file, aPart.myWorldMin) && file.Write(aPart.myCounts[0]) &&
 	               file.Write(aPart.myCounts[1]) && file.Write(aPart.myCounts[2]) &&
 	               WriteRaw(file, static_cast<int64_t>(aPart.myFirst)) &&
-	               WriteRaw(file, static_cast<int64_t>(aPart.myCount)) && WriteHash(file, aPart.myInputsHash) &&
-	               WriteHash(file, aPart.myPreviousHash);
+	               WriteRaw(file, static_cast<int64_t>(aPart.myCount)) &&
+	               WriteHash(file, aPart.myInputsHash) && WriteHash(file, aPart.myPreviousHash);
 	for (const std::vector<uint32_t>& block : aPart.myBlocks)
 	{
 		written = written && file.WriteData(block.data(), static_cast<int>(block.size() * 4));

@@ -40,10 +40,7 @@ struct AmbientPart
 	std::string myPreviousHash;
 	std::vector<uint32_t> myBlocks[AmbientVolume::ourBlockCount];
 
-	long long GetCellCount() const
-	{
-		return static_cast<long long>(myCounts[0]) * myCounts[1] * myCounts[2];
-	}
+	long long GetCellCount() const { return static_cast<long long>(myCounts[0]) * myCounts[1] * myCounts[2]; }
 };
 
 // Written to a temporary and renamed, as ambient.sh is.

@@ -70,8 +70,9 @@ void BakeMonitor::End(BakeResult aResult, const std::string& aMessage)
 {
 	const std::lock_guard lock(myMutex);
 	myStatus.myElapsedSeconds =
-	    myRunningFlag.load() ? std::chrono::duration<double>(std::chrono::steady_clock::now() - myStart).count()
-	                         : 0.0;
+	    myRunningFlag.load()
+	        ? std::chrono::duration<double>(std::chrono::steady_clock::now() - myStart).count()
+	        : 0.0;
 	myStatus.myPhase = BakePhase::IDLE;
 	myStatus.mySecondsLeft = aResult == BakeResult::FINISHED ? 0.0 : -1.0;
 	myStatus.myLastResult = aResult;
@@ -96,7 +97,8 @@ BakeStatus BakeMonitor::GetStatus() const
 	{
 		return status;
 	}
-	status.myElapsedSeconds = std::chrono::duration<double>(std::chrono::steady_clock::now() - myStart).count();
+	status.myElapsedSeconds =
+	    std::chrono::duration<double>(std::chrono::steady_clock::now() - myStart).count();
 	// The work is counted in probes for the ambient bake and in rooms for the reflections.
 	const bool probesFlag = status.myPhase == BakePhase::AMBIENT;
 	const double done = probesFlag ? static_cast<double>(status.myProbesDone) : status.myRoomsDone;

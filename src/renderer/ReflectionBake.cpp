@@ -120,8 +120,8 @@ void Renderer::GenerateReflections(const GrowingArray<Room*>& someRooms, const s
 		return;
 	}
 	const auto baked = [someBakedRooms](const Room& aRoom) {
-		return someBakedRooms == nullptr ||
-		       std::find(someBakedRooms->begin(), someBakedRooms->end(), aRoom.GetID()) != someBakedRooms->end();
+		return someBakedRooms == nullptr || std::find(someBakedRooms->begin(), someBakedRooms->end(),
+		                                              aRoom.GetID()) != someBakedRooms->end();
 	};
 	const int count = someRooms.Count();
 	int bakedCount = 0;

@@ -44,8 +44,9 @@ protected:
 		{
 			Place("data/models/room_small.dae", {x, 0.0f, 0.0f});
 			AddRoom(id, {x, 0.0f, 0.0f});
-			myPointLights.push_back(
-			    {.myFalloff = 2.0f, .myPosition = {x + 1.0f, 1.5f, 0.5f}, .myColor = {6.0f, 5.0f, 4.0f, 1.0f}});
+			myPointLights.push_back({.myFalloff = 2.0f,
+			                         .myPosition = {x + 1.0f, 1.5f, 0.5f},
+			                         .myColor = {6.0f, 5.0f, 4.0f, 1.0f}});
 		}
 		return !HasFatalFailure();
 	}
@@ -145,7 +146,8 @@ TEST_F(BakeControlTest, CancelsLeaveEveryFileAsItWasAndTheStatusFollowsTheBake)
 		{
 			continue;
 		}
-		EXPECT_EQ((std::array{status.myBounceCount, static_cast<int>(status.myProbesTotal)}), (std::array{2, 24}));
+		EXPECT_EQ((std::array{status.myBounceCount, static_cast<int>(status.myProbesTotal)}),
+		          (std::array{2, 24}));
 		EXPECT_GE(status.myBounce, lastBounce);
 		lastBounce = status.myBounce;
 		if (status.myProbesDone * 4 >= status.myProbesTotal && status.myProbesDone < status.myProbesTotal)
@@ -159,7 +161,8 @@ TEST_F(BakeControlTest, CancelsLeaveEveryFileAsItWasAndTheStatusFollowsTheBake)
 	EXPECT_EQ(lastBounce, 2);
 	EXPECT_GT(estimates, 0) << "the status was read while the bake ran";
 	const Zeph::BakeStatus finished = Renderer().GetBakeStatus();
-	EXPECT_EQ((std::array{finished.myPhase, Zeph::BakePhase::IDLE}), (std::array{Zeph::BakePhase::IDLE, Zeph::BakePhase::IDLE}));
+	EXPECT_EQ((std::array{finished.myPhase, Zeph::BakePhase::IDLE}),
+	          (std::array{Zeph::BakePhase::IDLE, Zeph::BakePhase::IDLE}));
 	EXPECT_EQ(finished.myLastResult, Zeph::BakeResult::FINISHED);
 	EXPECT_EQ(finished.myProbesDone, 24);
 	BakeReflections();
@@ -173,11 +176,16 @@ TEST_F(BakeControlTest, CancelsLeaveEveryFileAsItWasAndTheStatusFollowsTheBake)
 	}
 	using Condition = bool (*)(const Zeph::BakeStatus&);
 	const std::pair<const char*, Condition> cancels[] = {
-	    {"ambient, at once", [](const Zeph::BakeStatus& aStatus) { return aStatus.myPhase == Zeph::BakePhase::AMBIENT; }},
-	    {"ambient, in the first bounce", [](const Zeph::BakeStatus& aStatus) { return aStatus.myProbesDone >= 5; }},
-	    {"ambient, in the second bounce", [](const Zeph::BakeStatus& aStatus) { return aStatus.myBounce == 2; }},
-	    {"reflections, at once", [](const Zeph::BakeStatus& aStatus) { return aStatus.myPhase == Zeph::BakePhase::REFLECTIONS; }},
-	    {"reflections, at the last room", [](const Zeph::BakeStatus& aStatus) { return aStatus.myRoomsDone == 2; }},
+	    {"ambient, at once",
+	     [](const Zeph::BakeStatus& aStatus) { return aStatus.myPhase == Zeph::BakePhase::AMBIENT; }},
+	    {"ambient, in the first bounce",
+	     [](const Zeph::BakeStatus& aStatus) { return aStatus.myProbesDone >= 5; }},
+	    {"ambient, in the second bounce",
+	     [](const Zeph::BakeStatus& aStatus) { return aStatus.myBounce == 2; }},
+	    {"reflections, at once",
+	     [](const Zeph::BakeStatus& aStatus) { return aStatus.myPhase == Zeph::BakePhase::REFLECTIONS; }},
+	    {"reflections, at the last room",
+	     [](const Zeph::BakeStatus& aStatus) { return aStatus.myRoomsDone == 2; }},
 	};
 	for (const auto& [name, condition] : cancels)
 	{
@@ -267,8 +275,9 @@ TEST_F(BakeControlTest, ARoomReBakeChangesThatRoomsCellsAndCubemapOnly)
 	Renderer().GenerateSHForRooms(myRooms, east, ourAmbientPath, 1);
 	const Zeph::BakeStatus status = Renderer().GetBakeStatus();
 	EXPECT_EQ(status.myLastResult, Zeph::BakeResult::FINISHED);
-	EXPECT_THAT(status.myLastMessage, HasSubstr("is of a grid of 6 x 2 x 2, the rooms' is 6 x 2 x 4: the whole "
-	                                            "volume was baked"));
+	EXPECT_THAT(status.myLastMessage,
+	            HasSubstr("is of a grid of 6 x 2 x 2, the rooms' is 6 x 2 x 4: the whole "
+	                      "volume was baked"));
 	EXPECT_EQ(ReadVolume(ourAmbientPath).myCounts[2], 4);
 }
 
@@ -282,7 +291,7 @@ TEST_F(BakeControlTest, UnevenPartsMergedBounceByBounceGiveTheWholeBakeByteForBy
 	Zeph::AmbientPart expected;
 	std::string previousPath;
 	const std::vector<std::pair<long long, long long>> ranges[] = {{{0, 5}, {5, 11}, {16, 8}},
-	                                                                {{12, 12}, {0, 11}, {11, 1}}};
+	                                                               {{12, 12}, {0, 11}, {11, 1}}};
 	for (int bounce = 1; bounce <= 2; ++bounce)
 	{
 		Zeph::AmbientVolume previous;
@@ -295,10 +304,12 @@ TEST_F(BakeControlTest, UnevenPartsMergedBounceByBounceGiveTheWholeBakeByteForBy
 		{
 			Zeph::AmbientPart part;
 			Queue();
-			ASSERT_TRUE(Renderer().GenerateSHPart(myRooms, bounce, bounce > 1 ? &previous : nullptr, first, count, part));
+			ASSERT_TRUE(Renderer().GenerateSHPart(myRooms, bounce, bounce > 1 ? &previous : nullptr, first,
+			                                      count, part));
 			part.myInputsHash = "inputs";
 			part.myPreviousHash = bounce > 1 ? "bounce 1" : "";
-			parts.push_back(myScratch.File("b" + std::to_string(bounce) + "-" + std::to_string(first) + ".part"));
+			parts.push_back(
+			    myScratch.File("b" + std::to_string(bounce) + "-" + std::to_string(first) + ".part"));
 			std::string problem;
 			ASSERT_TRUE(Zeph::WriteAmbientPart(parts.back(), part, problem)) << problem;
 			expected = part;
@@ -309,13 +320,15 @@ TEST_F(BakeControlTest, UnevenPartsMergedBounceByBounceGiveTheWholeBakeByteForBy
 		previousPath = myScratch.File("bounce" + std::to_string(bounce) + ".sh");
 		ASSERT_TRUE(Zeph::WriteAmbientVolume(previousPath, merged, problem)) << problem;
 	}
-	EXPECT_TRUE(TestSupport::ReadWholeFile(previousPath) == whole) << "the merged volume differs from the whole bake";
+	EXPECT_TRUE(TestSupport::ReadWholeFile(previousPath) == whole)
+	    << "the merged volume differs from the whole bake";
 
 	// A range outside the grid and a second bounce without the first are refused.
 	Zeph::AmbientPart part;
 	Queue();
 	EXPECT_FALSE(Renderer().GenerateSHPart(myRooms, 1, nullptr, 20, 5, part));
-	EXPECT_THAT(Renderer().GetBakeStatus().myLastMessage, HasSubstr("cells 20 to 24 are not all in the grid of 6 x 2 x 2"));
+	EXPECT_THAT(Renderer().GetBakeStatus().myLastMessage,
+	            HasSubstr("cells 20 to 24 are not all in the grid of 6 x 2 x 2"));
 	EXPECT_FALSE(Renderer().GenerateSHPart(myRooms, 2, nullptr, 0, 5, part));
 	EXPECT_THAT(TakeLog(), HasSubstr("bounce 2 needs the volume of bounce 1"));
 }
@@ -382,10 +395,19 @@ TEST(AmbientPartFileTest, MergesCoverTheGridOnceFromOnePreviousVolumeAndRefuseTh
 	    {"a gap", {head, tail}, grid, "no part holds cells 3 to 6"},
 	    {"the end missing", {head, middle}, grid, "no part holds cells 7 to 11"},
 	    {"an overlap", {head, middle, write("overlap", 6, 6), tail}, grid, "overlaps"},
-	    {"another grid", {head, middle, write("grid", 7, 5, [](Zeph::AmbientPart& aPart) { aPart.myCounts[2] = 4; })}, grid, "is a part of another grid (4 x 1 x 4; the level's is 4 x 1 x 3)"},
+	    {"another grid",
+	     {head, middle, write("grid", 7, 5, [](Zeph::AmbientPart& aPart) { aPart.myCounts[2] = 4; })},
+	     grid,
+	     "is a part of another grid (4 x 1 x 4; the level's is 4 x 1 x 3)"},
 	    {"other inputs", {head, middle, tail}, otherInputs, "was baked from other inputs"},
-	    {"another bounce", {head, middle, write("bounce", 7, 5, [](Zeph::AmbientPart& aPart) { aPart.myBounce = 2; })}, grid, "is bounce 2"},
-	    {"another previous volume", {head, middle, write("lit", 7, 5, [](Zeph::AmbientPart& aPart) { aPart.myPreviousHash = "x"; })}, grid, "lit by another previous volume"},
+	    {"another bounce",
+	     {head, middle, write("bounce", 7, 5, [](Zeph::AmbientPart& aPart) { aPart.myBounce = 2; })},
+	     grid,
+	     "is bounce 2"},
+	    {"another previous volume",
+	     {head, middle, write("lit", 7, 5, [](Zeph::AmbientPart& aPart) { aPart.myPreviousHash = "x"; })},
+	     grid,
+	     "lit by another previous volume"},
 	    {"a cut file", {head, scratch.File("cut"), tail}, grid, "holds 240 bytes; its 4 cells need 244"},
 	    {"not a part", {head, scratch.File("cut") + "-missing", tail}, grid, "cannot be opened"},
 	};

@@ -184,7 +184,6 @@ protected:
 		EXPECT_TRUE(loaded) << error;
 		return loaded;
 	}
-
 };
 } // namespace
 

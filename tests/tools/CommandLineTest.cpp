@@ -45,6 +45,16 @@ protected:
 		return {WIFEXITED(status) ? WEXITSTATUS(status) : -1, Read("stdout.txt"), Read("stderr.txt")};
 	}
 
+	// Runs a shell script (no single quotes in it) in the scratch folder, the tool named by
+	// $LUMORA; returns its exit status.
+	int Shell(const std::string& aScript)
+	{
+		const std::string command = "cd '" + myScratch.Path().string() + "' && LUMORA='" +
+		                            std::string(LUMORA_CLI_PATH) + "' sh -c '" + aScript + "'";
+		const int status = std::system(command.c_str());
+		return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+	}
+
 	std::string Read(const std::string& aFile) const
 	{
 		return TestSupport::ReadWholeFile(myScratch.File(aFile));
@@ -271,4 +281,70 @@ TEST_F(CommandLineTest, BadInputGetsAClearLineAndAFailingExitTheSmallLevelBakesA
 	Edit("data/XML/EntityTypes.xml", "</entities>", "</entitys>");
 	EXPECT_THAT(Run("check sample_small").myOutput,
 	            HasSubstr("data/XML/EntityTypes.xml: no entity type with a model"));
+}
+
+// The bakes a designer stops, narrows and spreads: Ctrl-C (SIGINT) during a long ambient bake
+// ends it with exit 130 and one line, every file as it was; a room re-bake bakes that room and
+// an unknown room is refused before anything is baked; a two-bounce bake split into three
+// uneven parts per bounce, each its own process, merges into the whole bake's file byte for
+// byte, and parts of another bounce or of other inputs are refused.
+TEST_F(CommandLineTest, ACancelledBakeKeepsItsFilesRoomsBakeAloneAndPartsMergeIntoTheWholeBake)
+{
+	CopyData();
+	const ToolRun whole = Run("bake sample_small --bounces 2 --ambient-only");
+	// No OpenGL 4.5 is no failure outside CI.
+	if (whole.myErrors.find("no OpenGL 4.5") != std::string::npos && !TestSupport::IsCi())
+	{
+		GTEST_SKIP() << whole.myErrors;
+	}
+	ASSERT_EQ(whole.myStatus, 0) << whole.myErrors;
+	const std::string ambient = "data/XML/levels/sample_small/ambient.sh";
+	const std::string baked = Read(ambient);
+
+	// Interrupted once its progress shows; a second signal would end it the usual way.
+	const int cancelled =
+	    Shell("$LUMORA bake sample_small --bounces 16 --ambient-only >bake.out 2>bake.err & "
+	          "pid=$!; until grep -q probes bake.out || ! kill -0 $pid 2>/dev/null; do "
+	          "sleep 0.02; done; kill -INT $pid; wait $pid");
+	EXPECT_EQ(cancelled, 130) << Read("bake.out");
+	EXPECT_EQ(Read("bake.err"), "lumora: bake cancelled (SIGINT): ambient.sh is as it was\n");
+	EXPECT_TRUE(Read(ambient) == baked) << "the cancelled bake changed ambient.sh";
+	EXPECT_EQ(std::distance(fs::directory_iterator(myScratch.File("data/XML/levels/sample_small")),
+	                        fs::directory_iterator()),
+	          7)
+	    << "five level files, ambient.sh and bake.json: no temporary";
+
+	const char* ranges[2][3] = {{"0:5", "5:11", "16:8"}, {"12:12", "0:11", "11:1"}};
+	for (int bounce = 1; bounce <= 2; ++bounce)
+	{
+		std::string parts;
+		for (const char* range : ranges[bounce - 1])
+		{
+			const std::string part =
+			    "b" + std::to_string(bounce) + "-" + std::string(range).substr(0, 2) + ".part";
+			const ToolRun run = Run("bake sample_small --bounce " + std::to_string(bounce) + " --probes " +
+			                        range + " --out " + part + (bounce > 1 ? " --previous bounce1.sh" : ""));
+			ExpectRun(run, 0, run.myOutput, {"ambient part: bounce " + std::to_string(bounce)});
+			parts += " " + part;
+		}
+		const ToolRun merged =
+		    Run("bake-merge sample_small" + parts + " --out bounce" + std::to_string(bounce) + ".sh");
+		ExpectRun(merged, 0, merged.myOutput, {"merged 3 parts into bounce"});
+	}
+	EXPECT_TRUE(Read("bounce2.sh") == baked) << "the merged parts differ from the whole bake";
+	ExpectOneErrorLine(Run("bake-merge sample_small b1-0:.part b2-12.part b2-11.part --out x.sh"), 1,
+	                   "lumora: not merged: b2-12.part is bounce 2; b1-0:.part is bounce 1");
+	ExpectOneErrorLine(Run("bake sample_small --bounce 2 --probes 0:5 --out x.part"), 2,
+	                   "lumora: --bounce 2 needs --previous");
+
+	// The only room, re-baked: its probes as the whole bake had them, then its cubemap.
+	ExpectOneErrorLine(Run("bake sample_small --rooms main,nope"), 2,
+	                   "lumora: level 'sample_small' has no room with the ID 'nope'");
+	const ToolRun room = Run("bake sample_small --rooms main --bounces 2");
+	ExpectRun(room, 0, room.myOutput,
+	          {"reflections: 1 room in", "ambient: data/XML/levels/sample_small/ambient.sh"});
+	EXPECT_TRUE(Read(ambient) == baked) << "the only room re-baked is not the whole bake";
+	// The ambient pass reflects the new cubemap: parts baked before it are not merged.
+	ExpectOneErrorLine(Run("bake-merge sample_small b2-12.part b2-0:.part b2-11.part --out x.sh"), 1,
+	                   "lumora: not merged: b2-12.part was baked from other inputs");
 }

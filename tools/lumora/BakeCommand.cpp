@@ -105,8 +105,8 @@ ProgressBar::Progress PollBake(const Lumora::LumoraWrapper& anEditor)
 	char text[160] = "";
 	if (status.myPhase == Zeph::BakePhase::AMBIENT)
 	{
-		std::snprintf(text, sizeof(text), "bounce %d/%d, %lld/%lld probes", status.myBounce, status.myBounceCount,
-		              status.myProbesDone, status.myProbesTotal);
+		std::snprintf(text, sizeof(text), "bounce %d/%d, %lld/%lld probes", status.myBounce,
+		              status.myBounceCount, status.myProbesDone, status.myProbesTotal);
 	}
 	else if (status.myPhase == Zeph::BakePhase::REFLECTIONS)
 	{
@@ -115,8 +115,9 @@ ProgressBar::Progress PollBake(const Lumora::LumoraWrapper& anEditor)
 	progress.myDetail = text;
 	if (status.myPhase != Zeph::BakePhase::IDLE)
 	{
-		progress.myDetail += status.mySecondsLeft >= 0.0 ? ", " + Duration(status.mySecondsLeft) + " left"
-		                                                 : ", " + Duration(status.myElapsedSeconds) + " so far";
+		progress.myDetail += status.mySecondsLeft >= 0.0
+		                         ? ", " + Duration(status.mySecondsLeft) + " left"
+		                         : ", " + Duration(status.myElapsedSeconds) + " so far";
 	}
 	return progress;
 }
@@ -222,8 +223,8 @@ bool BakeReflections(EditorSession& aSession, const BakeOptions& someOptions)
 	for (int index = 0; index < rooms.Count(); ++index)
 	{
 		const std::string& id = rooms[index]->GetID();
-		if (!someOptions.myRooms.empty() &&
-		    std::find(someOptions.myRooms.begin(), someOptions.myRooms.end(), id) == someOptions.myRooms.end())
+		if (!someOptions.myRooms.empty() && std::find(someOptions.myRooms.begin(), someOptions.myRooms.end(),
+		                                              id) == someOptions.myRooms.end())
 		{
 			continue;
 		}
@@ -271,8 +272,9 @@ bool BakePart(EditorSession& aSession, const BakeOptions& someOptions)
 	}
 	std::printf("ambient part: bounce %d, cells %lld to %lld (%lld probes) into %s (%s) in %.1f s\n",
 	            someOptions.myPartBounce, someOptions.myFirst, someOptions.myFirst + someOptions.myCount - 1,
-	            Zeph::Engine::GetInstance()->GetRenderer().GetBakedProbeCount(), someOptions.myPartOutput.c_str(),
-	            SizeOf(someOptions.myPartOutput).c_str(), SecondsSince(start));
+	            Zeph::Engine::GetInstance()->GetRenderer().GetBakedProbeCount(),
+	            someOptions.myPartOutput.c_str(), SizeOf(someOptions.myPartOutput).c_str(),
+	            SecondsSince(start));
 	return true;
 }
 

@@ -244,7 +244,8 @@ void CheckSavedSections(const std::string& aLevel, LevelReport& aReport)
 		XML xml(path);
 		if (xml.HasRootElement() && !xml.GoToElement(section.myName, "", ""))
 		{
-			aReport.myProblems.push_back(path + ": no \"" + section.myName + "\" element under the root, so the " +
+			aReport.myProblems.push_back(path + ": no \"" + section.myName +
+			                             "\" element under the root, so the " +
 			                             "editor cannot save the level's " + section.myWhat + " into it");
 		}
 	}

@@ -5,9 +5,9 @@
 // per tenth otherwise (logs, pipes). The value found at the start is drawn only once it
 // has moved: it may be the last job's.
 //
-//   LumoraTool::ProgressBar bar("ambient", [&] { return ProgressBar::Progress{editor.GetBakeProgress(), ""}; });
-//   editor.BakeAmbient(level, 2, false);   // blocks; the bar moves meanwhile
-//   bar.Stop();                            // last value drawn, line ended
+//   LumoraTool::ProgressBar bar("ambient", [&] { return ProgressBar::Progress{editor.GetBakeProgress(), ""};
+//   }); editor.BakeAmbient(level, 2, false);   // blocks; the bar moves meanwhile bar.Stop(); // last value
+//   drawn, line ended
 #include <atomic>
 #include <functional>
 #include <string>

@@ -171,18 +171,20 @@ int main(int argc, char** argv)
 			if (std::sscanf(probes.c_str(), "%lld:%lld%c", &bake.myFirst, &bake.myCount, &rest) != 2 ||
 			    bake.myFirst < 0 || bake.myCount < 1)
 			{
-				LumoraTool::PrintError("--probes takes FIRST:COUNT, a first cell from 0 and a count from 1 (as "
-				                       "0:5000), not '" +
-				                       probes + "'");
+				LumoraTool::PrintError(
+				    "--probes takes FIRST:COUNT, a first cell from 0 and a count from 1 (as "
+				    "0:5000), not '" +
+				    probes + "'");
 				return 2;
 			}
 			if ((bake.myPartBounce > 1) != !bake.myPrevious.empty())
 			{
-				LumoraTool::PrintError(bake.myPartBounce > 1
-				                           ? "--bounce " + std::to_string(bake.myPartBounce) +
-				                                 " needs --previous, the merged volume of bounce " +
-				                                 std::to_string(bake.myPartBounce - 1)
-				                           : std::string("--bounce 1 is lit by direct light only: it takes no --previous"));
+				LumoraTool::PrintError(
+				    bake.myPartBounce > 1
+				        ? "--bounce " + std::to_string(bake.myPartBounce) +
+				              " needs --previous, the merged volume of bounce " +
+				              std::to_string(bake.myPartBounce - 1)
+				        : std::string("--bounce 1 is lit by direct light only: it takes no --previous"));
 				return 2;
 			}
 			bake.myAmbientOnlyFlag = true;

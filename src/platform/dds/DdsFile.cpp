@@ -508,7 +508,8 @@ bool SaveToTemporary(const std::string& aFileName, const Image& anImage, std::st
 	std::error_code error;
 	if (std::filesystem::exists(target, error) && !std::filesystem::is_regular_file(target, error))
 	{
-		anErrorOut = "Dds::SaveToFile: " + aFileName + ": cannot replace the file: something else has its name";
+		anErrorOut =
+		    "Dds::SaveToFile: " + aFileName + ": cannot replace the file: something else has its name";
 		return false;
 	}
 	const std::string temporary = Paths::TemporaryFor(target);
@@ -531,7 +532,8 @@ bool SaveToTemporary(const std::string& aFileName, const Image& anImage, std::st
 	return true;
 }
 
-bool ReplaceWithTemporary(const std::string& aTemporary, const std::string& aFileName, std::string& anErrorOut)
+bool ReplaceWithTemporary(const std::string& aTemporary, const std::string& aFileName,
+                          std::string& anErrorOut)
 {
 	if (!Paths::ReplaceWith(aTemporary, Paths::Resolve(aFileName)))
 	{

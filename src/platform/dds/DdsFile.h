@@ -39,7 +39,8 @@ bool SaveToFile(const std::string& aFileName, const Image& anImage, std::string&
 // it. A temporary that is not used is the caller's to remove.
 bool SaveToTemporary(const std::string& aFileName, const Image& anImage, std::string& aTemporaryOut,
                      std::string& anErrorOut);
-bool ReplaceWithTemporary(const std::string& aTemporary, const std::string& aFileName, std::string& anErrorOut);
+bool ReplaceWithTemporary(const std::string& aTemporary, const std::string& aFileName,
+                          std::string& anErrorOut);
 // The bytes SaveToFile() writes.
 bool SaveToMemory(const Image& anImage, std::vector<uint8_t>& someBytesOut, std::string& anErrorOut);
 } // namespace Dds

@@ -82,7 +82,8 @@ TEST_F(DeviceTest, BuffersStartZeroAndOnlyDynamicOnesChange)
 	Gpu::Buffer& fixed = myBuffers.emplace_back();
 	ASSERT_TRUE(fixed.Init(GetContext(), {.mySize = sizeof(initial), .myLabel = "fixed"}, initial));
 	Gpu::Buffer& dynamic = myBuffers.emplace_back();
-	ASSERT_TRUE(dynamic.Init(GetContext(),
+	ASSERT_TRUE(dynamic.Init(
+	    GetContext(),
 	    {.myKind = Gpu::BufferKind::Constant, .mySize = 16, .myDynamicFlag = true, .myLabel = "dynamic"},
 	    nullptr));
 	const uint32_t update[2] = {7, 8};

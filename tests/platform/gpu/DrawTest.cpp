@@ -79,14 +79,14 @@ TEST_F(DrawTest, BadInputIsReportedNotDrawn)
 	                                          {"TEXCOORD", 0, Dds::Format::R32G32_FLOAT, 0, 12}};
 	EXPECT_FALSE(layout.Init(GetContext(), sameLocation, locations, "same location"));
 	Gpu::Buffer& indices = myBuffers.emplace_back();
-	ASSERT_TRUE(
-	    indices.Init(GetContext(), {.myKind = Gpu::BufferKind::Index, .mySize = 12, .myLabel = "six indices"}, nullptr));
+	ASSERT_TRUE(indices.Init(
+	    GetContext(), {.myKind = Gpu::BufferKind::Index, .mySize = 12, .myLabel = "six indices"}, nullptr));
 	ASSERT_TRUE(GetContext().SetIndexBuffer(&indices, Gpu::IndexFormat::UInt16, 0));
 	EXPECT_FALSE(GetContext().DrawIndexed(4, 3, 0)); // indices 3..6 of 6
 	indices.Destroy();
 	Gpu::Buffer& successor = myBuffers.emplace_back();
-	ASSERT_TRUE(successor.Init(GetContext(), {.myKind = Gpu::BufferKind::Index, .mySize = 12, .myLabel = "next"},
-	                           nullptr));
+	ASSERT_TRUE(successor.Init(GetContext(),
+	                           {.myKind = Gpu::BufferKind::Index, .mySize = 12, .myLabel = "next"}, nullptr));
 	EXPECT_FALSE(GetContext().DrawIndexed(3, 0, 0));
 	Gpu::SamplerState sampler;
 	EXPECT_FALSE(sampler.Init(GetContext(), {.myMaxAnisotropy = 0.0f}, "no anisotropy"));

@@ -166,9 +166,9 @@ protected:
 	{
 		Gpu::Context& context = GetContext();
 		Gpu::Buffer& vertices = myBuffers.emplace_back();
-		ASSERT_TRUE(
-		    vertices.Init(context, {.mySize = someVertices.size() * sizeof(Vertex), .myLabel = "test vertices"},
-		                  someVertices.data()));
+		ASSERT_TRUE(vertices.Init(
+		    context, {.mySize = someVertices.size() * sizeof(Vertex), .myLabel = "test vertices"},
+		    someVertices.data()));
 		ASSERT_TRUE(context.SetVertexBuffer(0, &vertices, sizeof(Vertex), 0));
 		context.SetPrimitiveTopology(Gpu::PrimitiveTopology::TriangleList);
 		if (!aQuadsFlag)
@@ -185,7 +185,8 @@ protected:
 			}
 		}
 		Gpu::Buffer& indexBuffer = myBuffers.emplace_back();
-		ASSERT_TRUE(indexBuffer.Init(context,
+		ASSERT_TRUE(indexBuffer.Init(
+		    context,
 		    {.myKind = Gpu::BufferKind::Index, .mySize = indices.size() * 2, .myLabel = "test indices"},
 		    indices.data()));
 		ASSERT_TRUE(context.SetIndexBuffer(&indexBuffer, Gpu::IndexFormat::UInt16, 0));
