@@ -126,8 +126,8 @@ int main(int argc, char** argv)
 	checkCommand->add_option("LEVEL", checkLevel, "Level folder name under data/XML/levels/")->required();
 
 	std::string infoPath;
-	CLI::App* infoCommand =
-	    app.add_subcommand("info", "Describe an ambient.sh, a DDS texture or an .al model");
+	CLI::App* infoCommand = app.add_subcommand(
+	    "info", "Describe an ambient.sh, a DDS texture, an .al model or a bake record (bake.json)");
 	infoCommand->add_option("FILE", infoPath, "The file")->required();
 
 	std::string demoOutput;
