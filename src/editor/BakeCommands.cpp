@@ -102,6 +102,18 @@ void RecordPhase(const std::u16string& aLevel, BakePhase aPhase, const std::vect
 	}
 }
 
+// Why the renderer's last bake did not finish (aName names it), or empty when it did.
+std::string UnfinishedBake(const char* aName)
+{
+	const Zeph::BakeStatus status = Zeph::Engine::GetInstance()->GetRenderer().GetBakeStatus();
+	if (status.myLastResult == Zeph::BakeResult::FINISHED)
+	{
+		return {};
+	}
+	return std::string("the ") + aName + " bake " + Zeph::GetBakeResultName(status.myLastResult) + ": " +
+	       status.myLastMessage;
+}
+
 // One hash over every file a part of the loaded level's ambient bake reads: the bake's inputs
 // and the cubemaps its ambient pass reflects (the rooms' own, the fallback). The record leaves
 // the cubemaps out, as they are the reflection bake's outputs (a whole bake writes them after
@@ -173,12 +185,7 @@ bool LumoraWrapper::BakeAmbientRooms(const std::u16string& aLevel, int aNumOfBou
 		const bool wholeFlag = !renderer.GetBakeStatus().myLastMessage.empty();
 		RecordPhase(aLevel, BakePhase::AMBIENT, wholeFlag ? std::vector<std::string>() : someRoomIDs, myRooms,
 		            aNumOfBounces);
-		const Zeph::BakeStatus status = renderer.GetBakeStatus();
-		if (status.myLastResult != Zeph::BakeResult::FINISHED)
-		{
-			aProblemOut = "the ambient bake " + std::string(Zeph::GetBakeResultName(status.myLastResult)) +
-			              ": " + status.myLastMessage;
-		}
+		aProblemOut = UnfinishedBake("ambient");
 	}
 	Release();
 	return aProblemOut.empty();
@@ -197,12 +204,7 @@ bool LumoraWrapper::BakeSpecularRooms(const std::u16string& aLevel,
 		renderer.GenerateReflections(myRooms, SysSTringToStdString(aLevel), &someRoomIDs);
 		renderer.DiscardLateItems();
 		RecordPhase(aLevel, BakePhase::REFLECTIONS, someRoomIDs, myRooms, 0);
-		const Zeph::BakeStatus status = renderer.GetBakeStatus();
-		if (status.myLastResult != Zeph::BakeResult::FINISHED)
-		{
-			aProblemOut = "the reflection bake " + std::string(Zeph::GetBakeResultName(status.myLastResult)) +
-			              ": " + status.myLastMessage;
-		}
+		aProblemOut = UnfinishedBake("reflection");
 	}
 	Release();
 	return aProblemOut.empty();
@@ -247,9 +249,7 @@ bool LumoraWrapper::BakeAmbientPart(const std::u16string& aLevel, int aBounce,
 	Release();
 	if (!bakedFlag)
 	{
-		const Zeph::BakeStatus status = renderer.GetBakeStatus();
-		aProblemOut = "the part bake " + std::string(Zeph::GetBakeResultName(status.myLastResult)) + ": " +
-		              status.myLastMessage;
+		aProblemOut = UnfinishedBake("part");
 		return false;
 	}
 	part.myInputsHash = inputsHash;

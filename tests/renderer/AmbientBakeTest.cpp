@@ -70,15 +70,6 @@ protected:
 		return bounds;
 	}
 
-	// The volume a bake wrote; empty blocks and counts of 0 when it cannot be read.
-	static Zeph::AmbientVolume ReadVolume(const std::string& aPath)
-	{
-		Zeph::AmbientVolume volume;
-		std::string problem;
-		EXPECT_EQ(Zeph::ReadAmbientVolume(aPath, volume, problem), Zeph::AmbientVolumeRead::OK) << problem;
-		return volume;
-	}
-
 	std::vector<std::unique_ptr<Zeph::Room>> myRooms;
 	GrowingArray<Zeph::Room*> myRoomList{8, 8};
 };

@@ -76,14 +76,6 @@ protected:
 		}
 		return files;
 	}
-
-	static Zeph::AmbientVolume ReadVolume(const std::string& aPath)
-	{
-		Zeph::AmbientVolume volume;
-		std::string problem;
-		EXPECT_EQ(Zeph::ReadAmbientVolume(aPath, volume, problem), Zeph::AmbientVolumeRead::OK) << problem;
-		return volume;
-	}
 };
 
 // Polls the status from its own thread until the bake it waits for gets to aCondition,
@@ -130,12 +122,12 @@ private:
 TEST_F(BakeControlTest, CancelsLeaveEveryFileAsItWasAndTheStatusFollowsTheBake)
 {
 	LUMORA_RETURN_UNLESS(StartThreeRooms());
-	// A whole bake watched from another thread (never cancelled): both bounces seen, the
-	// counts over both, and once a quarter is done the estimate of the whole is within
-	// reach of what it took.
+	// A whole bake watched from another thread (never cancelled): every bounce seen, the
+	// counts over all, and once a quarter is done the estimate of the whole is within reach
+	// of what it took. (Eight bounces: long enough for a busy machine's poller to see them.)
 	CancellingPoller watcher([](const Zeph::BakeStatus&) { return false; });
 	const auto start = std::chrono::steady_clock::now();
-	BakeAmbient(2);
+	BakeAmbient(8);
 	const double took = std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
 	const std::vector<Zeph::BakeStatus> seen = watcher.Stop();
 	int lastBounce = 0;
@@ -147,7 +139,7 @@ TEST_F(BakeControlTest, CancelsLeaveEveryFileAsItWasAndTheStatusFollowsTheBake)
 			continue;
 		}
 		EXPECT_EQ((std::array{status.myBounceCount, static_cast<int>(status.myProbesTotal)}),
-		          (std::array{2, 24}));
+		          (std::array{8, 96}));
 		EXPECT_GE(status.myBounce, lastBounce);
 		lastBounce = status.myBounce;
 		if (status.myProbesDone * 4 >= status.myProbesTotal && status.myProbesDone < status.myProbesTotal)
@@ -158,13 +150,12 @@ TEST_F(BakeControlTest, CancelsLeaveEveryFileAsItWasAndTheStatusFollowsTheBake)
 			EXPECT_LT(whole, 2.5 * took) << status.myProbesDone << " probes done";
 		}
 	}
-	EXPECT_EQ(lastBounce, 2);
+	EXPECT_EQ(lastBounce, 8);
 	EXPECT_GT(estimates, 0) << "the status was read while the bake ran";
 	const Zeph::BakeStatus finished = Renderer().GetBakeStatus();
-	EXPECT_EQ((std::array{finished.myPhase, Zeph::BakePhase::IDLE}),
-	          (std::array{Zeph::BakePhase::IDLE, Zeph::BakePhase::IDLE}));
+	EXPECT_EQ(finished.myPhase, Zeph::BakePhase::IDLE);
 	EXPECT_EQ(finished.myLastResult, Zeph::BakeResult::FINISHED);
-	EXPECT_EQ(finished.myProbesDone, 24);
+	EXPECT_EQ(finished.myProbesDone, 96);
 	BakeReflections();
 
 	// Brighter lights: a bake that ran to its end would change every file.
@@ -194,7 +185,7 @@ TEST_F(BakeControlTest, CancelsLeaveEveryFileAsItWasAndTheStatusFollowsTheBake)
 			CancellingPoller poller(condition);
 			if (std::string(name).starts_with("ambient"))
 			{
-				BakeAmbient(2);
+				BakeAmbient(16);
 			}
 			else
 			{

@@ -18,6 +18,7 @@
 #include "engine/ViewFixture.h"
 #include "model/ModelFactory.h"
 #include "platform/gpu/Readback.h"
+#include "renderer/AmbientVolumeFile.h"
 #include "renderer/FrameCapture.h"
 #include "renderer/Renderer.h"
 #include "support/Golden.h"
@@ -45,6 +46,15 @@ protected:
 	}
 
 	static Zeph::Renderer& Renderer() { return Zeph::Engine::GetInstance()->GetRenderer(); }
+
+	// The volume a bake wrote; empty blocks and counts of 0 when it cannot be read.
+	static Zeph::AmbientVolume ReadVolume(const std::string& aPath)
+	{
+		Zeph::AmbientVolume volume;
+		std::string problem;
+		EXPECT_EQ(Zeph::ReadAmbientVolume(aPath, volume, problem), Zeph::AmbientVolumeRead::OK) << problem;
+		return volume;
+	}
 
 	void Place(const char* aModel, const Vector3<float>& aPosition)
 	{
