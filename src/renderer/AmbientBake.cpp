@@ -340,6 +340,8 @@ Renderer::SHBakeRun Renderer::RunSHBake(const SHBakeJob& aJob, std::vector<uint3
 	}
 	myCollector.Reset();
 	gbuffer.Destroy();
+	// A cancel that came during the last read-back still wins: nothing is written yet.
+	cancelledFlag = cancelledFlag || myBakeMonitor.IsCancelRequested();
 	return cancelledFlag ? SHBakeRun::CANCELLED : SHBakeRun::DONE;
 }
 

@@ -183,6 +183,9 @@ void Renderer::GenerateReflections(const GrowingArray<Room*>& someRooms, const s
 		myBakingProgress = BakeProgress(++done, bakedCount);
 		myBakeMonitor.AddRoom();
 	}
+	// A cancel that came while the last room was filtered or saved still wins: nothing is
+	// replaced yet.
+	cancelledFlag = cancelledFlag || myBakeMonitor.IsCancelRequested();
 	for (const auto& [temporary, target] : staged)
 	{
 		if (cancelledFlag)

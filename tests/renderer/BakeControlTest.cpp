@@ -175,8 +175,8 @@ TEST_F(BakeControlTest, CancelsLeaveEveryFileAsItWasAndTheStatusFollowsTheBake)
 	     [](const Zeph::BakeStatus& aStatus) { return aStatus.myBounce == 2; }},
 	    {"reflections, at once",
 	     [](const Zeph::BakeStatus& aStatus) { return aStatus.myPhase == Zeph::BakePhase::REFLECTIONS; }},
-	    {"reflections, at the last room",
-	     [](const Zeph::BakeStatus& aStatus) { return aStatus.myRoomsDone == 2; }},
+	    {"reflections, at the second room",
+	     [](const Zeph::BakeStatus& aStatus) { return aStatus.myRoomsDone == 1; }},
 	};
 	for (const auto& [name, condition] : cancels)
 	{

@@ -2,7 +2,8 @@
 // The fixture of the bake tests: a headless engine (FrameTest) with the editor's own fatal
 // levels, run in a scratch folder whose data/ links the repository's folders except Cubemaps,
 // which holds copies of the two cube maps the renderer reads (a bake writes
-// "data/Cubemaps/<level>/"), and rooms of room_small's size owned by the test.
+// "data/Cubemaps/<level>/"), and XML, which links the catalogues and holds empty levels/
+// (a bake writes "data/XML/levels/<level>/"), and rooms of room_small's size owned by the test.
 #include <filesystem>
 #include <memory>
 #include <string>
@@ -28,10 +29,17 @@ protected:
 		fs::create_directories(data / "Cubemaps");
 		for (const fs::directory_entry& entry : fs::directory_iterator(source))
 		{
-			if (entry.path().filename() != "Cubemaps")
+			if (entry.path().filename() != "Cubemaps" && entry.path().filename() != "XML")
 			{
 				fs::create_directory_symlink(entry.path(), data / entry.path().filename());
 			}
+		}
+		// The catalogues are read, the levels' folders written: tests running at once each
+		// bake into a folder of their own, never into the repository's.
+		fs::create_directories(data / "XML" / "levels");
+		for (const char* catalogue : {"EntityTypes.xml", "DecalTypes.xml"})
+		{
+			fs::create_symlink(source / "XML" / catalogue, data / "XML" / catalogue);
 		}
 		for (const char* file : {"cubemap.dds", "normaltest.dds"})
 		{
