@@ -92,38 +92,52 @@ Vector3<float> LumoraWrapper::InFrontOfCamera(float aDistance) const
 
 void LumoraWrapper::MoveSelectedByMode(const Vector3<float>& anOffset, bool aNodesFlag)
 {
+	PlaceSelected([&anOffset](const Vector3<float>& aPosition) { return aPosition + anOffset; }, aNodesFlag);
+}
+
+bool LumoraWrapper::PlaceSelected(const std::function<Vector3<float>(const Vector3<float>&)>& aPlace,
+                                  bool aNodesFlag)
+{
 	WaitUntilFree();
 	if (!HasSelectionForMode(aNodesFlag))
 	{
-		return;
+		return false;
 	}
 	Claim();
+	// The selection may have gone while the claim waited.
+	if (!HasSelectionForMode(aNodesFlag))
+	{
+		Release();
+		return false;
+	}
 	switch (myMode)
 	{
 	case LIGHT_MODE:
 		if (myCurrentSelectedPoint != -1)
 		{
-			myEnvironmentPointLights[myCurrentSelectedPoint].myPosition += anOffset;
+			Vector3<float>& position = myEnvironmentPointLights[myCurrentSelectedPoint].myPosition;
+			position = aPlace(position);
 		}
 		if (myCurrentSelectedSpot != -1)
 		{
 			Matrix44<float>& orientation = myEnvironmentSpotLights[myCurrentSelectedSpot].myOrientation;
-			orientation.SetPosition(orientation.GetPosition() + anOffset);
+			orientation.SetPosition(aPlace(orientation.GetPosition()));
 		}
 		break;
 	case NODE_MODE: {
 		// The edges follow when they are next drawn, which brings their distance up to date.
 		AI::NGNode& node = myNodes[myCurrentSelectedNode];
-		node.SetPosition(node.GetPosition() + anOffset);
+		node.SetPosition(aPlace(node.GetPosition()));
 		break;
 	}
 	case DECAL_MODE:
-		myDecals[myCurrentSelectedDecal].myPosition += anOffset;
+		myDecals[myCurrentSelectedDecal].myPosition = aPlace(myDecals[myCurrentSelectedDecal].myPosition);
 		break;
 	default:
 		break;
 	}
 	Release();
+	return true;
 }
 
 void LumoraWrapper::MoveSelectedAlongCamera(int anAxisRow, float aMovement)

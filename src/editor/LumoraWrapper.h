@@ -91,6 +91,23 @@ public:
 
 	// Picking and selection.
 	void DoIntersection(float aMouseX, float aMouseY);
+	// Selection by kind and index, as an outliner selects: the kind's mode becomes the
+	// editor's mode and the object its only selection (-1 selects nothing). False, with mode
+	// and selection as they were, when the index names no object of that kind.
+	enum class ObjectKind
+	{
+		POINT_LIGHT,
+		SPOT_LIGHT,
+		DECAL,
+		PATH_NODE,
+	};
+	bool Select(ObjectKind aKind, int anIndex);
+	// The selected object of the editor's mode put at a position, or pointed along a
+	// direction (a spot light, keeping its position; a decal, keeping its direction's
+	// length). False when nothing is selected that can take it, or the direction is zero
+	// or not finite.
+	bool SetSelectedPosition(const Vector3<float>& aPosition);
+	bool SetSelectedDirection(const Vector3<float>& aDirection);
 	bool TryGetCurrentPointLight(PointLightStruct& aPointLightRef) const;
 	bool TryGetCurrentSpotLight(SpotLightStruct& aSpotLightRef) const;
 	bool TryGetCurrentDecal(DecalStruct& aDecalRef) const;
@@ -250,6 +267,9 @@ private:
 	// Waits, then adds the offset (given in world space, or as aMovement along the
 	// camera's row anAxisRow: 0 right, 1 up, 2 forward) to the mode's selection.
 	void MoveSelectedByMode(const Vector3<float>& anOffset, bool aNodesFlag);
+	// The selected object's position replaced by what aPlace makes of it; false when
+	// nothing of the mode is selected (path nodes only with aNodesFlag).
+	bool PlaceSelected(const std::function<Vector3<float>(const Vector3<float>&)>& aPlace, bool aNodesFlag);
 	void MoveSelectedAlongCamera(int anAxisRow, float aMovement);
 	// Waits, then turns the selected spot light (LIGHT_MODE) or decal (DECAL_MODE).
 	void TurnSelected(const Matrix33<float>& aRotation);

@@ -275,6 +275,60 @@ TEST_F(EditingTest, TurningASpotLightTurnsItAboutItsOwnAxes)
 }
 
 // Nodes laid out across the view (so each can be clicked) and joined in a chain.
+// What an outliner and a properties panel do: select by kind and index (the mode follows),
+// put the selection at a position, point a spot light along a direction.
+TEST_F(EditingTest, SelectingByKindAndIndexAndPlacingTheSelection)
+{
+	Facade().AddPointLight();
+	Facade().AddPointLight();
+	Facade().AddSpotLight();
+	Facade().AddSpotLight();
+	Facade().AddPathNode();
+	ASSERT_TRUE(Facade().Select(LumoraWrapper::ObjectKind::SPOT_LIGHT, 0));
+	EXPECT_EQ(Selection(), (std::array{-1, 0, -1, -1}));
+	EXPECT_FALSE(Facade().Select(LumoraWrapper::ObjectKind::POINT_LIGHT, 2));
+	EXPECT_FALSE(Facade().Select(LumoraWrapper::ObjectKind::DECAL, 0));
+	EXPECT_EQ(Selection(), (std::array{-1, 0, -1, -1})) << "a refused selection changes nothing";
+
+	ASSERT_TRUE(Facade().Select(LumoraWrapper::ObjectKind::PATH_NODE, 0));
+	EXPECT_EQ(std::tuple(Facade().GetMode(), Selection()), std::tuple(NODE_MODE, std::array{-1, -1, 0, -1}));
+	EXPECT_TRUE(Facade().SetSelectedPosition({1.0f, 2.0f, 3.0f}));
+	ExpectNear(Facade().GetNodes()[0].GetPosition(), {1.0f, 2.0f, 3.0f}, 0.0f);
+	EXPECT_FALSE(Facade().SetSelectedDirection({1.0f, 0.0f, 0.0f})) << "a node has no direction";
+
+	ASSERT_TRUE(Facade().Select(LumoraWrapper::ObjectKind::POINT_LIGHT, 1));
+	EXPECT_EQ(Facade().GetMode(), LIGHT_MODE);
+	EXPECT_TRUE(Facade().SetSelectedPosition({-4.0f, 0.5f, 6.0f}));
+	ExpectNear(Facade().GetPointLights()[1].myPosition, {-4.0f, 0.5f, 6.0f}, 0.0f);
+	ExpectNear(Facade().GetPointLights()[0].myPosition, {0.0f, 10.0f, 10.0f}, 0.0f);
+	EXPECT_FALSE(Facade().SetSelectedPosition({std::nanf(""), 0.0f, 0.0f}));
+
+	// Pointed straight up, a spot light has a new light's rows; aslant, unit rows with
+	// forward = right x up; its position stays.
+	ASSERT_TRUE(Facade().Select(LumoraWrapper::ObjectKind::SPOT_LIGHT, 1));
+	const Matrix44<float>& orientation = Facade().GetSpotLights()[1].myOrientation;
+	Facade().MoveSelectedVector(1.0f, 0.0f, 0.0f);
+	for (const Vector3<float>& direction :
+	     {Vector3<float>(0.0f, 3.0f, 0.0f), Vector3<float>(2.0f, -2.0f, 1.0f)})
+	{
+		ASSERT_TRUE(Facade().SetSelectedDirection(direction));
+		const Vector3<float> forward = direction * (1.0f / direction.Length());
+		ExpectNear(orientation.GetForward(), forward);
+		ExpectNear(orientation.GetRight().Cross(orientation.GetUp()), forward);
+		EXPECT_NEAR(orientation.GetRight().Length() * orientation.GetUp().Length(), 1.0f, 1e-5f);
+		ExpectNear(orientation.GetPosition(), {1.0f, 10.0f, 10.0f}, 0.0f);
+		if (direction.y == 3.0f)
+		{
+			ExpectNearAll(Values(Facade().GetSpotLights()[1]),
+			              {1, 0.9f, 0.7f, 1, 1, 1, 1, -1, 0, 0, 0, 0, 0, 1, 0, 0, 1, 0, 0, 1, 10, 10, 1});
+		}
+	}
+	EXPECT_FALSE(Facade().SetSelectedDirection({0.0f, 0.0f, 0.0f}));
+	ASSERT_TRUE(Facade().Select(LumoraWrapper::ObjectKind::SPOT_LIGHT, -1));
+	EXPECT_EQ(Selection(), (std::array{-1, -1, -1, -1}));
+	EXPECT_FALSE(Facade().SetSelectedPosition({0.0f, 0.0f, 0.0f})) << "nothing is selected";
+}
+
 class PathGraphTest : public FacadeTest
 {
 protected:
