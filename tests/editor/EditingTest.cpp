@@ -529,6 +529,13 @@ TEST_F(DecalEditingTest, AddCopyTurnAndRetypeDecals)
 	          std::tuple(turned.myPosition.z, turned.myNorm.x, turned.myNorm.y, turned.myColor.x,
 	                     turned.mySize, turned.myDepth, turned.myTypeId, turned.myTexture));
 	EXPECT_EQ(Facade().GetSelectedDecal(), -1);
+
+	// Selected by index and pointed along a direction (kept at the decal's own length, 1 here).
+	ASSERT_TRUE(Facade().Select(LumoraWrapper::ObjectKind::DECAL, 0));
+	EXPECT_EQ(Facade().GetMode(), DECAL_MODE);
+	const float length = Facade().GetDecals()[0].myNorm.Length();
+	ASSERT_TRUE(Facade().SetSelectedDirection({0.0f, -3.0f, 4.0f}));
+	ExpectNear(Facade().GetDecals()[0].myNorm, Vector3<float>(0.0f, -0.6f, 0.8f) * length);
 }
 
 // A catalogue without "brick": adding a decal is refused.
