@@ -38,6 +38,13 @@ TEST(XMLNestingScan, CountsOnlyWhatTinyXmlEntersAndNamesTheLine)
 	    // Quoted values may hold '>' and "/>"; an unquoted "/" followed by '>' closes the tag.
 	    {"<a x='>'><b y=\"/>\"><c>", 1},
 	    {"<a><b z=1/><b/></a>", 0},
+	    // The declaration's version, encoding and standalone values are quoted as in a tag.
+	    {"<?xml version=\"x>y\" encoding='<a><b><c>' ?><a><b></b></a>", 0},
+	    {"<?XML standalone=\"'\" x'y><a>\n<b><c>", 2},
+	    // Text, comments and quoted values go a UTF-8 character at a time: the '<' or quote
+	    // after a lead byte is part of its character.
+	    {"<a>\xe6<b><c>", 0},
+	    {"<a x='\xc3'><b><c>", 0},
 	    // '<' before anything but a letter, '_' or a UTF-8 byte opens no element.
 	    {"<a><b>< c><1><_><\xc3\xa9>", 1},
 	    {std::string("<a><b>\0<c><d>", 12), 0},

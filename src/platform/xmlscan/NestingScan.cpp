@@ -1,5 +1,6 @@
 #include "platform/xmlscan/NestingScan.h"
 
+#include <cctype>
 #include <cstring>
 
 namespace XmlScan
@@ -18,12 +19,12 @@ public:
 		{
 			if (myText[myAt] != '<')
 			{
-				Step();
+				StepCharacter();
 				continue;
 			}
 			if (StartsWith("<!--"))
 			{
-				SkipPast("-->");
+				SkipPast("-->", true);
 			}
 			else if (StartsWith("<![CDATA["))
 			{
@@ -36,6 +37,10 @@ public:
 				// passes over it as unknown markup: it closes nothing there.
 				depth = depth > 0 ? depth - 1 : 0;
 				SkipPast(">");
+			}
+			else if (StartsWithCaseless("<?xml"))
+			{
+				SkipDeclaration();
 			}
 			else if (OpensElement())
 			{
@@ -50,8 +55,8 @@ public:
 			}
 			else
 			{
-				// Declarations, "<!DOCTYPE", processing instructions and anything else TinyXML does
-				// not take for an element: it reads them up to the first '>'.
+				// "<!DOCTYPE", processing instructions and anything else TinyXML does not take for
+				// an element or a declaration: it reads them up to the first '>'.
 				SkipPast(">");
 			}
 		}
@@ -62,6 +67,103 @@ private:
 	bool StartsWith(const char* aPrefix) const
 	{
 		return myText.compare(myAt, std::strlen(aPrefix), aPrefix) == 0;
+	}
+
+	bool StartsWithCaseless(const char* aPrefix) const
+	{
+		const size_t length = std::strlen(aPrefix);
+		if (myText.size() - myAt < length)
+		{
+			return false;
+		}
+		for (size_t index = 0; index < length; ++index)
+		{
+			if (std::tolower(static_cast<unsigned char>(myText[myAt + index])) != aPrefix[index])
+			{
+				return false;
+			}
+		}
+		return true;
+	}
+
+	bool AtWhiteSpace() const
+	{
+		return myAt < myText.size() && std::isspace(static_cast<unsigned char>(myText[myAt])) != 0;
+	}
+
+	void SkipWhiteSpace()
+	{
+		while (AtWhiteSpace())
+		{
+			Step();
+		}
+	}
+
+	// "<?xml" up to its end as TinyXML reads a declaration: its version, encoding and standalone
+	// attributes with their quoted values (which may hold '>'), anything else passed over up to
+	// white space or '>'. A declaration the parser would reject ends its parse: what the scan
+	// counts after that only errs on the safe side.
+	void SkipDeclaration()
+	{
+		for (int index = 0; index < 5; ++index)
+		{
+			Step();
+		}
+		while (myAt < myText.size())
+		{
+			if (myText[myAt] == '>')
+			{
+				Step();
+				return;
+			}
+			SkipWhiteSpace();
+			if (StartsWithCaseless("version") || StartsWithCaseless("encoding") ||
+			    StartsWithCaseless("standalone"))
+			{
+				SkipAttribute();
+			}
+			else
+			{
+				while (myAt < myText.size() && myText[myAt] != '>' && !AtWhiteSpace())
+				{
+					Step();
+				}
+			}
+		}
+	}
+
+	// name = value, the value quoted or up to white space, '/' or '>'.
+	void SkipAttribute()
+	{
+		while (myAt < myText.size() && myText[myAt] != '=' && myText[myAt] != '>' && !AtWhiteSpace())
+		{
+			Step();
+		}
+		SkipWhiteSpace();
+		if (myAt >= myText.size() || myText[myAt] != '=')
+		{
+			return;
+		}
+		Step();
+		SkipWhiteSpace();
+		if (myAt < myText.size() && (myText[myAt] == '"' || myText[myAt] == '\''))
+		{
+			const char quote = myText[myAt];
+			Step();
+			while (myAt < myText.size() && myText[myAt] != quote)
+			{
+				StepCharacter();
+			}
+			if (myAt < myText.size())
+			{
+				Step();
+			}
+			return;
+		}
+		while (myAt < myText.size() && myText[myAt] != '/' && myText[myAt] != '>' && !AtWhiteSpace())
+		{
+			Step();
+		}
 	}
 
 	// TinyXML opens an element on '<' followed by a letter, '_' or any byte of a multi-byte
@@ -85,12 +187,35 @@ private:
 		++myAt;
 	}
 
-	void SkipPast(const char* aTerminator)
+	// TinyXML reads text, comments and quoted values a UTF-8 character at a time, the length
+	// given by the first byte: a '<' or a quote right after a lead byte belongs to its
+	// character, not to the markup.
+	void StepCharacter()
+	{
+		const unsigned char lead = static_cast<unsigned char>(myText[myAt]);
+		const size_t length = lead >= 0xC2 && lead <= 0xDF   ? 2
+		                      : lead >= 0xE0 && lead <= 0xEF ? 3
+		                      : lead >= 0xF0 && lead <= 0xF4 ? 4
+		                                                     : 1;
+		for (size_t index = 0; index < length && myAt < myText.size(); ++index)
+		{
+			Step();
+		}
+	}
+
+	void SkipPast(const char* aTerminator, bool aCharactersFlag = false)
 	{
 		const size_t length = std::strlen(aTerminator);
 		while (myAt < myText.size() && myText.compare(myAt, length, aTerminator) != 0)
 		{
-			Step();
+			if (aCharactersFlag)
+			{
+				StepCharacter();
+			}
+			else
+			{
+				Step();
+			}
 		}
 		for (size_t index = 0; index < length && myAt < myText.size(); ++index)
 		{
@@ -111,7 +236,7 @@ private:
 				Step();
 				while (myAt < myText.size() && myText[myAt] != c)
 				{
-					Step();
+					StepCharacter();
 				}
 				if (myAt < myText.size())
 				{
