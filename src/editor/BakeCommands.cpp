@@ -169,45 +169,45 @@ void LumoraWrapper::BakeSpecular(const std::u16string& aLevel)
 	Release();
 }
 
-bool LumoraWrapper::BakeAmbientRooms(const std::u16string& aLevel, int aNumOfBounces,
-                                     const std::vector<std::string>& someRoomIDs, std::string& aProblemOut)
+bool LumoraWrapper::BakeRooms(const std::vector<std::string>& someRoomIDs, std::string& aProblemOut,
+                              const std::function<void(const GrowingArray<Zeph::Room*>&)>& aBake)
 {
 	Claim();
 	GrowingArray<Zeph::Room*> rooms(4, 4);
 	aProblemOut = FindRooms(myRooms, someRoomIDs, rooms);
-	Zeph::Renderer& renderer = Zeph::Engine::GetInstance()->GetRenderer();
 	if (aProblemOut.empty())
 	{
 		QueueBakeScene();
-		renderer.GenerateSHForRooms(myRooms, rooms, AmbientPath(aLevel), aNumOfBounces);
-		renderer.DiscardLateItems();
-		// A room bake that had to bake the whole volume (its message says why) is recorded as one.
-		const bool wholeFlag = !renderer.GetBakeStatus().myLastMessage.empty();
-		RecordPhase(aLevel, BakePhase::AMBIENT, wholeFlag ? std::vector<std::string>() : someRoomIDs, myRooms,
-		            aNumOfBounces);
-		aProblemOut = UnfinishedBake("ambient");
+		aBake(rooms);
+		Zeph::Engine::GetInstance()->GetRenderer().DiscardLateItems();
 	}
 	Release();
 	return aProblemOut.empty();
 }
 
+bool LumoraWrapper::BakeAmbientRooms(const std::u16string& aLevel, int aNumOfBounces,
+                                     const std::vector<std::string>& someRoomIDs, std::string& aProblemOut)
+{
+	return BakeRooms(someRoomIDs, aProblemOut, [&](const GrowingArray<Zeph::Room*>& someRooms) {
+		Zeph::Renderer& renderer = Zeph::Engine::GetInstance()->GetRenderer();
+		renderer.GenerateSHForRooms(myRooms, someRooms, AmbientPath(aLevel), aNumOfBounces);
+		// A room bake that had to bake the whole volume (its message says why) is recorded as one.
+		const bool wholeFlag = !renderer.GetBakeStatus().myLastMessage.empty();
+		RecordPhase(aLevel, BakePhase::AMBIENT, wholeFlag ? std::vector<std::string>() : someRoomIDs, myRooms,
+		            aNumOfBounces);
+		aProblemOut = UnfinishedBake("ambient");
+	});
+}
+
 bool LumoraWrapper::BakeSpecularRooms(const std::u16string& aLevel,
                                       const std::vector<std::string>& someRoomIDs, std::string& aProblemOut)
 {
-	Claim();
-	GrowingArray<Zeph::Room*> rooms(4, 4);
-	aProblemOut = FindRooms(myRooms, someRoomIDs, rooms);
-	Zeph::Renderer& renderer = Zeph::Engine::GetInstance()->GetRenderer();
-	if (aProblemOut.empty())
-	{
-		QueueBakeScene();
-		renderer.GenerateReflections(myRooms, SysSTringToStdString(aLevel), &someRoomIDs);
-		renderer.DiscardLateItems();
+	return BakeRooms(someRoomIDs, aProblemOut, [&](const GrowingArray<Zeph::Room*>&) {
+		Zeph::Engine::GetInstance()->GetRenderer().GenerateReflections(myRooms, SysSTringToStdString(aLevel),
+		                                                               &someRoomIDs);
 		RecordPhase(aLevel, BakePhase::REFLECTIONS, someRoomIDs, myRooms, 0);
 		aProblemOut = UnfinishedBake("reflection");
-	}
-	Release();
-	return aProblemOut.empty();
+	});
 }
 
 bool LumoraWrapper::BakeAmbientPart(const std::u16string& aLevel, int aBounce,

@@ -232,6 +232,11 @@ private:
 	void RenderScene();
 	// Queues the scene a bake renders (BakeCommands.cpp).
 	void QueueBakeScene();
+	// The room bakes' common run: the rooms named found (else aProblemOut names the first
+	// that is not, and nothing is baked), the scene queued, aBake run on them, all while the
+	// facade is held. aBake sets aProblemOut when its bake did not finish.
+	bool BakeRooms(const std::vector<std::string>& someRoomIDs, std::string& aProblemOut,
+	               const std::function<void(const GrowingArray<Zeph::Room*>&)>& aBake);
 	void ResetIndices();
 	std::string SysSTringToStdString(const std::u16string& aString) const;
 

@@ -1,5 +1,6 @@
 // The facade's selection by kind and index, and absolute placement of the selection: what
 // an outliner and a properties panel need beside picking in the view and relative moves.
+#include <atomic>
 #include <cmath>
 
 #include "editor/LumoraWrapper.h"
@@ -9,36 +10,28 @@ namespace Lumora
 bool LumoraWrapper::Select(ObjectKind aKind, int anIndex)
 {
 	Claim();
-	const int counts[] = {myEnvironmentPointLights.Count(), myEnvironmentSpotLights.Count(), myDecals.Count(),
-	                      myNodes.Count()};
-	const int count = counts[static_cast<int>(aKind)];
-	if (anIndex < -1 || anIndex >= count)
+	// Per kind, in ObjectKind's order: its count, its mode and its selection.
+	const struct
 	{
-		Release();
-		return false;
-	}
-	ResetIndices();
-	switch (aKind)
+		int myCount;
+		LumoraMode myMode;
+		std::atomic<int>& mySelection;
+	} kinds[] = {
+	    {myEnvironmentPointLights.Count(), LIGHT_MODE, myCurrentSelectedPoint},
+	    {myEnvironmentSpotLights.Count(), LIGHT_MODE, myCurrentSelectedSpot},
+	    {myDecals.Count(), DECAL_MODE, myCurrentSelectedDecal},
+	    {myNodes.Count(), NODE_MODE, myCurrentSelectedNode},
+	};
+	const auto& kind = kinds[static_cast<int>(aKind)];
+	const bool validFlag = anIndex >= -1 && anIndex < kind.myCount;
+	if (validFlag)
 	{
-	case ObjectKind::POINT_LIGHT:
-		myMode = LIGHT_MODE;
-		myCurrentSelectedPoint = anIndex;
-		break;
-	case ObjectKind::SPOT_LIGHT:
-		myMode = LIGHT_MODE;
-		myCurrentSelectedSpot = anIndex;
-		break;
-	case ObjectKind::DECAL:
-		myMode = DECAL_MODE;
-		myCurrentSelectedDecal = anIndex;
-		break;
-	case ObjectKind::PATH_NODE:
-		myMode = NODE_MODE;
-		myCurrentSelectedNode = anIndex;
-		break;
+		ResetIndices();
+		myMode = kind.myMode;
+		kind.mySelection = anIndex;
 	}
 	Release();
-	return true;
+	return validFlag;
 }
 
 bool LumoraWrapper::SetSelectedPosition(const Vector3<float>& aPosition)
