@@ -147,6 +147,43 @@ bool Engine::SetupRenderTargets(int aWidth, int aHeight)
 	return result;
 }
 
+bool Engine::Resize(int aWidth, int aHeight)
+{
+	const char* function = "Zeph::Engine::Resize";
+	const int oldWidth = mySetupInfo.myWidth;
+	const int oldHeight = mySetupInfo.myHeight;
+	if (aWidth == oldWidth && aHeight == oldHeight)
+	{
+		return true;
+	}
+	int maxWidth = 0;
+	int maxHeight = 0;
+	myDevice.GetMaxFrameSize(maxWidth, maxHeight);
+	if (aWidth < 1 || aHeight < 1 || aWidth > maxWidth || aHeight > maxHeight)
+	{
+		ReportError(__LINE__, function, "Cannot draw a view of %dx%d pixels (1x1 to %dx%d); it stays at %dx%d",
+		            aWidth, aHeight, maxWidth, maxHeight, oldWidth, oldHeight);
+		return false;
+	}
+	// The back buffer goes before its successor is made; when that fails the old size
+	// is made again, which held before.
+	if (!SetupRenderTargets(aWidth, aHeight))
+	{
+		SetupRenderTargets(oldWidth, oldHeight);
+		ReportError(__LINE__, function, "Cannot make a %dx%d back buffer; the view stays at %dx%d", aWidth,
+		            aHeight, oldWidth, oldHeight);
+		return false;
+	}
+	if (!myRenderer->Resize(aWidth, aHeight))
+	{
+		SetupRenderTargets(oldWidth, oldHeight);
+		return false;
+	}
+	mySetupInfo.myWidth = aWidth;
+	mySetupInfo.myHeight = aHeight;
+	return true;
+}
+
 bool Engine::CreateTargets(int aWidth, int aHeight)
 {
 	ReleaseTargets();

@@ -65,6 +65,12 @@ public:
 	// (Re)creates the back buffer and the depth buffer at the given size and binds
 	// them with a full viewport; start-up runs it, and so does a resize.
 	bool SetupRenderTargets(int aWidth, int aHeight);
+	// The drawing area at a new size: the back buffer and depth buffer (with a window,
+	// its size is read again and the frame is shown stretched over it), the renderer's
+	// size-dependent targets and the setup info's size. False, reported at the error
+	// level with everything left at the old size, for a size below 1x1 or above what the
+	// context can draw, or when a target cannot be made. The same size does nothing.
+	bool Resize(int aWidth, int aHeight);
 
 	// The set-up flag: waits, 1 ms at a time, while another caller holds it, then
 	// takes it. Render-target set-up and the texture container's copies hold it.

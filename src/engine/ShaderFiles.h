@@ -1,6 +1,7 @@
 #pragma once
 // ShaderFiles: the effect file of each effect type. Rows 15 to 17 keep their
 // lower-case folder; the file layer finds them in the one data/ tree all the same.
+// Row 20 is the editor's overlays (light icons and wires), drawn over the finished frame.
 
 #include <array>
 
@@ -21,7 +22,8 @@ enum EffectType
 	EFFECT_LINE = 17,
 	EFFECT_DEFERRED_POINT_LIGHT = 18,
 	EFFECT_DEFERRED_SPOT_LIGHT = 19,
-	EFFECT_TYPE_COUNT = 20,
+	EFFECT_OVERLAY = 20,
+	EFFECT_TYPE_COUNT = 21,
 };
 
 inline constexpr std::array<const char*, EFFECT_TYPE_COUNT> ShaderFiles = {
@@ -45,5 +47,6 @@ inline constexpr std::array<const char*, EFFECT_TYPE_COUNT> ShaderFiles = {
     "data/shaders/misc/Line2D.fx",                          // 17
     "data/Shaders/PBL/DeferredPointLight.fx",               // 18
     "data/Shaders/PBL/DeferredSpotLight.fx",                // 19
+    "data/Shaders/Misc/Overlay.fx",                         // 20
 };
 } // namespace Zeph

@@ -48,6 +48,17 @@ bool DecalMeshRenderTargetHelper::Init(int aWidth, int aHeight, FullScreenHelper
 	return myNormalCopy->GetRenderTargetView() != nullptr;
 }
 
+bool DecalMeshRenderTargetHelper::Resize(int aWidth, int aHeight)
+{
+	auto copy = std::make_unique<Texture>(aWidth, aHeight, Dds::Format::R8G8B8A8_UNORM);
+	if (copy->GetRenderTargetView() == nullptr)
+	{
+		return false;
+	}
+	myNormalCopy = std::move(copy);
+	return true;
+}
+
 void DecalMeshRenderTargetHelper::Destroy()
 {
 	myNormalCopy.reset();

@@ -29,6 +29,8 @@ public:
 	~DecalMeshRenderTargetHelper() override;
 
 	bool Init(int aWidth, int aHeight, FullScreenHelper* aFullScreenHelper, DeferredRenderTargetHelper* aGBuffer);
+	// The normal copy made again at a new size; the old one stays when it cannot be made.
+	bool Resize(int aWidth, int aHeight);
 	void Destroy();
 	void SetDepth(Gpu::DepthStencilView* aDepth) { myDepth = aDepth; }
 

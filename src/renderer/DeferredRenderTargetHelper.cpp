@@ -51,6 +51,26 @@ bool DeferredRenderTargetHelper::Init(int aWidth, int aHeight)
 	return success;
 }
 
+bool DeferredRenderTargetHelper::Resize(int aWidth, int aHeight)
+{
+	std::unique_ptr<Texture> targets[SLOT_COUNT];
+	for (int slot = 0; slot < SLOT_COUNT; ++slot)
+	{
+		targets[slot] = std::make_unique<Texture>(aWidth, aHeight, ourFormats[slot]);
+		if (targets[slot]->GetRenderTargetView() == nullptr)
+		{
+			return false;
+		}
+	}
+	for (int slot = 0; slot < SLOT_COUNT; ++slot)
+	{
+		myTargets[slot] = std::move(targets[slot]);
+	}
+	myWidth = aWidth;
+	myHeight = aHeight;
+	return true;
+}
+
 void DeferredRenderTargetHelper::Destroy()
 {
 	for (std::unique_ptr<Texture>& target : myTargets)

@@ -42,6 +42,9 @@ public:
 	~DeferredRenderTargetHelper() override;
 
 	bool Init(int aWidth, int aHeight);
+	// The five targets made again at a new size (the volume models stay); when one
+	// cannot be made the old ones stay and it returns false.
+	bool Resize(int aWidth, int aHeight);
 	void Destroy();
 
 	// The clear values of the five targets.

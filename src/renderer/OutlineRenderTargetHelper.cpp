@@ -16,6 +16,17 @@ bool OutlineRenderTargetHelper::Init(int aWidth, int aHeight)
 	return myTarget->GetRenderTargetView() != nullptr;
 }
 
+bool OutlineRenderTargetHelper::Resize(int aWidth, int aHeight)
+{
+	auto target = std::make_unique<Texture>(aWidth, aHeight, Dds::Format::R8G8B8A8_UNORM_SRGB);
+	if (target->GetRenderTargetView() == nullptr)
+	{
+		return false;
+	}
+	myTarget = std::move(target);
+	return true;
+}
+
 void OutlineRenderTargetHelper::Destroy()
 {
 	myTarget.reset();

@@ -16,6 +16,8 @@ public:
 	~OutlineRenderTargetHelper() override;
 
 	bool Init(int aWidth, int aHeight);
+	// The mask made again at a new size; the old one stays when it cannot be made.
+	bool Resize(int aWidth, int aHeight);
 	void Destroy();
 	Texture* GetTarget() const { return myTarget.get(); }
 

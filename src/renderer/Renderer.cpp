@@ -3,6 +3,8 @@
 #include "renderer/AmbientVolumeFile.h"
 
 #include <algorithm>
+#include <functional>
+#include <iterator>
 
 #include "engine/CameraInstance.h"
 #include "engine/Debug.h"
@@ -16,6 +18,7 @@
 #include "engine/Texture.h"
 #include "platform/fx/Pass.h"
 #include "platform/fx/Technique.h"
+#include "platform/fx/Variable.h"
 #include "platform/gpu/Context.h"
 #include "platform/gpu/Texture.h"
 #include "platform/gpu/TimestampQueries.h"
@@ -151,8 +154,124 @@ bool Renderer::Init(int aWidth, int aHeight)
 	myTimeVariable = modelEffect != nullptr && modelEffect->GetEffect() != nullptr
 	                     ? modelEffect->GetEffect()->GetVariableByName("Time")
 	                     : nullptr;
+	Effect* overlayEffect = engine->GetEffectContainer().GetEffect(ShaderFiles[EFFECT_OVERLAY]);
+	myOverlayTint = overlayEffect != nullptr && overlayEffect->GetEffect() != nullptr
+	                    ? overlayEffect->GetEffect()->GetVariableByName("Tint")
+	                    : nullptr;
 	RegisterDebugTextures();
 	LoadSettings();
+	return true;
+}
+
+bool Renderer::Resize(int aWidth, int aHeight)
+{
+	const char* function = "Zeph::Renderer::Resize";
+	if (!myHDRTargets[0])
+	{
+		ReportError(__LINE__, function, "The renderer has no targets to resize");
+		return false;
+	}
+	if (aWidth < 1 || aHeight < 1)
+	{
+		ReportError(__LINE__, function, "Cannot resize the frame to %dx%d", aWidth, aHeight);
+		return false;
+	}
+	if (aWidth == myWidth && aHeight == myHeight)
+	{
+		return true;
+	}
+	// Each step makes its owner's targets at the size and swaps them in only when all
+	// are made, so a step that fails has changed nothing and the steps before it can be
+	// taken back.
+	const std::function<bool(int, int)> steps[] = {
+	    [this](int aStepWidth, int aStepHeight) { return ResizeFrameTargets(aStepWidth, aStepHeight); },
+	    [this](int aStepWidth, int aStepHeight) { return myDeferredHelper.Resize(aStepWidth, aStepHeight); },
+	    [this](int aStepWidth, int aStepHeight) { return myDecalHelper.Resize(aStepWidth, aStepHeight); },
+	    [this](int aStepWidth, int aStepHeight) { return myShadowHelper.Resize(aStepWidth, aStepHeight); },
+	    [this](int aStepWidth, int aStepHeight) { return myOutlineHelper.Resize(aStepWidth, aStepHeight); },
+	    [this](int aStepWidth, int aStepHeight) { return myBloomManager.Resize(aStepWidth, aStepHeight); },
+	    [this](int aStepWidth, int aStepHeight) { return myHDRManager.Resize(aStepWidth, aStepHeight); },
+	    [this](int aStepWidth, int aStepHeight) { return myMotionBlurManager.Resize(aStepWidth, aStepHeight); },
+	    [this](int aStepWidth, int aStepHeight) { return mySSAOManager.Resize(aStepWidth, aStepHeight); },
+	    [this](int aStepWidth, int aStepHeight) {
+		    return myColorGradingManager.Resize(aStepWidth, aStepHeight);
+	    },
+	    [this](int aStepWidth, int aStepHeight) { return myOutlineManager.Resize(aStepWidth, aStepHeight); },
+	    [this](int aStepWidth, int aStepHeight) { return myFXAAManager.Resize(aStepWidth, aStepHeight); },
+	};
+	const int stepCount = static_cast<int>(std::size(steps));
+	int done = 0;
+	while (done < stepCount && steps[done](aWidth, aHeight))
+	{
+		++done;
+	}
+	if (done < stepCount)
+	{
+		for (int step = done - 1; step >= 0; --step)
+		{
+			steps[step](myWidth, myHeight);
+		}
+		ReportError(__LINE__, function, "Cannot make the frame's targets at %dx%d; the frame stays at %dx%d",
+		            aWidth, aHeight, myWidth, myHeight);
+		return false;
+	}
+	myWidth = aWidth;
+	myHeight = aHeight;
+	myScreenViewport = MakeViewport(aWidth, aHeight);
+	myLitImage = nullptr;
+	// The debug tiles point at targets that were just replaced: the shown ones follow by name.
+	RegisterDebugTextures();
+	for (DebugTexture& shown : myShownDebugTextures)
+	{
+		for (const DebugTexture& registered : myDebugTextures)
+		{
+			if (registered.myName == shown.myName)
+			{
+				shown = registered;
+			}
+		}
+	}
+	return true;
+}
+
+bool Renderer::ResizeFrameTargets(int aWidth, int aHeight)
+{
+	std::unique_ptr<Texture> hdrTargets[2];
+	for (std::unique_ptr<Texture>& target : hdrTargets)
+	{
+		target = std::make_unique<Texture>(aWidth, aHeight, Dds::Format::R16G16B16A16_FLOAT);
+		if (target->GetRenderTargetView() == nullptr)
+		{
+			return false;
+		}
+	}
+	auto toneMapped = std::make_unique<Texture>(aWidth, aHeight, Dds::Format::R8G8B8A8_UNORM_SRGB);
+	std::unique_ptr<Gpu::Texture> depthTexture;
+	Gpu::DepthStencilView* depthView = nullptr;
+	Gpu::ShaderResourceView* depthShaderView = nullptr;
+	if (toneMapped->GetRenderTargetView() == nullptr ||
+	    !CreateDepthBuffer(aWidth, aHeight, "Zeph::Renderer::SetupSpecialDepthBuffer", "Failed at special depth",
+	                       {533, 552, 570}, depthTexture, depthView, depthShaderView))
+	{
+		if (depthTexture)
+		{
+			depthTexture->Destroy();
+		}
+		return false;
+	}
+	for (int index = 0; index < 2; ++index)
+	{
+		myHDRTargets[index] = std::move(hdrTargets[index]);
+		myPingPong[index] = myHDRTargets[index].get();
+	}
+	myToneMappedTarget = std::move(toneMapped);
+	if (mySpecialDepthTexture)
+	{
+		mySpecialDepthTexture->Destroy();
+	}
+	mySpecialDepthTexture = std::move(depthTexture);
+	mySpecialDepthView = depthView;
+	mySpecialDepthShaderView = depthShaderView;
 	return true;
 }
 
@@ -202,6 +321,7 @@ void Renderer::Destroy()
 	myLitImage = nullptr;
 	myTimestamps.reset();
 	myTimeVariable = nullptr;
+	myOverlayTint = nullptr;
 }
 
 bool Renderer::SetupShadowDepthBuffer()
@@ -428,7 +548,7 @@ void Renderer::SetVolumeBounds(const Vector3<float>& aWorldMin, const Vector3<fl
 	}
 }
 
-void Renderer::RenderLateInstance(Instance* anInstance)
+void Renderer::RenderLateInstance(Instance* anInstance, const Vector4<float>& aTint)
 {
 	if (anInstance == nullptr)
 	{
@@ -437,6 +557,7 @@ void Renderer::RenderLateInstance(Instance* anInstance)
 	LateRenderItem item;
 	item.myKind = LateRenderItem::INSTANCE;
 	item.myInstance = anInstance;
+	item.myTint = aTint;
 	myLateItems.Add(item);
 }
 
@@ -603,6 +724,10 @@ void Renderer::RenderLateItems()
 		case LateRenderItem::INSTANCE:
 			// Over the finished image: no depth buffer, so the scene hides nothing of it.
 			context.SetRenderTargets(targets, nullptr);
+			if (myOverlayTint != nullptr)
+			{
+				myOverlayTint->SetFloatVector(&item.myTint.x);
+			}
 			item.myInstance->Render();
 			myCollector.RenderShadowCastingStatic(myStandardHelper);
 			myCollector.Reset();

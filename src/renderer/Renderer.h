@@ -81,13 +81,22 @@ public:
 	Renderer& operator=(const Renderer&) = delete;
 
 	bool Init(int aWidth, int aHeight);
+	// The targets that follow the frame's size (HDR pair, tone-mapped image, G-buffer,
+	// decal normals, shadow resolve, outline mask, special depth and every post stage's)
+	// made again at a new size, new before old. Everything else stays: the SH volume,
+	// the settings on the effects, the colour grading lookup, the shadow caster, the SSAO
+	// directions and the eye adaptation. When a target cannot be made, every target is
+	// put back at the old size and it returns false (reported at the error level); a size
+	// below 1x1 is refused the same way. The same size does nothing.
+	bool Resize(int aWidth, int aHeight);
 	// Releases every target and forgets the queued frame; the engine calls it first at shutdown.
 	void Destroy();
 
 	void Render(Gpu::RenderTargetView* aBackBuffer, Gpu::DepthStencilView* aDepth);
 
 	RenderTargetCollector& GetRTC() { return myCollector; }
-	void RenderLateInstance(Instance* anInstance);
+	// aTint colours an instance of the overlay effect (the editor's light icons and wires).
+	void RenderLateInstance(Instance* anInstance, const Vector4<float>& aTint = Vector4<float>(1.0f, 1.0f, 1.0f, 1.0f));
 	void RenderLateText(Text* aText);
 	int GetLateCount() const { return myLateItems.Count(); }
 	// Forgets the queued late items without drawing them (after a bake, whose queued
@@ -278,6 +287,9 @@ private:
 	void RenderLateItems();
 	void RenderDebugTextures();
 	void RegisterDebugTextures();
+	// The renderer's own frame-sized targets (HDR pair, tone-mapped image, special depth)
+	// made at a size, swapped in only when all are made.
+	bool ResizeFrameTargets(int aWidth, int aHeight);
 	void LoadSettings();
 	void BeginPass(const char* aName);
 	void EndPasses();
@@ -305,6 +317,8 @@ private:
 	Gpu::DepthStencilView* myCurrentDepth = nullptr;
 	Gpu::RenderTargetView* myBackBuffer = nullptr;
 	Fx::Variable* myTimeVariable = nullptr;
+	// The overlay effect's "Tint", set for every late instance.
+	Fx::Variable* myOverlayTint = nullptr;
 	ComputeHelper myComputeHelper;
 	FullScreenHelper myFullScreenHelper;
 	BloomManager myBloomManager;

@@ -70,6 +70,17 @@ bool ShadowRenderTargetHelper::Init(int aShadowMapSize, int aWidth, int aHeight)
 	return myTarget->GetRenderTargetView() != nullptr;
 }
 
+bool ShadowRenderTargetHelper::Resize(int aWidth, int aHeight)
+{
+	auto target = std::make_unique<Texture>(aWidth, aHeight, Dds::Format::R8G8B8A8_UNORM);
+	if (target->GetRenderTargetView() == nullptr)
+	{
+		return false;
+	}
+	myTarget = std::move(target);
+	return true;
+}
+
 void ShadowRenderTargetHelper::Destroy()
 {
 	myTarget.reset();

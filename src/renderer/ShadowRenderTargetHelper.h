@@ -38,6 +38,9 @@ public:
 	~ShadowRenderTargetHelper() override;
 
 	bool Init(int aShadowMapSize, int aWidth, int aHeight);
+	// The frame-sized target the shadow map resolves into made again at a new size; the
+	// caster and its settings stay. The old target stays when the new one cannot be made.
+	bool Resize(int aWidth, int aHeight);
 	void Destroy();
 
 	void SetRecomputeFlag(bool aFlag) { myRecomputeFlag = aFlag; }

@@ -1,5 +1,6 @@
 #include "platform/gpu/Device.h"
 
+#include <algorithm>
 #include <cstring>
 #include <dlfcn.h>
 #include <link.h>
@@ -508,6 +509,20 @@ bool Device::UpdateWindowSurface(int aWidth, int aHeight)
 		return false;
 	}
 	return true;
+}
+
+void Device::GetMaxFrameSize(int& aWidth, int& aHeight) const
+{
+	GLint textureSize = 0;
+	GLint viewport[2] = {0, 0};
+	GLint framebufferWidth = 0;
+	GLint framebufferHeight = 0;
+	glGetIntegerv(GL_MAX_TEXTURE_SIZE, &textureSize);
+	glGetIntegerv(GL_MAX_VIEWPORT_DIMS, viewport);
+	glGetIntegerv(GL_MAX_FRAMEBUFFER_WIDTH, &framebufferWidth);
+	glGetIntegerv(GL_MAX_FRAMEBUFFER_HEIGHT, &framebufferHeight);
+	aWidth = std::min({textureSize, viewport[0], framebufferWidth});
+	aHeight = std::min({textureSize, viewport[1], framebufferHeight});
 }
 
 bool Device::SwapBuffers(int aSyncInterval)

@@ -79,6 +79,9 @@ public:
 	// Gives the window's framebuffer the window's new size, with the context current on
 	// this thread (the EGL surface is made anew). Nothing happens when the size is unchanged.
 	bool UpdateWindowSurface(int aWidth, int aHeight);
+	// The largest frame the context can draw: the smallest of the texture, viewport and
+	// framebuffer limits, per side. Needs the context current.
+	void GetMaxFrameSize(int& aWidth, int& aHeight) const;
 	// Shows what was drawn into the window's default framebuffer, after aSyncInterval
 	// vertical blanks (0: at once; the driver clamps to what it supports).
 	bool SwapBuffers(int aSyncInterval);

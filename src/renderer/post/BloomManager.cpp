@@ -34,6 +34,17 @@ void BloomManager::Render(Gpu::RenderTargetView* aDestination, Texture* aSource)
 	myFullScreenHelper->Process("Bloom", aSource, aDestination, myWidth, myHeight);
 }
 
+bool BloomManager::ResizeTargets(int aWidth, int aHeight)
+{
+	std::unique_ptr<Texture> target = CreateTarget(aWidth, aHeight, Dds::Format::R8G8B8A8_UNORM_SRGB);
+	if (!target || !myChain.Resize(aWidth, aHeight, Dds::Format::R8G8B8A8_UNORM_SRGB))
+	{
+		return false;
+	}
+	myTarget = std::move(target);
+	return true;
+}
+
 void BloomManager::Destroy()
 {
 	myChain.Destroy();

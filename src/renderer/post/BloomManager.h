@@ -21,6 +21,9 @@ public:
 	Texture* GetTarget() const { return myTarget.get(); }
 	const DownSampleChain& GetChain() const { return myChain; }
 
+protected:
+	bool ResizeTargets(int aWidth, int aHeight) override;
+
 private:
 	// A full-size target for the renderer to bloom into when it needs an intermediate.
 	std::unique_ptr<Texture> myTarget;

@@ -9,16 +9,43 @@ namespace Zeph
 bool DownSampleChain::Init(int aWidth, int aHeight, Dds::Format aFormat)
 {
 	Destroy();
+	if (!MakeLevels(aWidth, aHeight, aFormat, myResults, myScratches))
+	{
+		Destroy();
+		return false;
+	}
+	return true;
+}
+
+bool DownSampleChain::Resize(int aWidth, int aHeight, Dds::Format aFormat)
+{
+	std::unique_ptr<Texture> results[ourLevelCount];
+	std::unique_ptr<Texture> scratches[ourLevelCount];
+	if (!MakeLevels(aWidth, aHeight, aFormat, results, scratches))
+	{
+		return false;
+	}
+	for (int level = 0; level < ourLevelCount; ++level)
+	{
+		myResults[level] = std::move(results[level]);
+		myScratches[level] = std::move(scratches[level]);
+	}
+	return true;
+}
+
+bool DownSampleChain::MakeLevels(int aWidth, int aHeight, Dds::Format aFormat,
+                                 std::unique_ptr<Texture> (&someResultsOut)[ourLevelCount],
+                                 std::unique_ptr<Texture> (&someScratchesOut)[ourLevelCount])
+{
 	for (int level = 0; level < ourLevelCount; ++level)
 	{
 		const int width = std::max(aWidth >> (level + 1), 1);
 		const int height = std::max(aHeight >> (level + 1), 1);
-		myResults[level] = std::make_unique<Texture>(width, height, aFormat);
-		myScratches[level] = std::make_unique<Texture>(width, height, aFormat);
-		if (myResults[level]->GetRenderTargetView() == nullptr ||
-		    myScratches[level]->GetRenderTargetView() == nullptr)
+		someResultsOut[level] = std::make_unique<Texture>(width, height, aFormat);
+		someScratchesOut[level] = std::make_unique<Texture>(width, height, aFormat);
+		if (someResultsOut[level]->GetRenderTargetView() == nullptr ||
+		    someScratchesOut[level]->GetRenderTargetView() == nullptr)
 		{
-			Destroy();
 			return false;
 		}
 	}

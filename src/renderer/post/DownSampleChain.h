@@ -30,6 +30,8 @@ public:
 	// Level n is (aWidth >> (n + 1)) x (aHeight >> (n + 1)), at least 1x1. False when
 	// a target cannot be made (the texture reports it).
 	bool Init(int aWidth, int aHeight, Dds::Format aFormat);
+	// The levels made again for a new frame size; when one cannot be made the old levels stay.
+	bool Resize(int aWidth, int aHeight, Dds::Format aFormat);
 	void Destroy();
 
 	// aFirstTechnique takes aSource to level 0, "DownSamplePoint" each level to the
@@ -43,6 +45,11 @@ public:
 	Texture* GetScratch(int aLevel) const;
 
 private:
+	// Every level's pair made into the given arrays; false at the first that cannot be made.
+	static bool MakeLevels(int aWidth, int aHeight, Dds::Format aFormat,
+	                       std::unique_ptr<Texture> (&someResultsOut)[ourLevelCount],
+	                       std::unique_ptr<Texture> (&someScratchesOut)[ourLevelCount]);
+
 	std::unique_ptr<Texture> myResults[ourLevelCount];
 	std::unique_ptr<Texture> myScratches[ourLevelCount];
 };

@@ -29,6 +29,17 @@ void FXAAManager::Render(Gpu::RenderTargetView* aDestination, Texture* aSource)
 	}
 }
 
+bool FXAAManager::ResizeTargets(int aWidth, int aHeight)
+{
+	std::unique_ptr<Texture> target = CreateTarget(aWidth, aHeight, Dds::Format::R8G8B8A8_UNORM_SRGB);
+	if (!target)
+	{
+		return false;
+	}
+	myTarget = std::move(target);
+	return true;
+}
+
 void FXAAManager::Destroy()
 {
 	myTarget.reset();

@@ -18,6 +18,9 @@ public:
 	// A full-size target for the renderer to resolve into before anti-aliasing.
 	Texture* GetTarget() const { return myTarget.get(); }
 
+protected:
+	bool ResizeTargets(int aWidth, int aHeight) override;
+
 private:
 	std::unique_ptr<Texture> myTarget;
 };

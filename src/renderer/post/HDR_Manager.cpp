@@ -85,6 +85,22 @@ void HDR_Manager::Render(Gpu::RenderTargetView* aDestination, Texture* aSource)
 	helper.Process("ToneMap", aSource, aDestination, myWidth, myHeight);
 }
 
+bool HDR_Manager::ResizeTargets(int aWidth, int aHeight)
+{
+	std::vector<std::unique_ptr<Texture>> chain;
+	const int count = ComputeLuminanceCount(aWidth, aHeight);
+	for (int index = 0; index < count; ++index)
+	{
+		chain.push_back(CreateTarget(1 << index, 1 << index, Dds::Format::R32_FLOAT));
+		if (!chain.back())
+		{
+			return false;
+		}
+	}
+	myLuminanceChain = std::move(chain);
+	return true;
+}
+
 void HDR_Manager::Destroy()
 {
 	myLuminanceChain.clear();

@@ -36,6 +36,11 @@ public:
 	// The target of pair aPair that holds the latest adapted luminance.
 	Texture* GetCurrentAdaptation(int aPair) const;
 
+protected:
+	// The luminance chain follows the size; the adapted luminance carries on, so the
+	// exposure does not jump while a view is being resized.
+	bool ResizeTargets(int aWidth, int aHeight) override;
+
 private:
 	std::vector<std::unique_ptr<Texture>> myLuminanceChain;
 	std::unique_ptr<Texture> myAdaptation[ourAdaptSize][2];

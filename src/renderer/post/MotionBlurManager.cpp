@@ -65,6 +65,17 @@ void MotionBlurManager::Render(Gpu::RenderTargetView* aDestination, Texture* aSo
 	myFullScreenHelper->ApplyFirstPass("RenderFullBlur");
 }
 
+bool MotionBlurManager::ResizeTargets(int aWidth, int aHeight)
+{
+	std::unique_ptr<Texture> buffer = CreateTarget(aWidth, aHeight, ourVelocityFormat);
+	if (!buffer)
+	{
+		return false;
+	}
+	myVelocityBuffer = std::move(buffer);
+	return true;
+}
+
 void MotionBlurManager::Destroy()
 {
 	myVelocityBuffer.reset();

@@ -22,6 +22,9 @@ public:
 	// The velocity buffer (two floats per pixel), also shown among the debug tiles.
 	Texture* GetBuffer() const { return myVelocityBuffer.get(); }
 
+protected:
+	bool ResizeTargets(int aWidth, int aHeight) override;
+
 private:
 	std::unique_ptr<Texture> myVelocityBuffer;
 };

@@ -51,30 +51,7 @@ bool OutlineManager::Init(int aWidth, int aHeight, FullScreenHelper* aFullScreen
 		Destroy();
 		return false;
 	}
-	const Kernel horizontal = ComputeKernel(aWidth, true);
-	const Kernel vertical = ComputeKernel(aHeight, false);
-	const struct
-	{
-		const char* myName;
-		const std::array<Vector4<float>, ourTapCount>& myValues;
-	} arrays[] = {
-	    {"horSampleOffsets", horizontal.myOffsets},
-	    {"horSampleWeights", horizontal.myWeights},
-	    {"vertSampleOffsets", vertical.myOffsets},
-	    {"vertSampleWeights", vertical.myWeights},
-	};
-	bool resultFlag = true;
-	for (const auto& entry : arrays)
-	{
-		Fx::Variable* variable = effect->GetEffect()->GetVariableByName(entry.myName);
-		if (!variable->IsValid())
-		{
-			ReportCritical(__LINE__, function, "%s is invalid", entry.myName);
-			resultFlag = false;
-			continue;
-		}
-		variable->SetFloatVectorArray(&entry.myValues[0].x, 0, ourTapCount);
-	}
+	const bool resultFlag = PublishKernels(*effect, aWidth, aHeight);
 	myTarget = CreateTarget(aWidth, aHeight, Dds::Format::R8G8B8A8_UNORM_SRGB);
 	if (!resultFlag || !myTarget || !myChain.Init(aWidth, aHeight, Dds::Format::R8G8B8A8_UNORM_SRGB))
 	{
@@ -96,6 +73,49 @@ void OutlineManager::Render(Gpu::RenderTargetView* aDestination, Texture* aSourc
 	                                       myChain.GetResult(2)->GetShaderResourceView());
 	myFullScreenHelper->Process("Outline", aSource, aDestination, myWidth, myHeight);
 	Engine::GetInstance()->GetContext().SetRenderTargets({}, nullptr);
+}
+
+bool OutlineManager::PublishKernels(Effect& anEffect, int aWidth, int aHeight)
+{
+	const Kernel horizontal = ComputeKernel(aWidth, true);
+	const Kernel vertical = ComputeKernel(aHeight, false);
+	const struct
+	{
+		const char* myName;
+		const std::array<Vector4<float>, ourTapCount>& myValues;
+	} arrays[] = {
+	    {"horSampleOffsets", horizontal.myOffsets},
+	    {"horSampleWeights", horizontal.myWeights},
+	    {"vertSampleOffsets", vertical.myOffsets},
+	    {"vertSampleWeights", vertical.myWeights},
+	};
+	bool resultFlag = true;
+	for (const auto& entry : arrays)
+	{
+		Fx::Variable* variable = anEffect.GetEffect()->GetVariableByName(entry.myName);
+		if (!variable->IsValid())
+		{
+			ReportCritical(__LINE__, "Zeph::OutlineManager::Init", "%s is invalid", entry.myName);
+			resultFlag = false;
+			continue;
+		}
+		variable->SetFloatVectorArray(&entry.myValues[0].x, 0, ourTapCount);
+	}
+	return resultFlag;
+}
+
+bool OutlineManager::ResizeTargets(int aWidth, int aHeight)
+{
+	Effect* effect = myFullScreenHelper->GetEffect();
+	std::unique_ptr<Texture> target = CreateTarget(aWidth, aHeight, Dds::Format::R8G8B8A8_UNORM_SRGB);
+	if (effect == nullptr || !target || !myChain.Resize(aWidth, aHeight, Dds::Format::R8G8B8A8_UNORM_SRGB))
+	{
+		return false;
+	}
+	myTarget = std::move(target);
+	// The blur's taps are a texel apart, so they follow the size.
+	PublishKernels(*effect, aWidth, aHeight);
+	return true;
 }
 
 void OutlineManager::Destroy()

@@ -18,6 +18,8 @@ class Variable;
 
 namespace Zeph
 {
+class Effect;
+
 class OutlineManager : public PostProcessManager
 {
 public:
@@ -48,7 +50,14 @@ public:
 	Texture* GetTarget() const { return myTarget.get(); }
 	const DownSampleChain& GetChain() const { return myChain; }
 
+protected:
+	bool ResizeTargets(int aWidth, int aHeight) override;
+
 private:
+	// The kernels for a frame of the size set on the full-screen effect; false (reported)
+	// when it lacks one of their variables.
+	static bool PublishKernels(Effect& anEffect, int aWidth, int aHeight);
+
 	std::unique_ptr<Texture> myTarget;
 	DownSampleChain myChain;
 };

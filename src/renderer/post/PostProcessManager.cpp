@@ -23,6 +23,34 @@ bool PostProcessManager::Init(int aWidth, int aHeight, FullScreenHelper* aFullSc
 	return true;
 }
 
+bool PostProcessManager::Resize(int aWidth, int aHeight)
+{
+	if (aWidth < 1 || aHeight < 1)
+	{
+		ReportError(__LINE__, "Zeph::PostProcessManager::Resize",
+		            "A post stage needs a frame of at least 1x1 (got %dx%d)", aWidth, aHeight);
+		return false;
+	}
+	if (myFullScreenHelper == nullptr)
+	{
+		return true;
+	}
+	if (!ResizeTargets(aWidth, aHeight))
+	{
+		return false;
+	}
+	myWidth = aWidth;
+	myHeight = aHeight;
+	return true;
+}
+
+bool PostProcessManager::ResizeTargets(int aWidth, int aHeight)
+{
+	(void)aWidth;
+	(void)aHeight;
+	return true;
+}
+
 void PostProcessManager::Destroy()
 {
 	myWidth = 0;

@@ -57,18 +57,43 @@ bool SSAOManager::Init(int aWidth, int aHeight, FullScreenHelper* aFullScreenHel
 		    __LINE__, function,
 		    "The full-screen effect lacks Randvectors, NormalTexture, LinearDepthTexture or AOTexture");
 	}
-	myOcclusionBuffer = CreateTarget(aWidth, aHeight, Dds::Format::R8G8B8A8_UNORM);
-	myHalfBuffer = CreateTarget(aWidth / 2, aHeight / 2, Dds::Format::R8G8B8A8_UNORM);
-	myBlurBuffer = CreateTarget(aWidth, aHeight, Dds::Format::R8G8B8A8_UNORM);
-	if (!resultFlag || !myOcclusionBuffer || !myHalfBuffer || !myBlurBuffer)
+	if (!resultFlag || !MakeBuffers(aWidth, aHeight, myOcclusionBuffer, myHalfBuffer, myBlurBuffer))
 	{
 		Destroy();
 		return false;
 	}
-	const float white[4] = {1.0f, 1.0f, 1.0f, 1.0f};
-	Engine::GetInstance()->GetContext().ClearRenderTargetView(*myBlurBuffer->GetRenderTargetView(), white);
 	CreateRandomVectors();
 	randomVectors->SetFloatVectorArray(&myRandomVectors[0].x, 0, ourRandomVectorCount);
+	return true;
+}
+
+bool SSAOManager::MakeBuffers(int aWidth, int aHeight, std::unique_ptr<Texture>& anOcclusionOut,
+                              std::unique_ptr<Texture>& aHalfOut, std::unique_ptr<Texture>& aBlurOut)
+{
+	anOcclusionOut = CreateTarget(aWidth, aHeight, Dds::Format::R8G8B8A8_UNORM);
+	aHalfOut = CreateTarget(aWidth / 2, aHeight / 2, Dds::Format::R8G8B8A8_UNORM);
+	aBlurOut = CreateTarget(aWidth, aHeight, Dds::Format::R8G8B8A8_UNORM);
+	if (!anOcclusionOut || !aHalfOut || !aBlurOut)
+	{
+		return false;
+	}
+	const float white[4] = {1.0f, 1.0f, 1.0f, 1.0f};
+	Engine::GetInstance()->GetContext().ClearRenderTargetView(*aBlurOut->GetRenderTargetView(), white);
+	return true;
+}
+
+bool SSAOManager::ResizeTargets(int aWidth, int aHeight)
+{
+	std::unique_ptr<Texture> occlusion;
+	std::unique_ptr<Texture> half;
+	std::unique_ptr<Texture> blur;
+	if (!MakeBuffers(aWidth, aHeight, occlusion, half, blur))
+	{
+		return false;
+	}
+	myOcclusionBuffer = std::move(occlusion);
+	myHalfBuffer = std::move(half);
+	myBlurBuffer = std::move(blur);
 	return true;
 }
 

@@ -46,8 +46,16 @@ public:
 		return myRandomVectors;
 	}
 
+protected:
+	// The buffers follow the size; the sample directions stay.
+	bool ResizeTargets(int aWidth, int aHeight) override;
+
 private:
 	void CreateRandomVectors();
+	// The three buffers of a frame of the size, the blur's cleared to white; false when
+	// one cannot be made.
+	static bool MakeBuffers(int aWidth, int aHeight, std::unique_ptr<Texture>& anOcclusionOut,
+	                        std::unique_ptr<Texture>& aHalfOut, std::unique_ptr<Texture>& aBlurOut);
 
 	std::unique_ptr<Texture> myOcclusionBuffer;
 	// Half size, kept for a half-resolution occlusion pass; the blur does not need it.
