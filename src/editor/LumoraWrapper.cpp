@@ -76,6 +76,27 @@ void LumoraWrapper::SetFatalReportLevels(std::bitset<4> someLevels)
 	ourFatalLevels = someLevels;
 }
 
+void LumoraWrapper::SetReportListener(
+    std::function<void(int aLevel, const std::string& aFunction, const std::string& aText)> aListener)
+{
+	if (!aListener)
+	{
+		Debug::SetReportListener({});
+		return;
+	}
+	Debug::SetReportListener([listener = std::move(aListener)](Debug::AssertLevels aLevel, int,
+	                                                           const char* aFunction, const char* aText) {
+		// Messages are written as log entries, many ending in a line break that a front end's
+		// list does not want.
+		std::string text = aText;
+		while (!text.empty() && (text.back() == '\n' || text.back() == '\r' || text.back() == ' '))
+		{
+			text.pop_back();
+		}
+		listener(static_cast<int>(aLevel), aFunction, text);
+	});
+}
+
 void LumoraWrapper::ShutDown()
 {
 	if (ourInstance == nullptr)
@@ -108,14 +129,21 @@ void LumoraWrapper::Init()
 	myUpdateActive = false;
 	myRenderRoomsFlag = false;
 	myRenderMeshesFlag = true;
+	myLightIconsFlag = false;
+	myLightVolumes = LightVolumes::NONE;
 	myNodeHalfDimensions = 0.25f;
 	myMode = LIGHT_MODE;
 
 	Zeph::Engine* engine = EngineOrNull();
+	myWidth = engine->GetSetupInfo().myWidth;
+	myHeight = engine->GetSetupInfo().myHeight;
 	myInfoText = std::make_unique<Zeph::Text>(engine->GetFontContainer().GetFont("Arial"));
 	myInfoText->SetPosition(Vector2<float>(5.0f, 5.0f));
 	myInfoText->SetSize(12.0f);
 	myMarkedGizmo.reset(NewGizmo("marked-gizmo", Vector4<float>(0.0f, 1.0f, 0.0f, 0.0f)));
+	// Without its models (reported) the editor goes on without light icons and wires.
+	myLightOverlays = std::make_unique<LightOverlays>();
+	myLightOverlays->Init();
 	InitScene();
 }
 
@@ -178,6 +206,7 @@ void LumoraWrapper::DestroyScene()
 	myRooms.DeleteAll();
 	myLightGizmos.DeleteAll();
 	myMarkedGizmo.reset();
+	myLightOverlays.reset();
 	myEntityBank.clear();
 	myEntityShadowCasterBank.clear();
 	myCameraInstance.reset();
@@ -268,6 +297,10 @@ void LumoraWrapper::Claim()
 
 void LumoraWrapper::ClaimAfterTheFrame()
 {
+	// Announced first, as Claim is: a render loop that runs without pause starts no frame
+	// step while this waits, so the wait ends with the step that runs. Polled unannounced,
+	// the gaps between its frames are too short to be seen, and a resize waited for seconds.
+	myWaitingClaims.fetch_add(1);
 	while (!myRenderIsDoneFlag.load())
 	{
 		std::this_thread::sleep_for(ourPollInterval);
@@ -279,6 +312,7 @@ void LumoraWrapper::ClaimAfterTheFrame()
 	// These operations also wait for the busy flag, so a load or a settings change
 	// never overlaps an edit or a bake running on another thread.
 	Claim();
+	myWaitingClaims.fetch_sub(1);
 }
 
 void LumoraWrapper::Release()
@@ -369,7 +403,10 @@ void LumoraWrapper::RenderScene()
 		myEntities[index]->Render();
 	}
 
-	const bool gizmosFlag = myRenderMeshesFlag.load() && myMode == LIGHT_MODE;
+	// The light icons, when shown, stand in for the marker boxes. One read per frame: the
+	// switch may change meanwhile, and a frame shows one or the other.
+	const bool iconsFlag = myLightIconsFlag.load();
+	const bool gizmosFlag = myRenderMeshesFlag.load() && myMode == LIGHT_MODE && !iconsFlag;
 	// One read of each selection per frame (picking may change them meanwhile), so the
 	// frame marks one light at most and draws the box only for a decal it has.
 	const int selectedPoint = myCurrentSelectedPoint.load();
@@ -446,6 +483,7 @@ void LumoraWrapper::RenderScene()
 	{
 		renderer.RenderLateInstance(myDecalBox.get());
 	}
+	QueueLightOverlays(selectedPoint, selectedSpot, iconsFlag);
 }
 
 // --- modes, display, camera, settings --------------------------------------------------

@@ -13,6 +13,10 @@
 //                                           editor->SaveLights(u"sample_small");
 //   Lumora::LumoraWrapper::ShutDown();
 //
+// In a native child window the view follows the window: the host resizes the window, then
+// calls Resize with its new size in device pixels; GetWidth and GetHeight give the size
+// drawn at, which picking, ProjectToView and the camera's aspect follow.
+//
 // Threads. Update and Render are frame steps: they run only when the facade is free
 // and no claim is waiting, and return at once otherwise (the frame is dropped, not
 // queued). Editing operations and saving claim the facade: they wait (polling every
@@ -37,6 +41,7 @@
 #include "editor/DecalStruct.h"
 #include "editor/DecalType.h"
 #include "editor/DecalTypeStruct.h"
+#include "editor/LightOverlays.h"
 #include "editor/LumoraMode.h"
 #include "editor/PointLightStruct.h"
 #include "editor/SpotLightStruct.h"
@@ -73,8 +78,26 @@ public:
 	// the next Create: severe and critical by default. A tool that lists a level's
 	// problems turns them all off and listens to the log instead.
 	static void SetFatalReportLevels(std::bitset<4> someLevels);
+	// Hands every report of the library's log to aListener as well: its level (0 debug,
+	// 1 error, 2 severe, 3 critical), the reporting function and the message (without its
+	// line break). It is called on whichever thread reports (a frame, a bake, the user-
+	// interface thread) and must not call back into the facade. Process-wide, before or
+	// after Create; an empty function removes it. The log reads its listener without a lock:
+	// set it while nothing else reports (before Create, or with no frame, edit or bake running).
+	static void SetReportListener(
+	    std::function<void(int aLevel, const std::string& aFunction, const std::string& aText)> aListener);
 	void Update(float someElapsedTime);
 	void Render();
+	// The drawing area follows the view: the back buffer and depth, the renderer's frame-sized
+	// targets (its SH volume, settings and grading stay), the size picking uses and the camera's
+	// aspect, at aWidth x aHeight device pixels. With a window, the host resizes the window
+	// first; its surface follows. Claims after the frame. False, with the old size kept and
+	// the reason in the log, for a size below 1 or above what the GPU can draw, or when the
+	// targets cannot be made; the same size is true at once.
+	bool Resize(int aWidth, int aHeight);
+	// The size drawn at, in device pixels; any thread.
+	int GetWidth() const { return myWidth.load(); }
+	int GetHeight() const { return myHeight.load(); }
 
 	// Modes, display and camera.
 	void SetIsLightMode(int aMode);
@@ -87,9 +110,33 @@ public:
 	// aPitch about its own right axis (radians; positive looks down): for tools and
 	// front ends that restore a saved view.
 	void PlaceCamera(const Vector3<float>& aPosition, float aYaw, float aPitch);
+	// Where the camera is and its yaw and pitch as PlaceCamera takes them, so that PlaceCamera
+	// with them puts the camera back as it is (yaw in -pi..pi, pitch in -pi/2..pi/2).
+	void GetCameraPlacement(Vector3<float>& aPosition, float& aYaw, float& aPitch) const;
 	void Strafe(float aStrafe);
+	// The pixel (device pixels, top-left origin, as DoIntersection takes it) at which a world
+	// point is drawn with the current camera and size, possibly outside the view; false when
+	// the point lies behind the camera.
+	bool ProjectToView(const Vector3<float>& aWorld, float& aX, float& aY) const;
+	// Every point and spot light drawn over the frame as an icon about 24 pixels across
+	// whatever its distance (a bulb with rays, or a lamp shade with a tick along the spot's
+	// direction), in the light's colour, the selected one in a ring; a click on an icon picks
+	// its light. In LIGHT_MODE only, where the icons take the marker boxes' place. Off by default.
+	void SetLightIconsFlag(bool aFlag);
+	// Which lights show their reach as wire over the frame, in LIGHT_MODE: a point light's
+	// falloff sphere as three great circles, a spot light's outer cone out to its reach with
+	// the inner cone's ring. The selected light's is drawn brighter. NONE by default.
+	enum class LightVolumes
+	{
+		NONE,
+		SELECTED,
+		ALL,
+	};
+	void SetLightVolumes(LightVolumes aWhich);
 
 	// Picking and selection.
+	// Selects the nearest object of the mode whose marker box the ray through the pixel hits,
+	// or, in LIGHT_MODE with icons shown, whose icon covers the pixel.
 	void DoIntersection(float aMouseX, float aMouseY);
 	// Selection by kind and index, as an outliner selects: the kind's mode becomes the
 	// editor's mode and the object its only selection (-1 selects nothing). False, with mode
@@ -210,6 +257,8 @@ public:
 	const Zeph::Instance* GetDecalBox() const { return myDecalBox.get(); }
 	const std::map<std::string, DecalType>& GetDecalTypes() const { return myDecalTypes; }
 	const std::map<std::string, std::string>& GetEntityBank() const { return myEntityBank; }
+	bool GetLightIconsFlag() const { return myLightIconsFlag.load(); }
+	LightVolumes GetLightVolumes() const { return myLightVolumes.load(); }
 	bool IsBusy() const { return myPausedFlag.load(); }
 	bool IsUpdateActive() const { return myUpdateActive.load(); }
 	// Called by Render with the busy flag held, after the scene is submitted and before
@@ -230,6 +279,9 @@ private:
 	void DestroyScene();
 	void UpdateScene(float someElapsedTime);
 	void RenderScene();
+	// Queues the light icons (when anIconsFlag) and the wires the display switches ask for
+	// (View.cpp).
+	void QueueLightOverlays(int aSelectedPoint, int aSelectedSpot, bool anIconsFlag);
 	// Queues the scene a bake renders (BakeCommands.cpp).
 	void QueueBakeScene();
 	// The room bakes' common run: the rooms named found (else aProblemOut names the first
@@ -310,6 +362,11 @@ private:
 	// read by the frame.
 	std::atomic<bool> myRenderRoomsFlag{false};
 	std::atomic<bool> myRenderMeshesFlag{true};
+	std::atomic<bool> myLightIconsFlag{false};
+	std::atomic<LightVolumes> myLightVolumes{LightVolumes::NONE};
+	// The drawing size, written by Create and Resize, readable from any thread.
+	std::atomic<int> myWidth{0};
+	std::atomic<int> myHeight{0};
 	float myNodeHalfDimensions = 0.25f;
 	std::unique_ptr<Zeph::Camera> myCamera;
 	std::unique_ptr<Zeph::CameraInstance> myCameraInstance;
@@ -332,6 +389,7 @@ private:
 	Zeph::Texture* myNormTexture = nullptr;
 	std::unique_ptr<Zeph::Instance> myDecalBox;
 	std::unique_ptr<Zeph::Instance> myMarkedGizmo;
+	std::unique_ptr<LightOverlays> myLightOverlays;
 	LumoraMode myMode = LIGHT_MODE;
 	bool mySceneFlag = false;
 	FrameObserver myFrameObserver;

@@ -48,6 +48,24 @@ bool TakeIfNearer(const Intersection::Ray<float>& aRay, const Vector3<float>& aP
 	aLimitInOut = distance;
 	return true;
 }
+
+// The same for a light icon: accepted when the icon covers the pixel and the light lies
+// strictly nearer than aLimitInOut, which then becomes the new limit.
+bool TakeIconIfNearer(const LightOverlays::View& aView, const Intersection::Ray<float>& aRay,
+                      const Vector3<float>& aPosition, float aMouseX, float aMouseY, float& aLimitInOut)
+{
+	if (!LightOverlays::IconCovers(aView, aPosition, aMouseX, aMouseY))
+	{
+		return false;
+	}
+	const float distance = (aPosition - aRay.myOrigin).LengthFast();
+	if (!(distance < aLimitInOut))
+	{
+		return false;
+	}
+	aLimitInOut = distance;
+	return true;
+}
 } // namespace
 
 void LumoraWrapper::DoIntersection(float aMouseX, float aMouseY)
@@ -75,18 +93,26 @@ void LumoraWrapper::DoIntersection(float aMouseX, float aMouseY)
 	switch (myMode)
 	{
 	case LIGHT_MODE:
-		// Point and spot lights share one limit, so the nearest light of either kind wins.
+	{
+		// A light is hit by its marker box or, when icons are shown, by its icon; point and
+		// spot lights share one limit, so the nearest light of either kind wins.
+		const bool iconsFlag = myLightIconsFlag.load();
+		const LightOverlays::View view =
+		    LightOverlays::MakeView(*myCameraInstance, setup.myWidth, setup.myHeight);
+		const auto hit = [&](const Vector3<float>& aPosition) {
+			return TakeIfNearer(ray, aPosition, markerHalfExtents, limit) ||
+			       (iconsFlag && TakeIconIfNearer(view, ray, aPosition, aMouseX, aMouseY, limit));
+		};
 		for (int index = 0; index < myEnvironmentPointLights.Count(); ++index)
 		{
-			if (TakeIfNearer(ray, myEnvironmentPointLights[index].myPosition, markerHalfExtents, limit))
+			if (hit(myEnvironmentPointLights[index].myPosition))
 			{
 				myCurrentSelectedPoint = index;
 			}
 		}
 		for (int index = 0; index < myEnvironmentSpotLights.Count(); ++index)
 		{
-			const Vector3<float> position = myEnvironmentSpotLights[index].myOrientation.GetPosition();
-			if (TakeIfNearer(ray, position, markerHalfExtents, limit))
+			if (hit(myEnvironmentSpotLights[index].myOrientation.GetPosition()))
 			{
 				myCurrentSelectedSpot = index;
 			}
@@ -97,6 +123,7 @@ void LumoraWrapper::DoIntersection(float aMouseX, float aMouseY)
 			myCurrentSelectedPoint = -1;
 		}
 		break;
+	}
 	case NODE_MODE:
 		for (int index = 0; index < myNodes.Count(); ++index)
 		{

@@ -18,6 +18,7 @@
 #include <array>
 #include <atomic>
 #include <chrono>
+#include <cstdlib>
 #include <epoxy/egl.h>
 #include <filesystem>
 #include <functional>
@@ -32,7 +33,10 @@
 #include "core/Vector4.h"
 #include "editor/LumoraWrapper.h"
 #include "engine/CameraInstance.h"
+#include "engine/Engine.h"
 #include "platform/gpu/Device.h"
+#include "platform/gpu/Readback.h"
+#include "platform/gpu/TextureView.h"
 #include "support/GlSupport.h"
 #include "support/TestSupport.h"
 
@@ -78,6 +82,36 @@ protected:
 	virtual void PrepareData(const std::filesystem::path& aDataPath) { static_cast<void>(aDataPath); }
 
 	Lumora::LumoraWrapper& Facade() { return *myFacade; }
+	// The facade shut down and created again headless at another size (the log starts over).
+	void Recreate(int aWidth, int aHeight)
+	{
+		Lumora::LumoraWrapper::ShutDown();
+		myFacade = nullptr;
+		ASSERT_TRUE(Lumora::LumoraWrapper::Create(0, aWidth, aHeight)) << LogText();
+		myFacade = Lumora::LumoraWrapper::GetInstance();
+	}
+	// The back buffer as the last frame left it (RGBA, row 0 at the top, alpha 255), read with
+	// the GL context taken for the moment. With $LUMORA_TEST_FRAMES naming a folder, it is also
+	// written there as aName.png, for looking at.
+	std::vector<uint8_t> ReadFrame(const std::string& aName, int& aWidthOut, int& aHeightOut) const
+	{
+		Zeph::Engine* engine = Zeph::Engine::GetInstance();
+		std::vector<uint8_t> pixels;
+		engine->MakeContextCurrent();
+		const Gpu::RenderTargetView& view = *engine->GetBackBufferView();
+		aWidthOut = view.GetWidth();
+		aHeightOut = view.GetHeight();
+		const bool readFlag = Gpu::ReadRenderTarget(engine->GetContext(), view, pixels);
+		engine->ReleaseContext();
+		EXPECT_TRUE(readFlag) << "the back buffer could not be read";
+		pixels = TestSupport::Opaque(std::move(pixels));
+		if (const char* folder = std::getenv("LUMORA_TEST_FRAMES"); folder != nullptr && *folder != '\0')
+		{
+			Gpu::SavePng((std::filesystem::path(folder) / (aName + ".png")).string(), aWidthOut, aHeightOut,
+			             pixels.data());
+		}
+		return pixels;
+	}
 	const std::filesystem::path& ScratchPath() const { return myScratch.Path(); }
 	// The whole log as written so far (each entry is flushed as it is written).
 	std::string LogText() const { return TestSupport::ReadWholeFile(myScratch.File("DebugLogger.txt")); }

@@ -110,7 +110,7 @@ fragment PS_PointIcon
 	}
 }
 
-// A spot light: a lamp shade above a bulb that shines downward in three rays.
+// A spot light: a lamp head above the cone of light it throws (the cone in a dimmer tint).
 fragment PS_SpotIcon
 {
 	in vec2 vPixel;
@@ -118,16 +118,15 @@ fragment PS_SpotIcon
 
 	void main()
 	{
-		float shapeDistance = TrapezoidDistance(vPixel - vec2(0.0, 5.0), 8.5, 3.5, 4.5);
-		vec2 bulb = vec2(0.0, -1.5);
-		shapeDistance = min(shapeDistance, CircleDistance(vPixel - bulb, 3.0));
-		for (int ray = -1; ray <= 1; ++ray)
-		{
-			float angle = -1.57079633 + float(ray) * 0.6;
-			vec2 direction = vec2(cos(angle), sin(angle));
-			shapeDistance = min(shapeDistance, CapsuleDistance(vPixel, bulb + direction * 5.5, bulb + direction * 9.5, 1.25));
-		}
-		oColor = Glyph(shapeDistance);
+		float head = CircleDistance(vPixel - vec2(0.0, 6.5), 4.5);
+		float beam = TrapezoidDistance(vPixel - vec2(0.0, -3.0), 10.0, 2.5, 8.0);
+		float outside = min(head, beam);
+		float shape = 1.0 - smoothstep(ourOutlinePixels - 0.5, ourOutlinePixels + 0.5, outside);
+		vec3 color = mix(ourOutlineColor, Tint.rgb * 0.55, 1.0 - smoothstep(-0.5, 0.5, beam));
+		// The head keeps its own rim across the cone, so it reads as the lamp.
+		color = mix(color, ourOutlineColor, 1.0 - smoothstep(ourOutlinePixels - 0.5, ourOutlinePixels + 0.5, head));
+		color = mix(color, Tint.rgb, 1.0 - smoothstep(-0.5, 0.5, head));
+		oColor = vec4(color, shape * Tint.a);
 		if (oColor.a <= 0.0)
 		{
 			discard;
