@@ -148,10 +148,10 @@ std::unique_ptr<Zeph::ModelNode> MakeModel(Zeph::Effect& anEffect, const char* a
                                            Gpu::PrimitiveTopology aTopology)
 {
 	auto model = new Zeph::Model();
-	model->SetVertexData(aVertexCount, static_cast<int>(someVertices.size()) / aVertexCount, someVertices.data(),
-	                     static_cast<int>(someVertices.size()));
-	model->SetIndexData(static_cast<int>(someIndices.size()), Zeph::Model::ourIndexFormatR32, someIndices.data(),
-	                    static_cast<int>(someIndices.size() * sizeof(uint32_t)));
+	model->SetVertexData(aVertexCount, static_cast<int>(someVertices.size()) / aVertexCount,
+	                     someVertices.data(), static_cast<int>(someVertices.size()));
+	model->SetIndexData(static_cast<int>(someIndices.size()), Zeph::Model::ourIndexFormatR32,
+	                    someIndices.data(), static_cast<int>(someIndices.size() * sizeof(uint32_t)));
 	model->SetInputLayoutDesc(aLayout);
 	model->SetEffect(&anEffect);
 	Zeph::Surface surface;
@@ -192,8 +192,8 @@ std::unique_ptr<Zeph::ModelNode> MakeIconModel(Zeph::Effect& anEffect, const cha
 	    {Vector3<float>(1.0f, -1.0f, 0.0f), Vector2<float>(1.0f, -1.0f)},
 	};
 	return MakeModel(anEffect, aTechnique, ourIconLayout,
-	                 std::span(reinterpret_cast<const uint8_t*>(corners), sizeof(corners)), 4, {0, 1, 2, 0, 2, 3},
-	                 Gpu::PrimitiveTopology::TriangleList);
+	                 std::span(reinterpret_cast<const uint8_t*>(corners), sizeof(corners)), 4,
+	                 {0, 1, 2, 0, 2, 3}, Gpu::PrimitiveTopology::TriangleList);
 }
 
 // A placement whose x, y and z axes are the given rows, at aPosition.
@@ -293,10 +293,12 @@ bool LightOverlays::Init()
 	Destroy();
 	Zeph::Engine* engine = Zeph::Engine::GetInstance();
 	Zeph::Effect* effect =
-	    engine != nullptr ? engine->GetEffectContainer().GetEffect(Zeph::ShaderFiles[Zeph::EFFECT_OVERLAY]) : nullptr;
+	    engine != nullptr ? engine->GetEffectContainer().GetEffect(Zeph::ShaderFiles[Zeph::EFFECT_OVERLAY])
+	                      : nullptr;
 	if (effect == nullptr || effect->GetEffect() == nullptr)
 	{
-		Zeph::ReportError(__LINE__, "Lumora::LightOverlays::Init", "No overlay effect: light icons and wires are not drawn");
+		Zeph::ReportError(__LINE__, "Lumora::LightOverlays::Init",
+		                  "No overlay effect: light icons and wires are not drawn");
 		return false;
 	}
 	myShapes[POINT_ICON_SHAPE].myModel = MakeIconModel(*effect, "RenderPointIcon");
@@ -360,7 +362,8 @@ void LightOverlays::Queue(Zeph::Renderer& aRenderer, ShapeIndex aShape, const Ma
 }
 
 void LightOverlays::QueueIcon(Zeph::Renderer& aRenderer, const View& aView, IconKind aKind,
-                              const Vector3<float>& aPosition, const Vector4<float>& aColor, bool aSelectedFlag)
+                              const Vector3<float>& aPosition, const Vector4<float>& aColor,
+                              bool aSelectedFlag)
 {
 	const Vector4<float> clip = Vector4<float>(aPosition) * aView.myViewProjection;
 	if (!(clip.z >= 0.0f) || !(clip.w > 0.0f))
@@ -379,8 +382,8 @@ void LightOverlays::QueueIcon(Zeph::Renderer& aRenderer, const View& aView, Icon
 	Queue(aRenderer, aKind == SPOT_ICON ? SPOT_ICON_SHAPE : POINT_ICON_SHAPE, world, aColor);
 }
 
-void LightOverlays::QueueSpotTick(Zeph::Renderer& aRenderer, const View& aView, const Zeph::SpotLightData& aLight,
-                                  const Vector4<float>& aColor)
+void LightOverlays::QueueSpotTick(Zeph::Renderer& aRenderer, const View& aView,
+                                  const Zeph::SpotLightData& aLight, const Vector4<float>& aColor)
 {
 	Vector3<float> right;
 	Vector3<float> up;
@@ -403,7 +406,8 @@ void LightOverlays::QueuePointVolume(Zeph::Renderer& aRenderer, const Zeph::Poin
 	{
 		return;
 	}
-	Queue(aRenderer, SPHERE_SHAPE, Placement(ourX * reach, ourY * reach, ourZ * reach, aLight.myPosition), aColor);
+	Queue(aRenderer, SPHERE_SHAPE, Placement(ourX * reach, ourY * reach, ourZ * reach, aLight.myPosition),
+	      aColor);
 }
 
 void LightOverlays::QueueSpotVolume(Zeph::Renderer& aRenderer, const Zeph::SpotLightData& aLight,
@@ -429,7 +433,8 @@ void LightOverlays::QueueSpotVolume(Zeph::Renderer& aRenderer, const Zeph::SpotL
 	Queue(aRenderer, CONE_SHAPE, place(aLight.myAngles.y), aColor);
 	if (aLight.myAngles.x > aLight.myAngles.y)
 	{
-		Queue(aRenderer, RING_SHAPE, place(aLight.myAngles.x), Vector4<float>(aColor.x, aColor.y, aColor.z, aColor.w * 0.6f));
+		Queue(aRenderer, RING_SHAPE, place(aLight.myAngles.x),
+		      Vector4<float>(aColor.x, aColor.y, aColor.z, aColor.w * 0.6f));
 	}
 }
 } // namespace Lumora

@@ -91,8 +91,8 @@ public:
 	void BeginFrame();
 	// An icon at aPosition facing the camera, aColor its fill, ringed when selected. Nothing
 	// for a light behind the near plane.
-	void QueueIcon(Zeph::Renderer& aRenderer, const View& aView, IconKind aKind, const Vector3<float>& aPosition,
-	               const Vector4<float>& aColor, bool aSelectedFlag);
+	void QueueIcon(Zeph::Renderer& aRenderer, const View& aView, IconKind aKind,
+	               const Vector3<float>& aPosition, const Vector4<float>& aColor, bool aSelectedFlag);
 	// The tick from a spot light's centre along its direction, ourTickPixels long where it
 	// lies across the view.
 	void QueueSpotTick(Zeph::Renderer& aRenderer, const View& aView, const Zeph::SpotLightData& aLight,

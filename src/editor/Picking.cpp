@@ -92,8 +92,7 @@ void LumoraWrapper::DoIntersection(float aMouseX, float aMouseY)
 	const Vector3<float> markerHalfExtents(half, half, half);
 	switch (myMode)
 	{
-	case LIGHT_MODE:
-	{
+	case LIGHT_MODE: {
 		// A light is hit by its marker box or, when icons are shown, by its icon; point and
 		// spot lights share one limit, so the nearest light of either kind wins.
 		const bool iconsFlag = myLightIconsFlag.load();

@@ -45,7 +45,8 @@ bool LumoraWrapper::Resize(int aWidth, int aHeight)
 
 bool LumoraWrapper::ProjectToView(const Vector3<float>& aWorld, float& aX, float& aY) const
 {
-	const LightOverlays::View view = LightOverlays::MakeView(*myCameraInstance, myWidth.load(), myHeight.load());
+	const LightOverlays::View view =
+	    LightOverlays::MakeView(*myCameraInstance, myWidth.load(), myHeight.load());
 	float depth = 0.0f;
 	return LightOverlays::Project(view, aWorld, aX, aY, depth);
 }
@@ -88,7 +89,8 @@ void LumoraWrapper::QueueLightOverlays(int aSelectedPoint, int aSelectedSpot, bo
 	}
 	Zeph::Renderer& renderer = Zeph::Engine::GetInstance()->GetRenderer();
 	LightOverlays& overlays = *myLightOverlays;
-	const LightOverlays::View view = LightOverlays::MakeView(*myCameraInstance, myWidth.load(), myHeight.load());
+	const LightOverlays::View view =
+	    LightOverlays::MakeView(*myCameraInstance, myWidth.load(), myHeight.load());
 	overlays.BeginFrame();
 	const auto wireColor = [](const Vector4<float>& aLightColor, bool aSelectedFlag) {
 		Vector4<float> color = LightOverlays::DisplayColor(aLightColor);
@@ -146,8 +148,8 @@ void LumoraWrapper::QueueLightOverlays(int aSelectedPoint, int aSelectedSpot, bo
 				const Zeph::SpotLightData& light = myEnvironmentSpotLights[index];
 				const Vector4<float> color = LightOverlays::DisplayColor(light.myColor);
 				overlays.QueueSpotTick(renderer, view, light, color);
-				overlays.QueueIcon(renderer, view, LightOverlays::SPOT_ICON, light.myOrientation.GetPosition(),
-				                   color, selectedFlag);
+				overlays.QueueIcon(renderer, view, LightOverlays::SPOT_ICON,
+				                   light.myOrientation.GetPosition(), color, selectedFlag);
 			}
 		}
 	}

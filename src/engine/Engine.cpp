@@ -161,8 +161,9 @@ bool Engine::Resize(int aWidth, int aHeight)
 	myDevice.GetMaxFrameSize(maxWidth, maxHeight);
 	if (aWidth < 1 || aHeight < 1 || aWidth > maxWidth || aHeight > maxHeight)
 	{
-		ReportError(__LINE__, function, "Cannot draw a view of %dx%d pixels (1x1 to %dx%d); it stays at %dx%d",
-		            aWidth, aHeight, maxWidth, maxHeight, oldWidth, oldHeight);
+		ReportError(__LINE__, function,
+		            "Cannot draw a view of %dx%d pixels (1x1 to %dx%d); it stays at %dx%d", aWidth, aHeight,
+		            maxWidth, maxHeight, oldWidth, oldHeight);
 		return false;
 	}
 	// The back buffer goes before its successor is made; when that fails the old size

@@ -191,7 +191,9 @@ bool Renderer::Resize(int aWidth, int aHeight)
 	    [this](int aStepWidth, int aStepHeight) { return myOutlineHelper.Resize(aStepWidth, aStepHeight); },
 	    [this](int aStepWidth, int aStepHeight) { return myBloomManager.Resize(aStepWidth, aStepHeight); },
 	    [this](int aStepWidth, int aStepHeight) { return myHDRManager.Resize(aStepWidth, aStepHeight); },
-	    [this](int aStepWidth, int aStepHeight) { return myMotionBlurManager.Resize(aStepWidth, aStepHeight); },
+	    [this](int aStepWidth, int aStepHeight) {
+		    return myMotionBlurManager.Resize(aStepWidth, aStepHeight);
+	    },
 	    [this](int aStepWidth, int aStepHeight) { return mySSAOManager.Resize(aStepWidth, aStepHeight); },
 	    [this](int aStepWidth, int aStepHeight) {
 		    return myColorGradingManager.Resize(aStepWidth, aStepHeight);
@@ -250,8 +252,9 @@ bool Renderer::ResizeFrameTargets(int aWidth, int aHeight)
 	Gpu::DepthStencilView* depthView = nullptr;
 	Gpu::ShaderResourceView* depthShaderView = nullptr;
 	if (toneMapped->GetRenderTargetView() == nullptr ||
-	    !CreateDepthBuffer(aWidth, aHeight, "Zeph::Renderer::SetupSpecialDepthBuffer", "Failed at special depth",
-	                       {533, 552, 570}, depthTexture, depthView, depthShaderView))
+	    !CreateDepthBuffer(aWidth, aHeight, "Zeph::Renderer::SetupSpecialDepthBuffer",
+	                       "Failed at special depth", {533, 552, 570}, depthTexture, depthView,
+	                       depthShaderView))
 	{
 		if (depthTexture)
 		{

@@ -96,7 +96,8 @@ public:
 
 	RenderTargetCollector& GetRTC() { return myCollector; }
 	// aTint colours an instance of the overlay effect (the editor's light icons and wires).
-	void RenderLateInstance(Instance* anInstance, const Vector4<float>& aTint = Vector4<float>(1.0f, 1.0f, 1.0f, 1.0f));
+	void RenderLateInstance(Instance* anInstance,
+	                        const Vector4<float>& aTint = Vector4<float>(1.0f, 1.0f, 1.0f, 1.0f));
 	void RenderLateText(Text* aText);
 	int GetLateCount() const { return myLateItems.Count(); }
 	// Forgets the queued late items without drawing them (after a bake, whose queued

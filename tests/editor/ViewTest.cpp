@@ -34,7 +34,10 @@ struct Image
 	int myHeight = 0;
 	std::vector<uint8_t> myPixels;
 
-	const uint8_t* At(int anX, int aY) const { return &myPixels[(static_cast<size_t>(aY) * myWidth + anX) * 4]; }
+	const uint8_t* At(int anX, int aY) const
+	{
+		return &myPixels[(static_cast<size_t>(aY) * myWidth + anX) * 4];
+	}
 	// The pixels in the box around (anX, aY) of half-size aRadius that aTest accepts.
 	int Count(float anX, float aY, int aRadius, const std::function<bool(const uint8_t*)>& aTest) const
 	{
@@ -53,15 +56,18 @@ struct Image
 		return Count(myWidth / 2.0f, myHeight / 2.0f, std::max(myWidth, myHeight), aTest);
 	}
 	// The extent (width, height) of the pixels aTest accepts in the box, 0 x 0 when none.
-	std::pair<int, int> Extent(float anX, float aY, int aRadius, const std::function<bool(const uint8_t*)>& aTest) const
+	std::pair<int, int> Extent(float anX, float aY, int aRadius,
+	                           const std::function<bool(const uint8_t*)>& aTest) const
 	{
 		int left = myWidth;
 		int right = -1;
 		int top = myHeight;
 		int bottom = -1;
-		for (int y = std::max(0, static_cast<int>(aY) - aRadius); y <= std::min(myHeight - 1, static_cast<int>(aY) + aRadius); ++y)
+		for (int y = std::max(0, static_cast<int>(aY) - aRadius);
+		     y <= std::min(myHeight - 1, static_cast<int>(aY) + aRadius); ++y)
 		{
-			for (int x = std::max(0, static_cast<int>(anX) - aRadius); x <= std::min(myWidth - 1, static_cast<int>(anX) + aRadius); ++x)
+			for (int x = std::max(0, static_cast<int>(anX) - aRadius);
+			     x <= std::min(myWidth - 1, static_cast<int>(anX) + aRadius); ++x)
 			{
 				if (aTest(At(x, y)))
 				{
@@ -86,7 +92,8 @@ bool IsBlue(const uint8_t* aPixel)
 
 bool IsOrange(const uint8_t* aPixel)
 {
-	return aPixel[0] >= 120 && aPixel[0] > aPixel[2] + 60 && aPixel[1] > aPixel[2] + 20 && aPixel[1] + 20 < aPixel[0];
+	return aPixel[0] >= 120 && aPixel[0] > aPixel[2] + 60 && aPixel[1] > aPixel[2] + 20 &&
+	       aPixel[1] + 20 < aPixel[0];
 }
 
 // The selection ring's warm white-yellow.
@@ -154,7 +161,8 @@ std::pair<double, double> Difference(const Image& aFirst, const Image& aSecond, 
 		int largest = 0;
 		for (size_t channel = 0; channel < 3; ++channel)
 		{
-			const int difference = std::abs(aFirst.myPixels[pixel * 4 + channel] - aSecond.myPixels[pixel * 4 + channel]);
+			const int difference =
+			    std::abs(aFirst.myPixels[pixel * 4 + channel] - aSecond.myPixels[pixel * 4 + channel]);
 			sum += difference;
 			largest = std::max(largest, difference);
 		}
@@ -181,7 +189,7 @@ TEST_F(ViewTest, AResizedViewDrawsTheSceneFillingItAsAViewMadeAtThatSizeWithItsV
 		{
 			Zeph::Engine::GetInstance()->MakeContextCurrent();
 			ASSERT_TRUE(Zeph::FrameCapture::UploadUniformAmbient(0.8f, Vector3<float>(-20.0f, -5.0f, -20.0f),
-			                                                      Vector3<float>(40.0f, 20.0f, 40.0f)));
+			                                                     Vector3<float>(40.0f, 20.0f, 40.0f)));
 			Zeph::Engine::GetInstance()->ReleaseContext();
 		}
 		if (aSettingsFlag)
@@ -229,7 +237,8 @@ TEST_F(ViewTest, AResizedViewDrawsTheSceneFillingItAsAViewMadeAtThatSizeWithItsV
 TEST_F(ViewTest, BadSizesAreRefusedAndReportedAndTheViewDrawsOnAtItsSize)
 {
 	ASSERT_TRUE(Facade().Resize(200, 100));
-	const std::pair<int, int> badSizes[] = {{0, 100}, {200, 0}, {-5, 100}, {200, -1}, {1 << 20, 100}, {200, 1 << 20}};
+	const std::pair<int, int> badSizes[] = {{0, 100},  {200, 0},       {-5, 100},
+	                                        {200, -1}, {1 << 20, 100}, {200, 1 << 20}};
 	for (const auto& [width, height] : badSizes)
 	{
 		EXPECT_FALSE(Facade().Resize(width, height)) << width << " x " << height;
@@ -237,7 +246,8 @@ TEST_F(ViewTest, BadSizesAreRefusedAndReportedAndTheViewDrawsOnAtItsSize)
 	}
 	const std::string log = LogText();
 	size_t reports = 0;
-	for (size_t at = log.find("Cannot draw a view of"); at != std::string::npos; at = log.find("Cannot draw a view of", at + 1))
+	for (size_t at = log.find("Cannot draw a view of"); at != std::string::npos;
+	     at = log.find("Cannot draw a view of", at + 1))
 	{
 		++reports;
 	}
@@ -253,7 +263,8 @@ TEST_F(ViewTest, BadSizesAreRefusedAndReportedAndTheViewDrawsOnAtItsSize)
 	ASSERT_EQ(std::pair(image.myWidth, image.myHeight), std::pair(200, 100));
 	// The selected light's marker box is green.
 	const auto [x, y] = Pixel(PointPosition(0));
-	EXPECT_GT(image.Count(x, y, 2, [](const uint8_t* aPixel) { return aPixel[1] > 200 && aPixel[0] < 60; }), 12);
+	EXPECT_GT(image.Count(x, y, 2, [](const uint8_t* aPixel) { return aPixel[1] > 200 && aPixel[0] < 60; }),
+	          12);
 }
 
 // After a resize to another aspect, a light off the view's axis is drawn, projected and picked
@@ -284,7 +295,9 @@ TEST_F(ViewTest, PickingProjectionAndTheFrameFollowTheNewSize)
 	EXPECT_NEAR(lightX, 160.0f * (1.0f + 0.3f / (slope * aspect)), 0.01f);
 	Frames(1);
 	const Image image = Capture("resized-pick");
-	EXPECT_GT(image.Count(lightX, lightY, 2, [](const uint8_t* aPixel) { return aPixel[1] > 200 && aPixel[0] < 60; }), 12)
+	EXPECT_GT(image.Count(lightX, lightY, 2,
+	                      [](const uint8_t* aPixel) { return aPixel[1] > 200 && aPixel[0] < 60; }),
+	          12)
 	    << "the selected light's green marker is not at its pixel";
 	const float staleX = 160.0f * (1.0f + 0.3f / (slope * 16.0f / 9.0f));
 	Facade().DoIntersection(staleX, lightY);
@@ -299,17 +312,30 @@ TEST_F(ViewTest, GetCameraPlacementGivesWhatPlaceCameraTakesToPutTheCameraBack)
 {
 	const Zeph::CameraInstance& camera = *Facade().GetCameraInstance();
 	const auto matrices = [&camera] {
-		std::vector<float> values(camera.GetActualOrientation().myMatrix, camera.GetActualOrientation().myMatrix + 16);
+		std::vector<float> values(camera.GetActualOrientation().myMatrix,
+		                          camera.GetActualOrientation().myMatrix + 16);
 		values.insert(values.end(), camera.GetView().myMatrix, camera.GetView().myMatrix + 16);
 		return values;
 	};
 	const std::vector<std::pair<const char*, std::function<void()>>> moves = {
 	    {"as created", [] {}},
 	    {"tilted down", [this] { Facade().PitchCamera(0.4f); }},
-	    {"turned past a half turn", [this] { Facade().YawCamera(2.5f); Facade().YawCamera(1.9f); }},
-	    {"zoomed and strafed", [this] { Facade().Zoom(3.0f); Facade().Strafe(-2.0f); }},
+	    {"turned past a half turn",
+	     [this] {
+		     Facade().YawCamera(2.5f);
+		     Facade().YawCamera(1.9f);
+	     }},
+	    {"zoomed and strafed",
+	     [this] {
+		     Facade().Zoom(3.0f);
+		     Facade().Strafe(-2.0f);
+	     }},
 	    {"tilted up", [this] { Facade().PitchCamera(-1.1f); }},
-	    {"turned back", [this] { Facade().YawCamera(-4.0f); Facade().Strafe(1.5f); }},
+	    {"turned back",
+	     [this] {
+		     Facade().YawCamera(-4.0f);
+		     Facade().Strafe(1.5f);
+	     }},
 	};
 	for (const auto& [what, move] : moves)
 	{
@@ -440,8 +466,10 @@ TEST_F(ViewTest, IconsShowEachLightInItsHueAtItsPixelAtOneSizeNearAndFar)
 	{
 		for (int dx = -14; dx <= 14; ++dx)
 		{
-			const bool pointFlag = IsBlue(near.At(static_cast<int>(pointX) + dx, static_cast<int>(pointY) + dy));
-			const bool spotFlag = IsOrange(near.At(static_cast<int>(spotX) + dx, static_cast<int>(spotY) + dy));
+			const bool pointFlag =
+			    IsBlue(near.At(static_cast<int>(pointX) + dx, static_cast<int>(pointY) + dy));
+			const bool spotFlag =
+			    IsOrange(near.At(static_cast<int>(spotX) + dx, static_cast<int>(spotY) + dy));
 			either += pointFlag || spotFlag ? 1 : 0;
 			both += pointFlag && spotFlag ? 1 : 0;
 		}
@@ -498,13 +526,12 @@ TEST_F(ViewTest, LightWiresShowTheSelectedLightsReachOrEveryLightsInLightMode)
 	// Where the wires must pass: the point light's great circle across the view; the spot
 	// light's rim (reach 2.5 at the outer cone, cosine 0.8) seen edge-on, and a line from the
 	// apex to it.
-	const std::vector<Vector3<float>> sphere = {point + Vector3<float>(2.0f, 0.0f, 0.0f),
-	                                            point + Vector3<float>(-2.0f, 0.0f, 0.0f),
-	                                            point + Vector3<float>(0.0f, 2.0f, 0.0f),
-	                                            point + Vector3<float>(0.0f, -2.0f, 0.0f)};
-	const std::vector<Vector3<float>> cone = {apex + Vector3<float>(2.0f, 1.5f, 0.0f),
-	                                          apex + Vector3<float>(2.0f, -1.5f, 0.0f),
-	                                          apex + Vector3<float>(2.0f, 0.0f, 0.0f) * 0.5f + Vector3<float>(0.0f, 0.75f, 0.0f)};
+	const std::vector<Vector3<float>> sphere = {
+	    point + Vector3<float>(2.0f, 0.0f, 0.0f), point + Vector3<float>(-2.0f, 0.0f, 0.0f),
+	    point + Vector3<float>(0.0f, 2.0f, 0.0f), point + Vector3<float>(0.0f, -2.0f, 0.0f)};
+	const std::vector<Vector3<float>> cone = {
+	    apex + Vector3<float>(2.0f, 1.5f, 0.0f), apex + Vector3<float>(2.0f, -1.5f, 0.0f),
+	    apex + Vector3<float>(2.0f, 0.0f, 0.0f) * 0.5f + Vector3<float>(0.0f, 0.75f, 0.0f)};
 	// How many of the places show the hue within a pixel.
 	const auto found = [this](const Image& anImage, const std::vector<Vector3<float>>& somePlaces,
 	                          bool (*aHue)(const uint8_t*)) {
@@ -574,7 +601,8 @@ TEST_F(ViewTest, AClickOnAnIconSelectsItsLightAndTheNearerWhereIconsOverlap)
 		Facade().SetLightIconsFlag(iconsFlag);
 		for (const auto& click : clicks)
 		{
-			SCOPED_TRACE(std::to_string(click.myX) + ", " + std::to_string(click.myY) + (iconsFlag ? " icons" : " boxes"));
+			SCOPED_TRACE(std::to_string(click.myX) + ", " + std::to_string(click.myY) +
+			             (iconsFlag ? " icons" : " boxes"));
 			Facade().DoIntersection(click.myX, click.myY);
 			EXPECT_EQ(std::pair(Facade().GetSelectedPoint(), Facade().GetSelectedSpot()),
 			          iconsFlag ? click.myIcons : click.myBoxes);
