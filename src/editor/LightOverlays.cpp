@@ -26,7 +26,7 @@ namespace Lumora
 namespace
 {
 // Overlay.fx's ourHalfQuadPixels: the icon quad's corners lie this many pixels from its centre.
-constexpr float ourQuadHalfPixels = 16.0f;
+constexpr float ourQuadHalfPixels = 18.0f;
 constexpr int ourCircleSegments = 64;
 // The spot cone's lines from the apex to its rim.
 constexpr int ourConeLines = 4;
@@ -141,7 +141,7 @@ Wire MakeTick()
 
 // A model of the overlay effect drawn with aTechnique; its input layout is matched against
 // that technique, so the effect's current technique is switched for the making and put back.
-std::unique_ptr<Zeph::ModelNode> MakeModel(Zeph::Effect& anEffect, const char* aTechnique,
+std::unique_ptr<Zeph::ModelNode> MakeModel(Zeph::Effect& anEffect, const char* aName, const char* aTechnique,
                                            std::span<const Gpu::InputElement> aLayout,
                                            std::span<const uint8_t> someVertices, int aVertexCount,
                                            const std::vector<uint32_t>& someIndices,
@@ -161,7 +161,7 @@ std::unique_ptr<Zeph::ModelNode> MakeModel(Zeph::Effect& anEffect, const char* a
 	surface.SetPrimitiveTopology(aTopology);
 	model->GetSurfaces().Add(surface);
 	auto node = std::make_unique<Zeph::ModelNode>();
-	node->SetName(aTechnique);
+	node->SetName(aName);
 	node->SetModel(model);
 	anEffect.SetTechnique(aTechnique);
 	const bool madeFlag = model->Init();
@@ -175,11 +175,11 @@ std::unique_ptr<Zeph::ModelNode> MakeModel(Zeph::Effect& anEffect, const char* a
 	return node;
 }
 
-std::unique_ptr<Zeph::ModelNode> MakeWireModel(Zeph::Effect& anEffect, const Wire& aWire)
+std::unique_ptr<Zeph::ModelNode> MakeWireModel(Zeph::Effect& anEffect, const char* aName, const Wire& aWire)
 {
 	const std::span<const uint8_t> bytes(reinterpret_cast<const uint8_t*>(aWire.myVertices.data()),
 	                                     aWire.myVertices.size() * sizeof(WireVertex));
-	return MakeModel(anEffect, "Render", ourWireLayout, bytes, static_cast<int>(aWire.myVertices.size()),
+	return MakeModel(anEffect, aName, "Render", ourWireLayout, bytes, static_cast<int>(aWire.myVertices.size()),
 	                 aWire.myIndices, Gpu::PrimitiveTopology::LineList);
 }
 
@@ -191,7 +191,7 @@ std::unique_ptr<Zeph::ModelNode> MakeIconModel(Zeph::Effect& anEffect, const cha
 	    {Vector3<float>(1.0f, 1.0f, 0.0f), Vector2<float>(1.0f, 1.0f)},
 	    {Vector3<float>(1.0f, -1.0f, 0.0f), Vector2<float>(1.0f, -1.0f)},
 	};
-	return MakeModel(anEffect, aTechnique, ourIconLayout,
+	return MakeModel(anEffect, aTechnique, aTechnique, ourIconLayout,
 	                 std::span(reinterpret_cast<const uint8_t*>(corners), sizeof(corners)), 4,
 	                 {0, 1, 2, 0, 2, 3}, Gpu::PrimitiveTopology::TriangleList);
 }
@@ -304,10 +304,10 @@ bool LightOverlays::Init()
 	myShapes[POINT_ICON_SHAPE].myModel = MakeIconModel(*effect, "RenderPointIcon");
 	myShapes[SPOT_ICON_SHAPE].myModel = MakeIconModel(*effect, "RenderSpotIcon");
 	myShapes[HALO_SHAPE].myModel = MakeIconModel(*effect, "RenderIconHalo");
-	myShapes[SPHERE_SHAPE].myModel = MakeWireModel(*effect, MakeSphere());
-	myShapes[CONE_SHAPE].myModel = MakeWireModel(*effect, MakeCone());
-	myShapes[RING_SHAPE].myModel = MakeWireModel(*effect, MakeRing());
-	myShapes[TICK_SHAPE].myModel = MakeWireModel(*effect, MakeTick());
+	myShapes[SPHERE_SHAPE].myModel = MakeWireModel(*effect, "light-sphere-wire", MakeSphere());
+	myShapes[CONE_SHAPE].myModel = MakeWireModel(*effect, "light-cone-wire", MakeCone());
+	myShapes[RING_SHAPE].myModel = MakeWireModel(*effect, "light-ring-wire", MakeRing());
+	myShapes[TICK_SHAPE].myModel = MakeWireModel(*effect, "light-tick-wire", MakeTick());
 	for (const Shape& shape : myShapes)
 	{
 		if (!shape.myModel)

@@ -93,7 +93,8 @@ public:
 	// aspect, at aWidth x aHeight device pixels. With a window, the host resizes the window
 	// first; its surface follows. Claims after the frame. False, with the old size kept and
 	// the reason in the log, for a size below 1 or above what the GPU can draw, or when the
-	// targets cannot be made; the same size is true at once.
+	// targets cannot be made; the same size is true at once. A running bake holds the facade
+	// until it ends, so a host that resizes during a bake calls Resize afterwards.
 	bool Resize(int aWidth, int aHeight);
 	// The size drawn at, in device pixels; any thread.
 	int GetWidth() const { return myWidth.load(); }

@@ -82,12 +82,13 @@ protected:
 	virtual void PrepareData(const std::filesystem::path& aDataPath) { static_cast<void>(aDataPath); }
 
 	Lumora::LumoraWrapper& Facade() { return *myFacade; }
-	// The facade shut down and created again headless at another size (the log starts over).
-	void Recreate(int aWidth, int aHeight)
+	// The facade shut down and created again at another size, headless or on an X11 window
+	// (the log starts over).
+	void Recreate(int aWidth, int aHeight, uint64_t aWindow = 0)
 	{
 		Lumora::LumoraWrapper::ShutDown();
 		myFacade = nullptr;
-		ASSERT_TRUE(Lumora::LumoraWrapper::Create(0, aWidth, aHeight)) << LogText();
+		ASSERT_TRUE(Lumora::LumoraWrapper::Create(aWindow, aWidth, aHeight)) << LogText();
 		myFacade = Lumora::LumoraWrapper::GetInstance();
 	}
 	// The back buffer as the last frame left it (RGBA, row 0 at the top, alpha 255), read with

@@ -1,18 +1,22 @@
 // The renderer with a GPU (headless, 160 x 90): instances submitted to the collector with
 // their previous world, a room box drawn as lines over the frame, read back from the back
-// buffer. A late box over a lit scene is in the golden images. Every frame is saved under
-// /tmp/lumora-renderer-tests/ to be looked at.
+// buffer; a resize of the engine's view. A late box over a lit scene is in the golden images.
+// Every frame is saved under /tmp/lumora-renderer-tests/ to be looked at.
 #include <algorithm>
 #include <cstdint>
 #include <gtest/gtest.h>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "engine/Instance.h"
 #include "engine/Room.h"
+#include "engine/Texture.h"
 #include "engine/ViewFixture.h"
 #include "model/ModelFactory.h"
 #include "platform/gpu/Readback.h"
+#include "platform/gpu/TextureView.h"
+#include "renderer/ProbeHelper.h"
 #include "renderer/Renderer.h"
 #include "support/TestSupport.h"
 
@@ -130,4 +134,78 @@ TEST_F(RendererTest, BoxesKeepTheirPreviousWorldTheFrameEmptiesItsQueuesAndRoomB
 	}
 	EXPECT_EQ(rooms[0].GetDebugInstance()->GetModelNode(), rooms[1].GetDebugInstance()->GetModelNode());
 	EXPECT_EQ(Factory().GetCount(), baseline + 2u);
+}
+
+// A resize remakes every frame-sized target at the new size (the G-buffer, the shadow resolve,
+// each post stage's, the back buffer and depth) and keeps what does not follow the size: the
+// SH volume, the shadow caster, the SSAO directions. A shown debug tile draws the new target.
+// Refused sizes change nothing.
+TEST_F(RendererTest, AResizeRemakesTheFrameSizedTargetsAndKeepsTheVolumeAndTheStagesSettings)
+{
+	LUMORA_RETURN_UNLESS(Start());
+	Zeph::Engine* engine = Zeph::Engine::GetInstance();
+	ASSERT_TRUE(Zeph::FrameCapture::UploadUniformAmbient(0.5f, {-10.0f, -10.0f, -10.0f}, {20.0f, 20.0f, 20.0f}));
+	const Zeph::ProbeHelper* volume = Renderer().GetProbeHelper();
+	const Vector3<float> caster(0.3f, -0.9f, 0.1f);
+	Renderer().GetShadowHelper().SetCasterDirection(caster);
+	// The SSAO sample directions, component by component.
+	const auto directionsOf = [] {
+		std::vector<float> components;
+		for (const Vector4<float>& direction : Renderer().GetSSAOManager().GetRandomVectors())
+		{
+			components.insert(components.end(), {direction.x, direction.y, direction.z, direction.w});
+		}
+		return components;
+	};
+	const std::vector<float> directions = directionsOf();
+	Renderer().ShowDebugTexture("ssao");
+
+	constexpr int width = 200;
+	constexpr int height = 120;
+	ASSERT_TRUE(engine->Resize(width, height)) << TakeLog();
+	const auto sizeOf = [](const Zeph::Texture* aTexture) {
+		return aTexture != nullptr ? std::pair(static_cast<int>(aTexture->GetImageInfo().myWidth),
+		                                       static_cast<int>(aTexture->GetImageInfo().myHeight))
+		                           : std::pair(0, 0);
+	};
+	const std::pair size(width, height);
+	for (int slot = 0; slot < Zeph::DeferredRenderTargetHelper::SLOT_COUNT; ++slot)
+	{
+		EXPECT_EQ(sizeOf(Renderer().GetGBuffer().GetTarget(static_cast<Zeph::DeferredRenderTargetHelper::Slot>(slot))),
+		          size)
+		    << "G-buffer slot " << slot;
+	}
+	EXPECT_EQ(sizeOf(Renderer().GetShadowHelper().GetTarget()), size);
+	EXPECT_EQ(sizeOf(Renderer().GetSSAOManager().GetOcclusionBuffer()), size);
+	EXPECT_EQ(sizeOf(Renderer().GetOutlineManager().GetTarget()), size);
+	EXPECT_EQ(Renderer().GetHDRManager().GetLuminanceCount(), Zeph::HDR_Manager::ComputeLuminanceCount(width, height));
+	EXPECT_EQ(std::pair(Renderer().GetHDRManager().GetWidth(), Renderer().GetSSAOManager().GetHeight()), size);
+	EXPECT_EQ(std::pair(Renderer().GetWidth(), Renderer().GetHeight()), size);
+	EXPECT_EQ(std::pair(engine->GetBackBufferView()->GetWidth(), engine->GetBackBufferView()->GetHeight()), size);
+	EXPECT_EQ(std::pair(engine->GetSetupInfo().myWidth, engine->GetSetupInfo().myHeight), size);
+	EXPECT_EQ(Renderer().GetProbeHelper(), volume);
+	EXPECT_NE(volume->GetView(0), nullptr);
+	EXPECT_EQ(Renderer().GetShadowHelper().GetCasterDirection().x, caster.x);
+	EXPECT_EQ(directionsOf(), directions);
+
+	// Nothing is queued: the occlusion is open everywhere, and the tile in the top-left corner shows
+	// it white, drawn from the new buffer.
+	std::vector<uint8_t> pixels;
+	int frameWidth = 0;
+	int frameHeight = 0;
+	ASSERT_TRUE(Zeph::FrameCapture::RenderAndRead({}, 1, pixels, frameWidth, frameHeight));
+	ASSERT_EQ(std::pair(frameWidth, frameHeight), size);
+	const uint8_t* tile = &pixels[(20 * width + 20) * 4];
+	EXPECT_EQ(std::vector(tile, tile + 3), (std::vector<uint8_t>{255, 255, 255}));
+	Gpu::SavePng("/tmp/lumora-renderer-tests/resized-tile.png", width, height, TestSupport::Opaque(pixels).data());
+
+	EXPECT_FALSE(engine->Resize(0, height));
+	EXPECT_FALSE(engine->Resize(width, 1 << 20));
+	EXPECT_FALSE(Renderer().Resize(-3, height));
+	EXPECT_EQ(std::pair(Renderer().GetWidth(), Renderer().GetHeight()), size);
+	EXPECT_EQ(std::pair(engine->GetBackBufferView()->GetWidth(), engine->GetBackBufferView()->GetHeight()), size);
+	EXPECT_EQ(sizeOf(Renderer().GetGBuffer().GetTarget(Zeph::DeferredRenderTargetHelper::ALBEDO)), size);
+	const std::string log = TakeLog();
+	EXPECT_THAT(log, testing::HasSubstr("Cannot draw a view of 0x120 pixels"));
+	EXPECT_THAT(log, testing::HasSubstr("Cannot resize the frame to -3x120"));
 }

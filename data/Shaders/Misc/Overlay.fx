@@ -8,9 +8,9 @@
 
 uniform vec4 Tint = vec4(1.0);
 
-// Pixels from the quad's centre to its edge: the quad is drawn 32 pixels across, the
-// glyphs keep within a 12-pixel radius and the selection halo within 16.
-const float ourHalfQuadPixels = 16.0;
+// Pixels from the quad's centre to its edge: the quad is drawn 36 pixels across, the
+// glyphs keep within a 13-pixel radius with their outline and the selection halo within 17.
+const float ourHalfQuadPixels = 18.0;
 const float ourOutlinePixels = 1.5;
 const vec3 ourOutlineColor = vec3(0.02, 0.02, 0.03);
 
