@@ -179,8 +179,9 @@ std::unique_ptr<Zeph::ModelNode> MakeWireModel(Zeph::Effect& anEffect, const cha
 {
 	const std::span<const uint8_t> bytes(reinterpret_cast<const uint8_t*>(aWire.myVertices.data()),
 	                                     aWire.myVertices.size() * sizeof(WireVertex));
-	return MakeModel(anEffect, aName, "Render", ourWireLayout, bytes, static_cast<int>(aWire.myVertices.size()),
-	                 aWire.myIndices, Gpu::PrimitiveTopology::LineList);
+	return MakeModel(anEffect, aName, "Render", ourWireLayout, bytes,
+	                 static_cast<int>(aWire.myVertices.size()), aWire.myIndices,
+	                 Gpu::PrimitiveTopology::LineList);
 }
 
 std::unique_ptr<Zeph::ModelNode> MakeIconModel(Zeph::Effect& anEffect, const char* aTechnique)

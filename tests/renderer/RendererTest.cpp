@@ -144,7 +144,8 @@ TEST_F(RendererTest, AResizeRemakesTheFrameSizedTargetsAndKeepsTheVolumeAndTheSt
 {
 	LUMORA_RETURN_UNLESS(Start());
 	Zeph::Engine* engine = Zeph::Engine::GetInstance();
-	ASSERT_TRUE(Zeph::FrameCapture::UploadUniformAmbient(0.5f, {-10.0f, -10.0f, -10.0f}, {20.0f, 20.0f, 20.0f}));
+	ASSERT_TRUE(
+	    Zeph::FrameCapture::UploadUniformAmbient(0.5f, {-10.0f, -10.0f, -10.0f}, {20.0f, 20.0f, 20.0f}));
 	const Zeph::ProbeHelper* volume = Renderer().GetProbeHelper();
 	const Vector3<float> caster(0.3f, -0.9f, 0.1f);
 	Renderer().GetShadowHelper().SetCasterDirection(caster);
@@ -171,17 +172,21 @@ TEST_F(RendererTest, AResizeRemakesTheFrameSizedTargetsAndKeepsTheVolumeAndTheSt
 	const std::pair size(width, height);
 	for (int slot = 0; slot < Zeph::DeferredRenderTargetHelper::SLOT_COUNT; ++slot)
 	{
-		EXPECT_EQ(sizeOf(Renderer().GetGBuffer().GetTarget(static_cast<Zeph::DeferredRenderTargetHelper::Slot>(slot))),
+		EXPECT_EQ(sizeOf(Renderer().GetGBuffer().GetTarget(
+		              static_cast<Zeph::DeferredRenderTargetHelper::Slot>(slot))),
 		          size)
 		    << "G-buffer slot " << slot;
 	}
 	EXPECT_EQ(sizeOf(Renderer().GetShadowHelper().GetTarget()), size);
 	EXPECT_EQ(sizeOf(Renderer().GetSSAOManager().GetOcclusionBuffer()), size);
 	EXPECT_EQ(sizeOf(Renderer().GetOutlineManager().GetTarget()), size);
-	EXPECT_EQ(Renderer().GetHDRManager().GetLuminanceCount(), Zeph::HDR_Manager::ComputeLuminanceCount(width, height));
-	EXPECT_EQ(std::pair(Renderer().GetHDRManager().GetWidth(), Renderer().GetSSAOManager().GetHeight()), size);
+	EXPECT_EQ(Renderer().GetHDRManager().GetLuminanceCount(),
+	          Zeph::HDR_Manager::ComputeLuminanceCount(width, height));
+	EXPECT_EQ(std::pair(Renderer().GetHDRManager().GetWidth(), Renderer().GetSSAOManager().GetHeight()),
+	          size);
 	EXPECT_EQ(std::pair(Renderer().GetWidth(), Renderer().GetHeight()), size);
-	EXPECT_EQ(std::pair(engine->GetBackBufferView()->GetWidth(), engine->GetBackBufferView()->GetHeight()), size);
+	EXPECT_EQ(std::pair(engine->GetBackBufferView()->GetWidth(), engine->GetBackBufferView()->GetHeight()),
+	          size);
 	EXPECT_EQ(std::pair(engine->GetSetupInfo().myWidth, engine->GetSetupInfo().myHeight), size);
 	EXPECT_EQ(Renderer().GetProbeHelper(), volume);
 	EXPECT_NE(volume->GetView(0), nullptr);
@@ -197,13 +202,15 @@ TEST_F(RendererTest, AResizeRemakesTheFrameSizedTargetsAndKeepsTheVolumeAndTheSt
 	ASSERT_EQ(std::pair(frameWidth, frameHeight), size);
 	const uint8_t* tile = &pixels[(20 * width + 20) * 4];
 	EXPECT_EQ(std::vector(tile, tile + 3), (std::vector<uint8_t>{255, 255, 255}));
-	Gpu::SavePng("/tmp/lumora-renderer-tests/resized-tile.png", width, height, TestSupport::Opaque(pixels).data());
+	Gpu::SavePng("/tmp/lumora-renderer-tests/resized-tile.png", width, height,
+	             TestSupport::Opaque(pixels).data());
 
 	EXPECT_FALSE(engine->Resize(0, height));
 	EXPECT_FALSE(engine->Resize(width, 1 << 20));
 	EXPECT_FALSE(Renderer().Resize(-3, height));
 	EXPECT_EQ(std::pair(Renderer().GetWidth(), Renderer().GetHeight()), size);
-	EXPECT_EQ(std::pair(engine->GetBackBufferView()->GetWidth(), engine->GetBackBufferView()->GetHeight()), size);
+	EXPECT_EQ(std::pair(engine->GetBackBufferView()->GetWidth(), engine->GetBackBufferView()->GetHeight()),
+	          size);
 	EXPECT_EQ(sizeOf(Renderer().GetGBuffer().GetTarget(Zeph::DeferredRenderTargetHelper::ALBEDO)), size);
 	const std::string log = TakeLog();
 	EXPECT_THAT(log, testing::HasSubstr("Cannot draw a view of 0x120 pixels"));
