@@ -1,7 +1,7 @@
 #pragma once
 // LightOverlays: what the editor draws over the finished frame to show its lights. Every
 // point and spot light gets an icon of constant size on screen (a bulb with eight rays, or
-// a lamp shade shining down with a short tick along the spot's direction) in the light's
+// a lamp throwing a cone of light, with a short tick along the spot's direction) in the light's
 // colour, the selected one inside a ring; and a light's reach is drawn as wire: three great
 // circles of a point light's falloff sphere, a spot light's outer cone out to its reach with
 // a ring where it meets the sphere of that reach, and the ring of the inner cone there.

@@ -20,7 +20,7 @@
 // Threads. Update and Render are frame steps: they run only when the facade is free
 // and no claim is waiting, and return at once otherwise (the frame is dropped, not
 // queued). Editing operations and saving claim the facade: they wait (polling every
-// millisecond) until it is free, take it, work and free it. Loading and the settings
+// millisecond) until it is free, take it, work and free it. Loading, Resize and the settings
 // updates claim after the frame: they wait until no frame is being rendered and no
 // update runs, then claim. Picking and the queries take nothing. Whoever holds the busy
 // flag makes the engine's GL context current on its thread and lets it go when it
@@ -120,8 +120,8 @@ public:
 	// the point lies behind the camera.
 	bool ProjectToView(const Vector3<float>& aWorld, float& aX, float& aY) const;
 	// Every point and spot light drawn over the frame as an icon about 24 pixels across
-	// whatever its distance (a bulb with rays, or a lamp shade with a tick along the spot's
-	// direction), in the light's colour, the selected one in a ring; a click on an icon picks
+	// whatever its distance (a bulb with rays, or a lamp throwing a cone of light with a tick
+	// along the spot's direction), in the light's colour, the selected one in a ring; a click on an icon picks
 	// its light. In LIGHT_MODE only, where the icons take the marker boxes' place. Off by default.
 	void SetLightIconsFlag(bool aFlag);
 	// Which lights show their reach as wire over the frame, in LIGHT_MODE: a point light's
