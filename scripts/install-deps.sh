@@ -22,6 +22,8 @@ PACKAGES=(
 	libepoxy-dev libegl-dev libgl1-mesa-dri libegl-mesa0 libpng-dev
 	# windows to present into (X11), and a virtual X server for the window tests
 	libx11-dev xvfb
+	# the desktop editor: Qt 6 Widgets and Qt Test (its window tests run under Xvfb)
+	qt6-base-dev
 	# screen text: fontconfig finds families, FreeType rasterises; Liberation stands in for Arial
 	libfontconfig-dev libfreetype-dev fonts-liberation
 )

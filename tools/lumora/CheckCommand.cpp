@@ -1,6 +1,8 @@
 // lumora check: the level read the way the editor reads it, with every report made
 // non-fatal and listed, and what loading passes over in silence (LevelCheck.h).
 #include <cstdio>
+#include <nlohmann/json.hpp>
+#include <regex>
 #include <string>
 #include <vector>
 
@@ -10,7 +12,43 @@
 
 namespace LumoraTool
 {
-int RunCheck(const std::string& aLevel)
+namespace
+{
+// One problem line as a record: the file it names (the first data/... path), the element or
+// attribute it names (the first quoted name), and the line itself.
+nlohmann::json ProblemRecord(const std::string& aProblem, bool aBakedFlag)
+{
+	static const std::regex ourFile(R"(data/[^\s:,;"']+)");
+	static const std::regex ourElement(R"re("([A-Za-z_][-A-Za-z0-9_.:]*)")re");
+	std::smatch match;
+	nlohmann::json record;
+	record["message"] = aProblem;
+	record["file"] = std::regex_search(aProblem, match, ourFile) ? match.str(0) : "";
+	record["element"] = std::regex_search(aProblem, match, ourElement) ? match.str(1) : "";
+	record["baked"] = aBakedFlag;
+	return record;
+}
+
+int PrintJson(const std::string& aLevel, const LevelReport& aReport)
+{
+	nlohmann::json out;
+	out["level"] = aLevel;
+	out["problems"] = nlohmann::json::array();
+	for (const std::string& problem : aReport.myProblems)
+	{
+		out["problems"].push_back(ProblemRecord(problem, false));
+	}
+	for (const std::string& problem : aReport.myBakedProblems)
+	{
+		out["problems"].push_back(ProblemRecord(problem, true));
+	}
+	out["notes"] = aReport.myNotes;
+	std::printf("%s\n", out.dump(1).c_str());
+	return aReport.myProblems.empty() && aReport.myBakedProblems.empty() ? 0 : 1;
+}
+} // namespace
+
+int RunCheck(const std::string& aLevel, bool aJsonFlag)
 {
 	if (const std::string problem = LevelFolderProblem(aLevel); !problem.empty())
 	{
@@ -23,6 +61,10 @@ int RunCheck(const std::string& aLevel)
 		return 1;
 	}
 	const LevelReport report = CheckLevel(session, aLevel);
+	if (aJsonFlag)
+	{
+		return PrintJson(aLevel, report);
+	}
 	std::printf("level %s: the catalogues data/XML/EntityTypes.xml and DecalTypes.xml, and rooms.xml, "
 	            "entities.xml, lights.xml, nodegraph.xml, decals.xml, ambient.sh, bake.json and the rooms' "
 	            "cubemaps\n",

@@ -59,8 +59,9 @@ struct RenderOptions
 // One frame of the level to a PNG.
 int RunRender(const RenderOptions& someOptions);
 
-// Reads the level's files and both catalogues and lists every problem.
-int RunCheck(const std::string& aLevel);
+// Reads the level's files and both catalogues and lists every problem (as JSON records with
+// aJsonFlag: what the desktop editor reads).
+int RunCheck(const std::string& aLevel, bool aJsonFlag);
 
 // Describes an ambient.sh, a DDS, an .al model or a bake record (bake.json).
 int RunInfo(const std::string& aPath);

@@ -124,6 +124,9 @@ int main(int argc, char** argv)
 	CLI::App* checkCommand = app.add_subcommand(
 	    "check", "Read a level's files and both catalogues; list every problem (exit 1 if any)");
 	checkCommand->add_option("LEVEL", checkLevel, "Level folder name under data/XML/levels/")->required();
+	bool checkJson = false;
+	checkCommand->add_flag("--json", checkJson,
+	                       "Print the problems as JSON records (message, file, element, baked) and the notes");
 
 	std::string infoPath;
 	CLI::App* infoCommand = app.add_subcommand(
@@ -210,7 +213,7 @@ int main(int argc, char** argv)
 	}
 	if (*checkCommand)
 	{
-		return LumoraTool::RunCheck(checkLevel);
+		return LumoraTool::RunCheck(checkLevel, checkJson);
 	}
 	if (*infoCommand)
 	{
