@@ -8,6 +8,7 @@
 #include <gmock/gmock-matchers.h>
 #include <gtest/gtest.h>
 #include <initializer_list>
+#include <nlohmann/json.hpp>
 #include <string>
 #include <sys/wait.h>
 #include <vector>
@@ -219,6 +220,23 @@ TEST_F(CommandLineTest, BadInputGetsAClearLineAndAFailingExitTheSmallLevelBakesA
 	ExpectRun(damaged, 1, damaged.myOutput,
 	          {"2 problems:", "[falloff] in [point-light] in [data/XML/levels/sample_small/lights.xml]",
 	           "sample_small/ambient.sh is shorter than its 36-byte header"});
+	// The same as records, for the desktop editor: the file and the element taken out of the line,
+	// the damaged ambient.sh marked as a baked file's problem.
+	const ToolRun records = Run("check --json sample_small");
+	ASSERT_EQ(records.myStatus, 1) << records.myErrors;
+	const nlohmann::json listedRecords = nlohmann::json::parse(records.myOutput, nullptr, false);
+	ASSERT_FALSE(listedRecords.is_discarded()) << records.myOutput;
+	ASSERT_EQ(listedRecords["problems"].size(), 2u) << records.myOutput;
+	for (const nlohmann::json& problem : listedRecords["problems"])
+	{
+		const bool bakedFlag = problem["baked"].get<bool>();
+		EXPECT_EQ(problem["file"], bakedFlag ? "data/XML/levels/sample_small/ambient.sh"
+		                                     : "data/XML/levels/sample_small/lights.xml");
+		if (!bakedFlag)
+		{
+			EXPECT_EQ(problem["element"], "falloff");
+		}
+	}
 	const ToolRun refusedRender = Run("render sample_small --out y.png");
 	ExpectRun(refusedRender, 1, refusedRender.myErrors, {"lumora: level 'sample_small' has 2 problem(s)"});
 	EXPECT_THAT(refusedRender.myErrors, testing::Not(HasSubstr("Call stack")));

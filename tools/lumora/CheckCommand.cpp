@@ -15,16 +15,18 @@ namespace LumoraTool
 namespace
 {
 // One problem line as a record: the file it names (the first data/... path), the element or
-// attribute it names (the first quoted name), and the line itself.
+// attribute it names (the first name in brackets, as the XML reader names them, or in quotes),
+// and the line itself.
 nlohmann::json ProblemRecord(const std::string& aProblem, bool aBakedFlag)
 {
-	static const std::regex ourFile(R"(data/[^\s:,;"']+)");
-	static const std::regex ourElement(R"re("([A-Za-z_][-A-Za-z0-9_.:]*)")re");
+	static const std::regex ourFile(R"(data/[^\s:,;"'\[\]()]+)");
+	static const std::regex ourElement(R"re(\[([A-Za-z_][-A-Za-z0-9_.:]*)\]|"([A-Za-z_][-A-Za-z0-9_.:]*)")re");
 	std::smatch match;
 	nlohmann::json record;
 	record["message"] = aProblem;
 	record["file"] = std::regex_search(aProblem, match, ourFile) ? match.str(0) : "";
-	record["element"] = std::regex_search(aProblem, match, ourElement) ? match.str(1) : "";
+	record["element"] =
+	    std::regex_search(aProblem, match, ourElement) ? (match[1].matched ? match.str(1) : match.str(2)) : "";
 	record["baked"] = aBakedFlag;
 	return record;
 }
