@@ -3,6 +3,7 @@
 #include <cmath>
 #include <cstdio>
 #include <cstring>
+#include <filesystem>
 #include <locale>
 #include <sstream>
 
@@ -126,8 +127,16 @@ void XML::LoadDocument(std::string aFileName)
 	myElementStack.RemoveAll();
 
 	bool loadedFlag = false;
-	std::string tooDeep;
-	if (FILE* file = std::fopen(Paths::Resolve(aFileName).c_str(), "rb"))
+	// Why the file was not read, beyond that it could not be opened.
+	std::string reason;
+	// A folder opens as a file on Linux and then measures as endless: only a regular file is read.
+	const std::string resolved = Paths::Resolve(aFileName);
+	std::error_code ignored;
+	if (!std::filesystem::is_regular_file(resolved, ignored) && std::filesystem::exists(resolved, ignored))
+	{
+		reason = ": it is not a file";
+	}
+	else if (FILE* file = std::fopen(resolved.c_str(), "rb"))
 	{
 		// TinyXML parses nested elements by recursion: a file nested thousands deep would
 		// overflow the stack inside the parser, so such a file is refused before parsing.
@@ -135,7 +144,7 @@ void XML::LoadDocument(std::string aFileName)
 		const int line = XmlScan::FindTooDeep(text, XmlScan::ourMaxDepth);
 		if (line > 0)
 		{
-			tooDeep = ": " + XmlScan::Describe(line, XmlScan::ourMaxDepth);
+			reason = ": " + XmlScan::Describe(line, XmlScan::ourMaxDepth);
 		}
 		else if (std::fseek(file, 0, SEEK_SET) == 0)
 		{
@@ -153,7 +162,7 @@ void XML::LoadDocument(std::string aFileName)
 			myDocument->SetError(TiXmlBase::TIXML_ERROR_OPENING_FILE, nullptr, nullptr,
 			                     TIXML_ENCODING_UNKNOWN);
 		}
-		Error("Could not open file [" + aFileName + "]" + tooDeep);
+		Error("Could not open file [" + aFileName + "]" + reason);
 	}
 }
 

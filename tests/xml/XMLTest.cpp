@@ -49,6 +49,9 @@ TEST_F(XMLFixture, EveryFailureReportsOnceWithItsMessageAndNamesAsGiven)
 	// ExitChild `exits` times, then the operation, which must make exactly one report: the message.
 	const std::tuple<const char*, const char*, int, std::function<void(XML&)>, std::string> rows[] = {
 	    {nullptr, "", 0, [&](XML&) { XML absent(missing); }, "Could not open file [" + missing + "]"},
+	    // A folder where the file should be opens on Linux and measures as endless: refused, not read.
+	    {nullptr, "", 0, [&](XML&) { XML folder(myScratch.Path().string()); },
+	     "Could not open file [" + myScratch.Path().string() + "]: it is not a file"},
 	    {nullptr, "", 0, [](XML& x) { x.GetAttribute<int>("id"); }, "No Current Element"},
 	    // A single-letter name (a vector component) is left out of the message, a longer one is not.
 	    {"bare", "", 0, [](XML& x) { x.GetAttribute<float>("x"); }, "Could not get attribute in [bare]" + in},

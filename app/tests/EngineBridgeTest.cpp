@@ -1,0 +1,331 @@
+// The document and the real engine kept in step through the engine thread (headless, no
+// window): after any run of additions, removals, changes, undos and redos, the engine's lists
+// hold exactly what the document says, in the same order. Picking, loading and saving through
+// the thread answer on this thread.
+#include <QDir>
+#include <QFile>
+#include <QProcess>
+#include <QRandomGenerator>
+#include <QSignalSpy>
+#include <QTemporaryDir>
+#include <QTest>
+#include <cmath>
+
+#include "bridge/EngineThread.h"
+#include "core/Document.h"
+#include "editor/LumoraWrapper.h"
+
+using namespace LumoraEditor;
+
+namespace
+{
+// The engine's own lists, read straight from the facade (not through the thread's readers).
+Document::ObjectLists EngineLists(Lumora::LumoraWrapper& aFacade)
+{
+	Document::ObjectLists lists;
+	for (int index = 0; index < aFacade.GetPointLights().Count(); ++index)
+	{
+		const auto& light = aFacade.GetPointLights()[index];
+		ObjectState state;
+		state.myPosition = {light.myPosition.x, light.myPosition.y, light.myPosition.z};
+		state.myColor = {light.myColor.x, light.myColor.y, light.myColor.z};
+		state.myFalloff = light.myFalloff;
+		lists[0].push_back(state);
+	}
+	for (int index = 0; index < aFacade.GetSpotLights().Count(); ++index)
+	{
+		const auto& light = aFacade.GetSpotLights()[index];
+		ObjectState state;
+		state.myKind = Kind::SPOT_LIGHT;
+		const auto position = light.myOrientation.GetPosition();
+		const auto forward = light.myOrientation.GetForward();
+		state.myPosition = {position.x, position.y, position.z};
+		state.myColor = {light.myColor.x, light.myColor.y, light.myColor.z};
+		state.myFalloff = light.myFalloff;
+		state.myDirection = {forward.x, forward.y, forward.z};
+		state.myInnerCos = light.myAngles.x;
+		state.myOuterCos = light.myAngles.y;
+		lists[1].push_back(state);
+	}
+	for (int index = 0; index < aFacade.GetDecals().Count(); ++index)
+	{
+		const auto& decal = aFacade.GetDecals()[index];
+		ObjectState state;
+		state.myKind = Kind::DECAL;
+		state.myPosition = {decal.myPosition.x, decal.myPosition.y, decal.myPosition.z};
+		state.myColor = {decal.myColor.x, decal.myColor.y, decal.myColor.z};
+		state.myDirection = {decal.myNorm.x, decal.myNorm.y, decal.myNorm.z};
+		state.myDecalType = decal.myTypeId;
+		state.mySize = decal.mySize;
+		state.myDepth = decal.myDepth;
+		lists[2].push_back(state);
+	}
+	for (int index = 0; index < aFacade.GetNodes().Count(); ++index)
+	{
+		const auto& position = aFacade.GetNodes()[index].GetPosition();
+		ObjectState state;
+		state.myKind = Kind::PATH_NODE;
+		state.myPosition = {position.x, position.y, position.z};
+		lists[3].push_back(state);
+	}
+	return lists;
+}
+
+bool Near(const std::array<float, 3>& a, const std::array<float, 3>& b, float aTolerance)
+{
+	return std::abs(a[0] - b[0]) <= aTolerance && std::abs(a[1] - b[1]) <= aTolerance &&
+	       std::abs(a[2] - b[2]) <= aTolerance;
+}
+
+std::array<float, 3> Unit(const std::array<float, 3>& aVector)
+{
+	const float length =
+	    std::sqrt(aVector[0] * aVector[0] + aVector[1] * aVector[1] + aVector[2] * aVector[2]);
+	return {aVector[0] / length, aVector[1] / length, aVector[2] / length};
+}
+
+// What the engine holds agrees with what the document says: exactly for positions, colours and
+// sizes; directions as the engine keeps them (a spot light's as a unit basis, a decal's at its
+// old length), so by their unit vectors.
+QString Disagreement(const ObjectState& anEngine, const ObjectState& aDocument)
+{
+	if (anEngine.myPosition != aDocument.myPosition)
+	{
+		return "position";
+	}
+	if (anEngine.myKind == Kind::PATH_NODE)
+	{
+		return {};
+	}
+	if (anEngine.myColor != aDocument.myColor)
+	{
+		return "colour";
+	}
+	if (HasFalloff(anEngine.myKind) && anEngine.myFalloff != aDocument.myFalloff)
+	{
+		return "falloff";
+	}
+	if (HasDirection(anEngine.myKind) &&
+	    !Near(Unit(anEngine.myDirection), Unit(aDocument.myDirection), 1e-5f))
+	{
+		return "direction";
+	}
+	if (anEngine.myKind == Kind::SPOT_LIGHT &&
+	    (anEngine.myInnerCos != aDocument.myInnerCos || anEngine.myOuterCos != aDocument.myOuterCos))
+	{
+		return "angles";
+	}
+	if (anEngine.myKind == Kind::DECAL &&
+	    (anEngine.myDecalType != aDocument.myDecalType || anEngine.mySize != aDocument.mySize ||
+	     anEngine.myDepth != aDocument.myDepth))
+	{
+		return "decal values";
+	}
+	return {};
+}
+} // namespace
+
+class EngineBridgeTest : public QObject
+{
+	Q_OBJECT
+
+private:
+	QTemporaryDir myScratch;
+	QString myStartFolder;
+	std::unique_ptr<EngineThread> myEngine;
+	std::unique_ptr<Document> myDocument;
+	QStringList myDecalTypes;
+
+	void Wait(std::function<void(Lumora::LumoraWrapper&)> aWork = [](Lumora::LumoraWrapper&) {})
+	{
+		bool doneFlag = false;
+		myEngine->Run(std::move(aWork), [&doneFlag] { doneFlag = true; });
+		QTRY_VERIFY_WITH_TIMEOUT(doneFlag, 30000);
+	}
+
+	// Fails with the first object on which the engine and the document disagree.
+	void ExpectInStep(const QString& aAfter)
+	{
+		Document::ObjectLists engine;
+		Wait([&engine](Lumora::LumoraWrapper& aFacade) { engine = EngineLists(aFacade); });
+		for (int kind = 0; kind < ourKindCount; ++kind)
+		{
+			QVERIFY2(static_cast<int>(engine[kind].size()) == myDocument->Count(static_cast<Kind>(kind)),
+			         qPrintable(QStringLiteral("%1: %2 %3s in the engine, %4 in the document")
+			                        .arg(aAfter, KindName(static_cast<Kind>(kind)))
+			                        .arg(engine[kind].size())
+			                        .arg(myDocument->Count(static_cast<Kind>(kind)))));
+			for (int index = 0; index < myDocument->Count(static_cast<Kind>(kind)); ++index)
+			{
+				const ObjectState* state = myDocument->Find(myDocument->IdAt(static_cast<Kind>(kind), index));
+				const QString what = Disagreement(engine[kind][index], *state);
+				QVERIFY2(what.isEmpty(), qPrintable(QStringLiteral("%1: %2 %3 differs in its %4")
+				                                        .arg(aAfter, KindName(static_cast<Kind>(kind)))
+				                                        .arg(index)
+				                                        .arg(what)));
+			}
+		}
+	}
+
+	ObjectState RandomState(Kind aKind, QRandomGenerator& aRandom)
+	{
+		const auto value = [&aRandom](double aLow, double aHigh) {
+			return static_cast<float>(aLow + (aHigh - aLow) * aRandom.generateDouble());
+		};
+		ObjectState state;
+		state.myKind = aKind;
+		state.myPosition = {value(-5, 5), value(0, 3), value(-5, 5)};
+		state.myColor = {value(0, 4), value(0, 4), value(0, 4)};
+		state.myFalloff = value(0.5, 10);
+		state.myDirection = Unit({value(-1, 1), value(-1, -0.2), value(-1, 1)});
+		state.myInnerCos = value(0.9, 0.99);
+		state.myOuterCos = value(0.5, 0.85);
+		state.myDecalType =
+		    myDecalTypes.isEmpty()
+		        ? std::string()
+		        : myDecalTypes[aRandom.bounded(static_cast<int>(myDecalTypes.size()))].toStdString();
+		state.mySize = value(0.2, 3);
+		state.myDepth = value(0.1, 1);
+		return state;
+	}
+
+private slots:
+	void initTestCase()
+	{
+		QVERIFY(myScratch.isValid());
+		// Saving writes into the level: a copy of data/ takes it.
+		QVERIFY(QProcess::execute(QStringLiteral("cp"),
+		                          {QStringLiteral("-r"), QStringLiteral("data"), myScratch.path()}) == 0);
+		myStartFolder = QDir::currentPath();
+		QVERIFY(QDir::setCurrent(myScratch.path()));
+		myEngine = std::make_unique<EngineThread>();
+		myDocument = std::make_unique<Document>(*myEngine);
+		QSignalSpy started(myEngine.get(), &EngineThread::started);
+		myEngine->Start(0, QSize(320, 180));
+		QVERIFY(started.wait(60000));
+		if (!started.front().at(0).toBool())
+		{
+			QSKIP("no OpenGL 4.5 context here");
+		}
+		bool loadedFlag = false;
+		myEngine->LoadLevel(QStringLiteral("sample_small"),
+		                    [this, &loadedFlag](const LevelSnapshot& aSnapshot) {
+			                    QVERIFY(aSnapshot.myProblems.isEmpty());
+			                    myDocument->Reset(aSnapshot.myLevel, aSnapshot.myObjects);
+			                    myDecalTypes = aSnapshot.myDecalTypes;
+			                    loadedFlag = true;
+		                    });
+		QTRY_VERIFY_WITH_TIMEOUT(loadedFlag, 60000);
+		// The snapshot read through the thread is what the engine holds.
+		QCOMPARE(myDocument->Count(Kind::POINT_LIGHT), 3);
+		QCOMPARE(myDocument->Count(Kind::SPOT_LIGHT), 2);
+		QVERIFY(!myDecalTypes.isEmpty());
+		ExpectInStep("the level loaded");
+	}
+
+	void cleanupTestCase()
+	{
+		myDocument.reset();
+		myEngine.reset();
+		QDir::setCurrent(myStartFolder);
+	}
+
+	void AnyRunOfEditsKeepsTheEngineInStep()
+	{
+		QRandomGenerator random(20261124);
+		static constexpr Kind ourKinds[] = {Kind::POINT_LIGHT, Kind::SPOT_LIGHT, Kind::DECAL,
+		                                    Kind::PATH_NODE};
+		for (int step = 0; step < 120; ++step)
+		{
+			const Kind kind = ourKinds[random.bounded(4)];
+			const int count = myDocument->Count(kind);
+			QString done;
+			switch (random.bounded(6))
+			{
+			case 0:
+				myDocument->Add(RandomState(kind, random), "Add");
+				done = QStringLiteral("add %1").arg(KindName(kind));
+				break;
+			case 1:
+				if (count > 0)
+				{
+					// Path nodes can only go from the end; others from anywhere (the last moves in).
+					const int index =
+					    kind == Kind::PATH_NODE ? count - 1 : static_cast<int>(random.bounded(count));
+					QVERIFY(myDocument->Remove(myDocument->IdAt(kind, index)));
+					done = QStringLiteral("remove %1 %2").arg(KindName(kind)).arg(index);
+				}
+				break;
+			case 2:
+			case 3:
+				if (count > 0)
+				{
+					const int index = static_cast<int>(random.bounded(count));
+					myDocument->SetState(myDocument->IdAt(kind, index), RandomState(kind, random), "Change");
+					done = QStringLiteral("change %1 %2").arg(KindName(kind)).arg(index);
+				}
+				break;
+			case 4:
+				myDocument->History().undo();
+				done = QStringLiteral("undo");
+				break;
+			case 5:
+				myDocument->History().redo();
+				done = QStringLiteral("redo");
+				break;
+			}
+			ExpectInStep(QStringLiteral("step %1 (%2)").arg(step).arg(done));
+		}
+		// All the way back: the level as it was loaded.
+		while (myDocument->History().canUndo())
+		{
+			myDocument->History().undo();
+		}
+		ExpectInStep("undoing everything");
+		QCOMPARE(myDocument->Count(Kind::POINT_LIGHT), 3);
+	}
+
+	void PicksAndSavesAnswerOnThisThread()
+	{
+		// The first point light, projected and clicked in the lights' mode: the pick names it.
+		myDocument->SetMode(0);
+		float x = 0.0f;
+		float y = 0.0f;
+		bool inViewFlag = false;
+		Wait([&](Lumora::LumoraWrapper& aFacade) {
+			const auto position = aFacade.GetPointLights()[0].myPosition;
+			aFacade.PlaceCamera(position + Vector3<float>(0.0f, 0.0f, -3.0f), 0.0f, 0.0f);
+			inViewFlag = aFacade.ProjectToView(position, x, y);
+		});
+		QVERIFY(inViewFlag);
+		std::pair<Kind, int> picked{Kind::DECAL, -2};
+		myEngine->Pick(x, y, [&picked](Kind aKind, int anIndex) { picked = {aKind, anIndex}; });
+		QTRY_VERIFY_WITH_TIMEOUT(picked.second != -2, 30000);
+		QCOMPARE(picked.first, Kind::POINT_LIGHT);
+		QCOMPARE(picked.second, 0);
+
+		// A change saved: the file holds it; a save the disk refuses (a folder where lights.xml
+		// goes) reports why, and nothing ends.
+		ObjectState moved = *myDocument->Find(myDocument->IdAt(Kind::POINT_LIGHT, 0));
+		moved.myPosition = {1.25f, 2.5f, -3.75f};
+		QVERIFY(myDocument->SetState(myDocument->IdAt(Kind::POINT_LIGHT, 0), moved, "Move"));
+		std::optional<QStringList> problems;
+		myEngine->Save(QStringLiteral("sample_small"),
+		               [&problems](const QStringList& someProblems) { problems = someProblems; });
+		QTRY_VERIFY_WITH_TIMEOUT(problems.has_value(), 30000);
+		QVERIFY2(problems->isEmpty(), qPrintable(problems->join('\n')));
+		QFile lights(QStringLiteral("data/XML/levels/sample_small/lights.xml"));
+		QVERIFY(lights.open(QIODevice::ReadOnly));
+		QVERIFY(lights.readAll().contains("x=\"1.25\" y=\"2.5\" z=\"-3.75\""));
+		problems.reset();
+		QVERIFY(QDir().mkpath(QStringLiteral("data/XML/levels/blocked/lights.xml")));
+		myEngine->Save(QStringLiteral("blocked"),
+		               [&problems](const QStringList& someProblems) { problems = someProblems; });
+		QTRY_VERIFY_WITH_TIMEOUT(problems.has_value(), 30000);
+		QVERIFY(!problems->isEmpty());
+		QVERIFY2(problems->join('\n').contains("lights.xml"), qPrintable(problems->join('\n')));
+	}
+};
+
+QTEST_GUILESS_MAIN(EngineBridgeTest)
+#include "EngineBridgeTest.moc"
