@@ -416,7 +416,10 @@ void EngineThread::LoadLevel(const QString& aLevel, std::function<void(const Lev
 		}
 		for (int index = 0; index < aFacade.GetRooms().Count(); ++index)
 		{
-			snapshot.myRoomIds.push_back(QString::fromStdString(aFacade.GetRooms()[index]->GetID()));
+			const Zeph::Room& room = *aFacade.GetRooms()[index];
+			snapshot.myRoomIds.push_back(QString::fromStdString(room.GetID()));
+			snapshot.myRoomBounds.push_back({{room.GetMin().x, room.GetMin().y, room.GetMin().z},
+			                                 {room.GetMax().x, room.GetMax().y, room.GetMax().z}});
 		}
 		Vector3<float> position;
 		aFacade.GetCameraPlacement(position, snapshot.myStartView.myYaw, snapshot.myStartView.myPitch);

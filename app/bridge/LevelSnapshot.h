@@ -3,6 +3,9 @@
 // values in the engine's order, the decal types, the rooms and the camera's start.
 #include <QString>
 #include <QStringList>
+#include <array>
+#include <utility>
+#include <vector>
 
 #include "bridge/CameraPlacement.h"
 #include "core/Document.h"
@@ -17,6 +20,8 @@ struct LevelSnapshot
 	Document::ObjectLists myObjects;
 	QStringList myDecalTypes;
 	QStringList myRoomIds;
+	// Each room's box (minimum and maximum corners), in the order of myRoomIds.
+	std::vector<std::pair<std::array<float, 3>, std::array<float, 3>>> myRoomBounds;
 	CameraPlacement myStartView;
 };
 } // namespace LumoraEditor

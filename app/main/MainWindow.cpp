@@ -95,6 +95,13 @@ MainWindow::MainWindow()
 		myDocument->Select(anId);
 		myController->FrameSelection();
 	});
+	connect(myBakeRunner, &BakeRunner::progressChanged, this, [this](const BakeProgress& aProgress) {
+		if (aProgress.myRunningFlag)
+		{
+			myBakeLabel->setText(tr("Baking: %1").arg(BakeRunner::Describe(aProgress)));
+			myBakeLabel->setStyleSheet(QString());
+		}
+	});
 	connect(myBakePanel, &BakePanel::bakeFinished, this, [this](BakeOutcome) {
 		myEngine.RequestFrames();
 		if (myDocument->HasLevel())
@@ -423,6 +430,21 @@ void MainWindow::ShowSelection()
 		                              .arg(QString::fromUtf8(KindName(state->myKind)))
 		                              .arg(myDocument->IndexOf(id) + 1)
 		                              .arg(Format(state->myPosition)));
+		// The bake panel's "room" follows the selection: the room it stands in (the last of
+		// several, as the engine places entities).
+		for (size_t room = 0; room < myRoomBounds.size(); ++room)
+		{
+			const auto& [low, high] = myRoomBounds[room];
+			bool insideFlag = true;
+			for (int axis = 0; axis < 3; ++axis)
+			{
+				insideFlag = insideFlag && state->myPosition[axis] >= low[axis] && state->myPosition[axis] <= high[axis];
+			}
+			if (insideFlag)
+			{
+				myBakePanel->SetSelectedRoom(myRoomIds.value(static_cast<int>(room)));
+			}
+		}
 	}
 	RefreshActions();
 }
@@ -583,6 +605,8 @@ void MainWindow::OnLevelLoaded(const LevelSnapshot& aSnapshot)
 	myProperties->SetDecalTypes(aSnapshot.myDecalTypes);
 	myBakePanel->SetLevel(aSnapshot.myLevel);
 	myBakePanel->SetRooms(aSnapshot.myRoomIds);
+	myRoomIds = aSnapshot.myRoomIds;
+	myRoomBounds = aSnapshot.myRoomBounds;
 	myController->SetStartView(aSnapshot.myStartView);
 	myController->SetCamera(aSnapshot.myStartView);
 	myDocument->SetMode(0);

@@ -140,6 +140,8 @@ private:
 
 	QString myPendingLevel;
 	QStringList myDecalTypes;
+	QStringList myRoomIds;
+	std::vector<std::pair<std::array<float, 3>, std::array<float, 3>>> myRoomBounds;
 	QString myBakeState;
 	bool myEngineStartedFlag = false;
 	bool myClosingFlag = false;

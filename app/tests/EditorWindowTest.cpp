@@ -16,6 +16,8 @@
 #include "bridge/EngineThread.h"
 #include "editor/LumoraWrapper.h"
 #include "editor/PointLightStruct.h"
+#include "engine/Engine.h"
+#include "renderer/CubemapContainer.h"
 #include "main/MainWindow.h"
 #include "panels/OutlinerPanel.h"
 #include "panels/ProblemsPanel.h"
@@ -340,6 +342,13 @@ private slots:
 		QCOMPARE(QFile::exists(ambient), hadFlag);
 		QCOMPARE(ReadAll(ambient), before);
 
+		// Until the rooms have cubemaps of their own, every entity shows the fallback.
+		const auto roomCubemaps = [this] {
+			size_t count = 0;
+			OnEngine([&count](Lumora::LumoraWrapper&) { count = Zeph::Engine::GetInstance()->GetCubemapContainer().GetCount(); });
+			return count;
+		};
+		QCOMPARE(roomCubemaps(), size_t(0));
 		finished.clear();
 		request.myBounces = 1;
 		request.myReflectionsFlag = true;
@@ -351,6 +360,8 @@ private slots:
 		QCOMPARE(finished.front().at(0).value<BakeOutcome>(), BakeOutcome::FINISHED);
 		QVERIFY(QFile::exists(ambient));
 		QVERIFY(ReadAll(ambient) != before);
+		// The view shows what was baked: the rooms' new cubemaps are read in.
+		QVERIFY(roomCubemaps() > 0);
 		QTRY_COMPARE_WITH_TIMEOUT(myWindow->GetBakeState(), QStringLiteral("Bake up to date"), 60000);
 		qInfo("state %lld ms", static_cast<long long>(clock.restart()));
 	}

@@ -158,6 +158,18 @@ void LumoraWrapper::BakeAmbient(const std::u16string& aLevel, int aNumOfBounces,
 	Release();
 }
 
+void LumoraWrapper::ShowBakedReflections(const std::u16string& aLevel)
+{
+	// The cubemaps the frame shows were read when the level loaded: after a finished bake they
+	// are read again from the new files, so the view shows what was baked.
+	if (Zeph::Engine::GetInstance()->GetRenderer().GetBakeStatus().myLastResult != Zeph::BakeResult::FINISHED)
+	{
+		return;
+	}
+	Zeph::Engine::GetInstance()->GetCubemapContainer().Clear();
+	AssignRoomCubemaps(SysSTringToStdString(aLevel));
+}
+
 void LumoraWrapper::BakeSpecular(const std::u16string& aLevel)
 {
 	Claim();
@@ -166,6 +178,7 @@ void LumoraWrapper::BakeSpecular(const std::u16string& aLevel)
 	renderer.GenerateReflections(myRooms, SysSTringToStdString(aLevel));
 	renderer.DiscardLateItems();
 	RecordPhase(aLevel, BakePhase::REFLECTIONS, {}, myRooms, 0);
+	ShowBakedReflections(aLevel);
 	Release();
 }
 
@@ -206,6 +219,7 @@ bool LumoraWrapper::BakeSpecularRooms(const std::u16string& aLevel,
 		Zeph::Engine::GetInstance()->GetRenderer().GenerateReflections(myRooms, SysSTringToStdString(aLevel),
 		                                                               &someRoomIDs);
 		RecordPhase(aLevel, BakePhase::REFLECTIONS, someRoomIDs, myRooms, 0);
+		ShowBakedReflections(aLevel);
 		aProblemOut = UnfinishedBake("reflection");
 	});
 }

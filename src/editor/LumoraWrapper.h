@@ -285,6 +285,8 @@ private:
 	void QueueLightOverlays(int aSelectedPoint, int aSelectedSpot, bool anIconsFlag);
 	// Queues the scene a bake renders (BakeCommands.cpp).
 	void QueueBakeScene();
+	// After a reflection bake that finished: the rooms' cubemaps read again from their new files.
+	void ShowBakedReflections(const std::u16string& aLevel);
 	// The room bakes' common run: the rooms named found (else aProblemOut names the first
 	// that is not, and nothing is baked), the scene queued, aBake run on them, all while the
 	// facade is held. aBake sets aProblemOut when its bake did not finish.
@@ -313,6 +315,9 @@ private:
 	void ParseNodes(const std::string& aPath);
 	void ParseDecals(const std::string& aPath);
 	void ParseDecalTypes(const std::string& aPath);
+	// Gives every entity its room's cubemap from the room's file (the fallback where there is
+	// none or it is no cube), by the rooms ParseEntities found the entities in.
+	void AssignRoomCubemaps(const std::string& aLevel);
 	void SaveNodes(const std::string& aLevel);
 
 	// Private helpers of picking and editing (Picking.cpp, Editing.cpp).
@@ -373,6 +378,8 @@ private:
 	std::unique_ptr<Zeph::CameraInstance> myCameraInstance;
 	std::unique_ptr<Zeph::Text> myInfoText;
 	GrowingArray<Zeph::Instance*> myEntities{ourArraySize, ourArraySize, true};
+	// The room index each entity stands in (-1: none), as ParseEntities found them.
+	std::vector<int> myEntityRooms;
 	GrowingArray<Zeph::Instance*> myLightGizmos{ourArraySize, ourArraySize, true};
 	GrowingArray<Zeph::PointLightData> myEnvironmentPointLights{ourArraySize, ourArraySize, true};
 	GrowingArray<Zeph::SpotLightData> myEnvironmentSpotLights{ourArraySize, ourArraySize, true};

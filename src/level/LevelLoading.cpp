@@ -194,6 +194,24 @@ void LumoraWrapper::ParseEntities(const std::string& aLevel)
 		xml.ExitChild();
 	}
 
+	// The room each entity stands in: of several containing rooms the last one in room order.
+	myEntityRooms.assign(static_cast<size_t>(myEntities.Count()), -1);
+	for (int entity = 0; entity < myEntities.Count(); ++entity)
+	{
+		for (int roomIndex = 0; roomIndex < myRooms.Count(); ++roomIndex)
+		{
+			if (myRooms[roomIndex]->SphereInside(spheres[entity]))
+			{
+				myEntityRooms[static_cast<size_t>(entity)] = roomIndex;
+			}
+		}
+	}
+	AssignRoomCubemaps(aLevel);
+}
+
+void LumoraWrapper::AssignRoomCubemaps(const std::string& aLevel)
+{
+	Zeph::CubemapContainer& cubemaps = Zeph::Engine::GetInstance()->GetCubemapContainer();
 	// Each room's cubemap file is looked at once, through the path resolver: a file that is there
 	// but cannot be a cubemap (a plain 2D DDS, a damaged one) is reported, and its room shows
 	// the fallback, as does a room whose ID cannot name a file.
@@ -216,34 +234,26 @@ void LumoraWrapper::ParseEntities(const std::string& aLevel)
 	}
 	for (int entity = 0; entity < myEntities.Count(); ++entity)
 	{
-		bool inRoomFlag = false;
-		// No early exit: of several containing rooms the last one in room order is kept.
-		for (int roomIndex = 0; roomIndex < myRooms.Count(); ++roomIndex)
+		const int roomIndex = myEntityRooms[static_cast<size_t>(entity)];
+		Zeph::RoomData roomData;
+		if (roomIndex >= 0)
 		{
 			const Zeph::Room& room = *myRooms[roomIndex];
-			if (!room.SphereInside(spheres[entity]))
-			{
-				continue;
-			}
-			Zeph::RoomData roomData;
-			roomData.myCubemap = cubemaps.GetCubemap(roomIndex, roomFiles[roomIndex]);
+			roomData.myCubemap = cubemaps.GetCubemap(roomIndex, roomFiles[static_cast<size_t>(roomIndex)]);
 			roomData.myRoomIndex = roomIndex;
 			roomData.myCenter = room.GetCenterPosition();
 			roomData.myMax = room.GetMax();
 			roomData.myMin = room.GetMin();
-			myEntities[entity]->SetRoomData(roomData);
-			inRoomFlag = true;
 		}
-		if (!inRoomFlag)
+		else
 		{
-			Zeph::RoomData roomData;
 			roomData.myCubemap = cubemaps.GetCubemap(-1, "");
 			roomData.myRoomIndex = -1;
 			roomData.myCenter = Vector3<float>(0.0f, 0.0f, 0.0f);
 			roomData.myMax = Vector3<float>(1.0f, 1.0f, 1.0f);
 			roomData.myMin = Vector3<float>(-1.0f, -1.0f, -1.0f);
-			myEntities[entity]->SetRoomData(roomData);
 		}
+		myEntities[entity]->SetRoomData(roomData);
 	}
 }
 
