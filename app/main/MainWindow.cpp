@@ -438,7 +438,8 @@ void MainWindow::ShowSelection()
 			bool insideFlag = true;
 			for (int axis = 0; axis < 3; ++axis)
 			{
-				insideFlag = insideFlag && state->myPosition[axis] >= low[axis] && state->myPosition[axis] <= high[axis];
+				insideFlag = insideFlag && state->myPosition[axis] >= low[axis] &&
+				             state->myPosition[axis] <= high[axis];
 			}
 			if (insideFlag)
 			{

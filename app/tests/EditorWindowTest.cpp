@@ -17,11 +17,11 @@
 #include "editor/LumoraWrapper.h"
 #include "editor/PointLightStruct.h"
 #include "engine/Engine.h"
-#include "renderer/CubemapContainer.h"
 #include "main/MainWindow.h"
 #include "panels/OutlinerPanel.h"
 #include "panels/ProblemsPanel.h"
 #include "panels/PropertiesPanel.h"
+#include "renderer/CubemapContainer.h"
 #include "view/EngineView.h"
 #include "view/ViewController.h"
 
@@ -345,7 +345,9 @@ private slots:
 		// Until the rooms have cubemaps of their own, every entity shows the fallback.
 		const auto roomCubemaps = [this] {
 			size_t count = 0;
-			OnEngine([&count](Lumora::LumoraWrapper&) { count = Zeph::Engine::GetInstance()->GetCubemapContainer().GetCount(); });
+			OnEngine([&count](Lumora::LumoraWrapper&) {
+				count = Zeph::Engine::GetInstance()->GetCubemapContainer().GetCount();
+			});
 			return count;
 		};
 		QCOMPARE(roomCubemaps(), size_t(0));

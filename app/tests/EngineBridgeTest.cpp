@@ -14,6 +14,7 @@
 #include "bridge/EngineThread.h"
 #include "core/Document.h"
 #include "editor/LumoraWrapper.h"
+#include "view/ViewController.h"
 
 using namespace LumoraEditor;
 
@@ -283,6 +284,92 @@ private slots:
 		}
 		ExpectInStep("undoing everything");
 		QCOMPARE(myDocument->Count(Kind::POINT_LIGHT), 3);
+	}
+
+	void TheViewsInputMovesTheSelectionAndEscOrLosingFocusPutsItBack()
+	{
+		myDocument->SetMode(0);
+		ViewController controller(*myDocument, *myEngine);
+		controller.SetViewSize(QSize(320, 180));
+		const ObjectId id = myDocument->IdAt(Kind::POINT_LIGHT, 1);
+		CameraPlacement camera;
+		camera.myYaw = 0.4f;
+		controller.SetCamera(camera);
+		controller.Camera().Frame(myDocument->Find(id)->myPosition, 4.0f);
+		controller.SetCamera(controller.Camera().GetPlacement());
+		// Twice: the first runs before the frame that puts the camera, the second after it.
+		Wait();
+		Wait();
+		float x = 0.0f;
+		float y = 0.0f;
+		const auto at = myDocument->Find(id)->myPosition;
+		Wait([&](Lumora::LumoraWrapper& aFacade) {
+			aFacade.ProjectToView(Vector3<float>(at[0], at[1], at[2]), x, y);
+		});
+		const QPointF pixel(x, y);
+		const ObjectState before = *myDocument->Find(id);
+		myDocument->History().clear();
+		const int steps = 0;
+
+		// Pressed on the light, moved, let go: one step, the light moved along the camera's right.
+		controller.MousePress(Qt::LeftButton, pixel, {});
+		QTRY_COMPARE_WITH_TIMEOUT(myDocument->GetSelected(), id, 30000);
+		controller.MouseMove(pixel + QPointF(20, 0), {});
+		controller.MouseMove(pixel + QPointF(40, 0), {});
+		controller.MouseRelease(Qt::LeftButton, pixel + QPointF(40, 0));
+		QCOMPARE(myDocument->History().count(), steps + 1);
+		const ObjectState moved = *myDocument->Find(id);
+		const auto right = controller.Camera().GetPlacement().Right();
+		const float along = (moved.myPosition[0] - before.myPosition[0]) * right[0] +
+		                    (moved.myPosition[2] - before.myPosition[2]) * right[2];
+		QVERIFY2(along > 0.1f, qPrintable(QString::number(along)));
+		QCOMPARE(moved.myPosition[1], before.myPosition[1]);
+		ExpectInStep("a drag");
+
+		// Esc in the middle of a drag, or the window losing the keyboard, puts it back: no step.
+		for (int ending = 0; ending < 2; ++ending)
+		{
+			controller.MousePress(Qt::LeftButton, pixel + QPointF(40, 0), {});
+			QTRY_VERIFY_WITH_TIMEOUT(
+			    controller.IsDragging() ||
+			        (controller.MouseMove(pixel + QPointF(60, 10), {}), controller.IsDragging()),
+			    30000);
+			QVERIFY(!(*myDocument->Find(id) == moved));
+			if (ending == 0)
+			{
+				QVERIFY(controller.KeyPress(Qt::Key_Escape, {}, false));
+			}
+			else
+			{
+				controller.FocusLost();
+			}
+			controller.MouseRelease(Qt::LeftButton, pixel + QPointF(60, 10));
+			QCOMPARE(*myDocument->Find(id), moved);
+			QCOMPARE(myDocument->History().count(), steps + 1);
+		}
+		ExpectInStep("cancelled drags");
+
+		// A drag over before the pick's answer came is still made, as one step.
+		controller.MousePress(Qt::LeftButton, pixel + QPointF(40, 0), {});
+		controller.MouseMove(pixel + QPointF(40, 30), {});
+		controller.MouseRelease(Qt::LeftButton, pixel + QPointF(40, 30));
+		QTRY_COMPARE_WITH_TIMEOUT(myDocument->History().count(), steps + 2, 30000);
+		QVERIFY(myDocument->Find(id)->myPosition[1] < moved.myPosition[1]);
+
+		// Nudges go along the ground as the camera faces it, Shift ten times as far, a burst one step.
+		CameraPlacement turned = controller.Camera().GetPlacement();
+		turned.myYaw = 1.5707963f;
+		controller.SetCamera(turned);
+		const ObjectState start = *myDocument->Find(id);
+		controller.KeyPress(Qt::Key_Right, {}, false);
+		controller.KeyPress(Qt::Key_Up, Qt::ShiftModifier, false);
+		controller.KeyPress(Qt::Key_PageUp, {}, false);
+		const ObjectState nudged = *myDocument->Find(id);
+		QVERIFY(std::abs(nudged.myPosition[2] - start.myPosition[2] - 0.1f) < 1e-4f);
+		QVERIFY(std::abs(nudged.myPosition[0] - start.myPosition[0] + 1.0f) < 1e-4f);
+		QVERIFY(std::abs(nudged.myPosition[1] - start.myPosition[1] - 0.1f) < 1e-4f);
+		QCOMPARE(myDocument->History().count(), steps + 3);
+		ExpectInStep("nudges");
 	}
 
 	void PicksAndSavesAnswerOnThisThread()
