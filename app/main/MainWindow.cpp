@@ -251,8 +251,19 @@ void MainWindow::BuildMenus()
 	tools->addAction(myOpenAction);
 	tools->addAction(mySaveAction);
 	tools->addSeparator();
-	tools->addAction(undo);
-	tools->addAction(redo);
+	// The tool bar's buttons keep short names (the menu's carry the step's name), so the bar
+	// does not shift with every edit; the step's name is the button's tool tip.
+	QUndoStack& history = myDocument->History();
+	QAction* undoButton = tools->addAction(tr("Undo"), &history, &QUndoStack::undo);
+	QAction* redoButton = tools->addAction(tr("Redo"), &history, &QUndoStack::redo);
+	undoButton->setEnabled(false);
+	redoButton->setEnabled(false);
+	connect(&history, &QUndoStack::canUndoChanged, undoButton, &QAction::setEnabled);
+	connect(&history, &QUndoStack::canRedoChanged, redoButton, &QAction::setEnabled);
+	connect(&history, &QUndoStack::undoTextChanged, undoButton,
+	        [undoButton](const QString& aText) { undoButton->setToolTip(tr("Undo %1").arg(aText)); });
+	connect(&history, &QUndoStack::redoTextChanged, redoButton,
+	        [redoButton](const QString& aText) { redoButton->setToolTip(tr("Redo %1").arg(aText)); });
 	tools->addSeparator();
 	for (QAction* add : myAddActions)
 	{

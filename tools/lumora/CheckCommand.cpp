@@ -1,9 +1,12 @@
 // lumora check: the level read the way the editor reads it, with every report made
 // non-fatal and listed, and what loading passes over in silence (LevelCheck.h).
+#include <algorithm>
+#include <cctype>
 #include <cstdio>
+#include <cstring>
 #include <nlohmann/json.hpp>
-#include <regex>
 #include <string>
+#include <string_view>
 #include <vector>
 
 #include "Commands.h"
@@ -14,19 +17,53 @@ namespace LumoraTool
 {
 namespace
 {
+// A name as the XML reader writes element and attribute names into its messages.
+bool IsName(std::string_view aText)
+{
+	if (aText.empty() || !(std::isalpha(static_cast<unsigned char>(aText[0])) || aText[0] == '_'))
+	{
+		return false;
+	}
+	return std::all_of(aText.begin(), aText.end(), [](char aCharacter) {
+		return std::isalnum(static_cast<unsigned char>(aCharacter)) || std::strchr("-_.:", aCharacter) != nullptr;
+	});
+}
+
 // One problem line as a record: the file it names (the first data/... path), the element or
 // attribute it names (the first name in brackets, as the XML reader names them, or in quotes),
 // and the line itself.
 nlohmann::json ProblemRecord(const std::string& aProblem, bool aBakedFlag)
 {
-	static const std::regex ourFile(R"(data/[^\s:,;"'\[\]()]+)");
-	static const std::regex ourElement(R"re(\[([A-Za-z_][-A-Za-z0-9_.:]*)\]|"([A-Za-z_][-A-Za-z0-9_.:]*)")re");
-	std::smatch match;
 	nlohmann::json record;
 	record["message"] = aProblem;
-	record["file"] = std::regex_search(aProblem, match, ourFile) ? match.str(0) : "";
-	record["element"] =
-	    std::regex_search(aProblem, match, ourElement) ? (match[1].matched ? match.str(1) : match.str(2)) : "";
+	std::string file;
+	if (const size_t start = aProblem.find("data/"); start != std::string::npos)
+	{
+		const size_t end = aProblem.find_first_of(" \t:,;\"'[]()", start);
+		file = aProblem.substr(start, end == std::string::npos ? std::string::npos : end - start);
+	}
+	record["file"] = file;
+	std::string element;
+	for (size_t open = aProblem.find_first_of("[\""); open != std::string::npos && element.empty();
+	     open = aProblem.find_first_of("[\"", open + 1))
+	{
+		const size_t close = aProblem.find(aProblem[open] == '[' ? ']' : '"', open + 1);
+		if (close == std::string::npos)
+		{
+			break;
+		}
+		const std::string_view inside = std::string_view(aProblem).substr(open + 1, close - open - 1);
+		if (IsName(inside))
+		{
+			element = std::string(inside);
+		}
+		else if (aProblem[open] == '"')
+		{
+			// A quoted text that is no name: its closing quote opens nothing.
+			open = close;
+		}
+	}
+	record["element"] = element;
 	record["baked"] = aBakedFlag;
 	return record;
 }
