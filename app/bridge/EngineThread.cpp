@@ -286,6 +286,8 @@ void EngineThread::Loop(quint64 aWindow, QSize aSize)
 				break;
 			}
 			work.swap(myQueue);
+			// What was queued is about to run: a change from now on is queued anew.
+			myPendingState.reset();
 			camera = std::exchange(myCamera, std::nullopt);
 			size = std::exchange(mySize, std::nullopt);
 			frameFlag = std::exchange(myFrameFlag, false);
@@ -598,7 +600,29 @@ void EngineThread::AddObject(const ObjectState& aState)
 
 void EngineThread::ApplyState(int anIndex, const ObjectState& aState)
 {
-	Queue([anIndex, aState](LumoraWrapper& aFacade) { WriteObject(aFacade, anIndex, aState); });
+	{
+		std::lock_guard lock(myMutex);
+		if (myPendingState && myPendingPlace + 1 == myQueue.size() &&
+		    myPendingState->myKind == aState.myKind && myPendingState->myIndex == anIndex)
+		{
+			myPendingState->myState = aState;
+			myFrameFlag = true;
+			return;
+		}
+		auto pending = std::make_shared<PendingState>(PendingState{aState.myKind, anIndex, aState});
+		myPendingState = pending;
+		myPendingPlace = myQueue.size();
+		myQueue.push_back([this, pending](LumoraWrapper& aFacade) {
+			ObjectState state;
+			{
+				std::lock_guard valuesLock(myMutex);
+				state = pending->myState;
+			}
+			WriteObject(aFacade, pending->myIndex, state);
+		});
+		myFrameFlag = true;
+	}
+	myWake.notify_one();
 }
 
 void EngineThread::RemoveObject(Kind aKind, int anIndex)

@@ -17,6 +17,7 @@
 #include <condition_variable>
 #include <deque>
 #include <functional>
+#include <memory>
 #include <mutex>
 #include <optional>
 #include <thread>
@@ -101,6 +102,18 @@ private:
 	void PostToUi(std::function<void()> aCall);
 	void Loop(quint64 aWindow, QSize aSize);
 	bool HasWork() const;
+
+	// The last queued ApplyState while it is still the queue's last item: a further change of the
+	// same object replaces its values instead of queueing another (a drag's moves between two
+	// frames become one).
+	struct PendingState
+	{
+		Kind myKind;
+		int myIndex;
+		ObjectState myState;
+	};
+	std::shared_ptr<PendingState> myPendingState;
+	size_t myPendingPlace = 0;
 
 	std::thread myThread;
 	mutable std::mutex myMutex;

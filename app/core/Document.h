@@ -146,6 +146,8 @@ public:
 	void Commit();
 	// The values before, applied again.
 	void Cancel();
+	// Ends the edit leaving the object as it is, with no step (the history moved under it).
+	void Abandon() { myDocument = nullptr; }
 
 private:
 	Document* myDocument = nullptr;

@@ -349,6 +349,22 @@ private slots:
 		}
 		ExpectInStep("cancelled drags");
 
+		// An undo with the button still held ends the drag: the undone values stay, no step is made.
+		controller.MousePress(Qt::LeftButton, pixel + QPointF(40, 0), {});
+		QTRY_VERIFY_WITH_TIMEOUT(
+		    controller.IsDragging() ||
+		        (controller.MouseMove(pixel + QPointF(60, 10), {}), controller.IsDragging()),
+		    30000);
+		myDocument->History().undo();
+		QVERIFY(!controller.IsDragging());
+		controller.MouseMove(pixel + QPointF(80, 20), {});
+		controller.MouseRelease(Qt::LeftButton, pixel + QPointF(80, 20));
+		QCOMPARE(*myDocument->Find(id), before);
+		QCOMPARE(myDocument->History().index(), steps);
+		ExpectInStep("an undo during a drag");
+		myDocument->History().redo();
+		QCOMPARE(*myDocument->Find(id), moved);
+
 		// A drag over before the pick's answer came is still made, as one step.
 		controller.MousePress(Qt::LeftButton, pixel + QPointF(40, 0), {});
 		controller.MouseMove(pixel + QPointF(40, 30), {});
@@ -370,6 +386,27 @@ private slots:
 		QVERIFY(std::abs(nudged.myPosition[1] - start.myPosition[1] - 0.1f) < 1e-4f);
 		QCOMPARE(myDocument->History().count(), steps + 3);
 		ExpectInStep("nudges");
+	}
+
+	void ChangesQueuedFasterThanFramesCollapseAndTheLastValuesWin()
+	{
+		const ObjectId id = myDocument->IdAt(Kind::SPOT_LIGHT, 0);
+		ObjectState state = *myDocument->Find(id);
+		// A drag's worth of values queued at once: the engine ends with the last.
+		for (int step = 0; step < 50; ++step)
+		{
+			state.myPosition[0] += 0.01f;
+			myDocument->SetStateMerging(id, state, "Change position");
+		}
+		ExpectInStep("fifty queued changes");
+		// A change queued after the engine took the last one, behind other work, is not lost.
+		state.myPosition[2] += 1.0f;
+		myDocument->SetState(id, state, "Move");
+		Wait();
+		myEngine->Run([](Lumora::LumoraWrapper&) {});
+		state.myColor[1] = 3.0f;
+		myDocument->SetState(id, state, "Colour");
+		ExpectInStep("a change behind other work");
 	}
 
 	void PicksAndSavesAnswerOnThisThread()

@@ -18,6 +18,16 @@ ViewController::ViewController(Document& aDocument, EngineThread& anEngine, QObj
 	connect(&myDocument, &Document::objectRemoved, this, &ViewController::RequestFrames);
 	connect(&myDocument, &Document::selectionChanged, this, &ViewController::RequestFrames);
 	connect(&myDocument, &Document::reset, this, [this] { CancelDrag(); });
+	// An undo or redo in the middle of a drag (Ctrl+Z with the button held) has put its own
+	// values on the objects: the drag ends without a step and without putting anything back.
+	connect(&myDocument.History(), &QUndoStack::indexChanged, this, [this] {
+		if (myDrag.IsOpen())
+		{
+			myDrag.Abandon();
+			myLeftFlag = false;
+			myPickedFlag = false;
+		}
+	});
 }
 
 void ViewController::SetCamera(const CameraPlacement& aPlacement)
