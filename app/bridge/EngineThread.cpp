@@ -41,6 +41,22 @@ LumoraWrapper::ObjectKind FacadeKind(Kind aKind)
 	return LumoraWrapper::ObjectKind::POINT_LIGHT;
 }
 
+Kind EditorKind(LumoraWrapper::ObjectKind aKind)
+{
+	switch (aKind)
+	{
+	case LumoraWrapper::ObjectKind::POINT_LIGHT:
+		return Kind::POINT_LIGHT;
+	case LumoraWrapper::ObjectKind::SPOT_LIGHT:
+		return Kind::SPOT_LIGHT;
+	case LumoraWrapper::ObjectKind::DECAL:
+		return Kind::DECAL;
+	case LumoraWrapper::ObjectKind::PATH_NODE:
+		return Kind::PATH_NODE;
+	}
+	return Kind::POINT_LIGHT;
+}
+
 int FacadeCount(const LumoraWrapper& aFacade, Kind aKind)
 {
 	switch (aKind)
@@ -362,32 +378,15 @@ void EngineThread::SetDisplay(const DisplayOptions& someOptions)
 	});
 }
 
-void EngineThread::Pick(float anX, float aY, std::function<void(Kind, int)> aResult)
+void EngineThread::Pick(float anX, float aY, std::function<void(const PickHits&)> aResult)
 {
 	Queue([this, anX, aY, aResult = std::move(aResult)](LumoraWrapper& aFacade) {
-		aFacade.DoIntersection(anX, aY);
-		Kind kind = Kind::POINT_LIGHT;
-		int index = -1;
-		if (aFacade.GetSelectedPoint() != -1)
+		PickHits hits;
+		for (const LumoraWrapper::PickHit& hit : aFacade.PickAll(anX, aY))
 		{
-			index = aFacade.GetSelectedPoint();
+			hits.emplace_back(EditorKind(hit.myKind), hit.myIndex);
 		}
-		else if (aFacade.GetSelectedSpot() != -1)
-		{
-			kind = Kind::SPOT_LIGHT;
-			index = aFacade.GetSelectedSpot();
-		}
-		else if (aFacade.GetSelectedDecal() != -1)
-		{
-			kind = Kind::DECAL;
-			index = aFacade.GetSelectedDecal();
-		}
-		else if (aFacade.GetSelectedNode() != -1)
-		{
-			kind = Kind::PATH_NODE;
-			index = aFacade.GetSelectedNode();
-		}
-		PostToUi([aResult, kind, index] { aResult(kind, index); });
+		PostToUi([aResult, hits] { aResult(hits); });
 	});
 }
 

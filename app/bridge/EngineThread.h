@@ -21,6 +21,8 @@
 #include <mutex>
 #include <optional>
 #include <thread>
+#include <utility>
+#include <vector>
 
 #include "bridge/BakeRequest.h"
 #include "bridge/CameraPlacement.h"
@@ -66,7 +68,9 @@ public:
 	void SetCamera(const CameraPlacement& aCamera);
 	void RequestFrames();
 	void SetDisplay(const DisplayOptions& someOptions);
-	void Pick(float anX, float aY, std::function<void(Kind, int)> aResult);
+	// Everything of the current mode under the pixel, nearest first (empty: nothing there).
+	using PickHits = std::vector<std::pair<Kind, int>>;
+	void Pick(float anX, float aY, std::function<void(const PickHits&)> aResult);
 	void LoadLevel(const QString& aLevel, std::function<void(const LevelSnapshot&)> aDone);
 	// Lights, path graph and decals; aDone gets the problems reported while saving (empty: saved).
 	void Save(const QString& aLevel, std::function<void(const QStringList&)> aDone);

@@ -16,6 +16,7 @@ const std::vector<KeyBinding>& KeyBindings()
 	    {"F", "Frame the selection"},
 	    {"Home", "The level's start view"},
 	    {"Left click", "Select what is under the cursor (the current mode's objects)"},
+	    {"Left click on the selection", "Select the next object behind it at that spot"},
 	    {"Left drag", "Move the selection in the plane facing the camera"},
 	    {"X / Y / Z held while dragging", "Move along that world axis only"},
 	    {"Ctrl+left drag", "Turn a spot light or decal"},

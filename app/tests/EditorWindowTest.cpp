@@ -379,9 +379,6 @@ private slots:
 		// Picking follows the new size.
 		const auto [index, pixel] = VisibleLight();
 		QVERIFY(index >= 0);
-		qInfo("light %d at %.1f,%.1f in %dx%d (drawn %dx%d)", index, pixel.x(), pixel.y(),
-		      myWindow->GetView()->DeviceSize().width(), myWindow->GetView()->DeviceSize().height(),
-		      myWindow->GetDrawnSize().width(), myWindow->GetDrawnSize().height());
 		QTest::mouseClick(myWindow->GetView(), Qt::LeftButton, {}, Logical(pixel));
 		QTRY_COMPARE_WITH_TIMEOUT(Doc().GetSelected(), Doc().IdAt(Kind::POINT_LIGHT, index), 10000);
 		// Once the eye adaptation has settled, no frame is drawn until something changes.

@@ -10,6 +10,7 @@
 #include <QTemporaryDir>
 #include <QTest>
 #include <cmath>
+#include <optional>
 
 #include "bridge/EngineThread.h"
 #include "core/Document.h"
@@ -422,11 +423,43 @@ private slots:
 			inViewFlag = aFacade.ProjectToView(position, x, y);
 		});
 		QVERIFY(inViewFlag);
-		std::pair<Kind, int> picked{Kind::DECAL, -2};
-		myEngine->Pick(x, y, [&picked](Kind aKind, int anIndex) { picked = {aKind, anIndex}; });
-		QTRY_VERIFY_WITH_TIMEOUT(picked.second != -2, 30000);
-		QCOMPARE(picked.first, Kind::POINT_LIGHT);
-		QCOMPARE(picked.second, 0);
+		std::optional<EngineThread::PickHits> picked;
+		myEngine->Pick(x, y, [&picked](const EngineThread::PickHits& someHits) { picked = someHits; });
+		QTRY_VERIFY_WITH_TIMEOUT(picked.has_value(), 30000);
+		QVERIFY(!picked->empty());
+		QCOMPARE(picked->front(), std::make_pair(Kind::POINT_LIGHT, 0));
+
+		// A second light right behind the first: a click takes the nearer, the same click again the
+		// one behind, and again the nearer; a drag from the spot moves whichever is selected.
+		const ObjectId front = myDocument->IdAt(Kind::POINT_LIGHT, 0);
+		const ObjectId behind = myDocument->IdAt(Kind::POINT_LIGHT, 1);
+		ObjectState hidden = *myDocument->Find(behind);
+		hidden.myPosition = myDocument->Find(front)->myPosition;
+		hidden.myPosition[2] += 2.0f;
+		QVERIFY(myDocument->SetState(behind, hidden, "Move"));
+		myDocument->Select(0);
+		ViewController controller(*myDocument, *myEngine);
+		controller.SetViewSize(QSize(320, 180));
+		const auto click = [&controller, x, y] {
+			controller.MousePress(Qt::LeftButton, QPointF(x, y), {});
+			controller.MouseRelease(Qt::LeftButton, QPointF(x, y));
+		};
+		for (const ObjectId expected : {front, behind, front})
+		{
+			click();
+			QTRY_COMPARE_WITH_TIMEOUT(myDocument->GetSelected(), expected, 30000);
+			Wait();
+		}
+		click();
+		QTRY_COMPARE_WITH_TIMEOUT(myDocument->GetSelected(), behind, 30000);
+		Wait();
+		controller.MousePress(Qt::LeftButton, QPointF(x, y), {});
+		Wait();
+		controller.MouseMove(QPointF(x + 30, y), {});
+		controller.MouseRelease(Qt::LeftButton, QPointF(x + 30, y));
+		QCOMPARE(myDocument->GetSelected(), behind);
+		QVERIFY(myDocument->Find(behind)->myPosition != hidden.myPosition);
+		ExpectInStep("picks through two lights");
 
 		// A change saved: the file holds it; a save the disk refuses (a folder where lights.xml
 		// goes) reports why, and nothing ends.

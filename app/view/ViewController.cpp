@@ -123,36 +123,70 @@ void ViewController::MousePress(Qt::MouseButton aButton, QPointF aPosition,
 	myPressPosition = aPosition;
 	myPressModifiers = someModifiers;
 	myPickedFlag = false;
+	myPickAnsweredFlag = false;
 	myReleasedBeforePickFlag = false;
 	const int pickId = ++myPickId;
 	myEngine.Pick(static_cast<float>(aPosition.x()), static_cast<float>(aPosition.y()),
-	              [this, pickId](Kind aKind, int anIndex) { OnPicked(pickId, aKind, anIndex); });
+	              [this, pickId](const EngineThread::PickHits& someHits) { OnPicked(pickId, someHits); });
 }
 
-void ViewController::OnPicked(int aPickId, Kind aKind, int anIndex)
+int ViewController::SelectionInHits() const
+{
+	const ObjectId selected = myDocument.GetSelected();
+	for (size_t hit = 0; hit < myHits.size(); ++hit)
+	{
+		if (selected != 0 && myDocument.IdAt(myHits[hit].first, myHits[hit].second) == selected)
+		{
+			return static_cast<int>(hit);
+		}
+	}
+	return -1;
+}
+
+void ViewController::FinishClick()
+{
+	const int kept = SelectionInHits();
+	if (!myKeptSelectionFlag || kept < 0 || myHits.size() < 2)
+	{
+		return;
+	}
+	const auto& next = myHits[(static_cast<size_t>(kept) + 1) % myHits.size()];
+	myDocument.SelectAt(next.first, next.second);
+}
+
+void ViewController::OnPicked(int aPickId, const std::vector<std::pair<Kind, int>>& someHits)
 {
 	if (aPickId != myPickId)
 	{
 		return;
 	}
-	if (anIndex < 0)
+	myPickAnsweredFlag = true;
+	myHits = someHits;
+	myKeptSelectionFlag = SelectionInHits() >= 0;
+	if (someHits.empty())
 	{
 		myDocument.Select(0);
-		return;
 	}
-	myDocument.SelectAt(aKind, anIndex);
-	myPickedFlag = myDocument.GetSelected() != 0;
+	else if (!myKeptSelectionFlag)
+	{
+		myDocument.SelectAt(someHits.front().first, someHits.front().second);
+	}
+	myPickedFlag = !someHits.empty() && myDocument.GetSelected() != 0;
 	if (myReleasedBeforePickFlag)
 	{
-		// A quick drag, over before the pick came back (a slow frame): made now, in one step.
 		myReleasedBeforePickFlag = false;
 		if (myPickedFlag && QLineF(myPressPosition, myReleasePosition).length() > ourDragThreshold)
 		{
+			// A quick drag, over before the pick came back (a slow frame): made now, in one step.
 			myLeftFlag = true;
 			StartDrag(myPressPosition, myPressModifiers.testFlag(Qt::ControlModifier));
 			MouseMove(myReleasePosition, myPressModifiers);
 			myLeftFlag = false;
 			myDrag.Commit();
+		}
+		else
+		{
+			FinishClick();
 		}
 		return;
 	}
@@ -238,10 +272,14 @@ void ViewController::MouseRelease(Qt::MouseButton aButton, QPointF aPosition)
 	{
 		myDrag.Commit();
 	}
-	else if (!myPickedFlag)
+	else if (!myPickAnsweredFlag)
 	{
 		myReleasedBeforePickFlag = true;
 		myReleasePosition = aPosition;
+	}
+	else if (QLineF(myPressPosition, aPosition).length() <= ourDragThreshold)
+	{
+		FinishClick();
 	}
 }
 

@@ -12,6 +12,8 @@
 #include <QPointF>
 #include <QSize>
 #include <QTimer>
+#include <utility>
+#include <vector>
 
 #include "core/Document.h"
 #include "view/DragMath.h"
@@ -63,7 +65,11 @@ signals:
 private:
 	void CameraMoved();
 	void FlyTick();
-	void OnPicked(int aPickId, Kind aKind, int anIndex);
+	void OnPicked(int aPickId, const std::vector<std::pair<Kind, int>>& someHits);
+	// A click (no drag) has ended: pressed on the selection, the next object behind it is selected.
+	void FinishClick();
+	// The selection's place in myHits, or -1.
+	int SelectionInHits() const;
 	void StartDrag(QPointF aPosition, bool aTurnFlag);
 	DragAxis HeldAxis() const;
 
@@ -81,7 +87,12 @@ private:
 	// The pick the last left press asked for, and whether its result has selected something
 	// a drag may move.
 	int myPickId = 0;
+	bool myPickAnsweredFlag = false;
 	bool myPickedFlag = false;
+	// What the last press's pick found, nearest first, and whether the press was on the
+	// selection already (which then stays selected, to be dragged or cycled from).
+	std::vector<std::pair<Kind, int>> myHits;
+	bool myKeptSelectionFlag = false;
 	// The button came up before the pick's answer: a drag made meanwhile is applied when it comes.
 	bool myReleasedBeforePickFlag = false;
 	QPointF myReleasePosition;

@@ -150,6 +150,17 @@ public:
 		PATH_NODE,
 	};
 	bool Select(ObjectKind aKind, int anIndex);
+	// Every object of the editor's mode that a click at the pixel would hit, nearest first (the
+	// first is what DoIntersection selects): a front end cycles through the rest when the same
+	// spot is clicked again. Takes nothing, like DoIntersection.
+	struct PickHit
+	{
+		ObjectKind myKind;
+		int myIndex;
+		// From the camera to the object's centre.
+		float myDistance;
+	};
+	std::vector<PickHit> PickAll(float aMouseX, float aMouseY) const;
 	// The selected object of the editor's mode put at a position, or pointed along a
 	// direction (a spot light, keeping its position; a decal, keeping its direction's
 	// length). False when nothing is selected that can take it, or the direction is zero

@@ -3,6 +3,9 @@
 // queries copy the selected light's or decal's values into the front end's records.
 // None of this touches the handshake flags: it runs on the user-interface thread,
 // which is also the only writer of the arrays it reads.
+#include <algorithm>
+#include <vector>
+
 #include "core/AABB.h"
 #include "core/Intersection.h"
 #include "core/Matrix33.h"
@@ -20,55 +23,20 @@ namespace
 // whatever its direction.
 constexpr float ourDecalPickDepth = 0.5f;
 
-// Tests one candidate: its box around aPosition, skipped when the camera stands inside
-// it; accepted when the ray's line hits the box and the centre lies strictly nearer
-// than aLimitInOut (a squared distance), which then becomes the new limit. Strict
-// comparison keeps the earlier candidate on a tie.
-bool TakeIfNearer(const Intersection::Ray<float>& aRay, const Vector3<float>& aPosition,
-                  const Vector3<float>& someHalfExtents, float& aLimitInOut)
+// Whether the ray's line hits the box around aPosition; never when the camera stands inside it.
+bool HitsBox(const Intersection::Ray<float>& aRay, const Vector3<float>& aPosition,
+             const Vector3<float>& someHalfExtents)
 {
 	Intersection::AABB<float> box;
 	box.myCenterPosition = aPosition;
 	box.myExtents = someHalfExtents;
 	box.myMinPos = aPosition - someHalfExtents;
 	box.myMaxPos = aPosition + someHalfExtents;
-	if (Intersection::PointInsideAABB(box, aRay.myOrigin))
-	{
-		return false;
-	}
-	if (!Intersection::RayVsAABB(aRay, box))
-	{
-		return false;
-	}
-	const float distance = (aPosition - aRay.myOrigin).LengthFast();
-	if (!(distance < aLimitInOut))
-	{
-		return false;
-	}
-	aLimitInOut = distance;
-	return true;
-}
-
-// The same for a light icon: accepted when the icon covers the pixel and the light lies
-// strictly nearer than aLimitInOut, which then becomes the new limit.
-bool TakeIconIfNearer(const LightOverlays::View& aView, const Intersection::Ray<float>& aRay,
-                      const Vector3<float>& aPosition, float aMouseX, float aMouseY, float& aLimitInOut)
-{
-	if (!LightOverlays::IconCovers(aView, aPosition, aMouseX, aMouseY))
-	{
-		return false;
-	}
-	const float distance = (aPosition - aRay.myOrigin).LengthFast();
-	if (!(distance < aLimitInOut))
-	{
-		return false;
-	}
-	aLimitInOut = distance;
-	return true;
+	return !Intersection::PointInsideAABB(box, aRay.myOrigin) && Intersection::RayVsAABB(aRay, box);
 }
 } // namespace
 
-void LumoraWrapper::DoIntersection(float aMouseX, float aMouseY)
+std::vector<LumoraWrapper::PickHit> LumoraWrapper::PickAll(float aMouseX, float aMouseY) const
 {
 	// The click in normalised device coordinates, top edge y = 1, left edge x = -1.
 	const Zeph::SetupInfo& setup = Zeph::Engine::GetInstance()->GetSetupInfo();
@@ -84,51 +52,55 @@ void LumoraWrapper::DoIntersection(float aMouseX, float aMouseY)
 	direction *= Matrix33<float>(myCameraInstance->GetActualOrientation());
 	const Intersection::Ray<float> ray(myCameraInstance->GetPosition(), direction);
 
+	// Candidates are measured from the camera to their centres, up to the far plane's square
+	// (as picking always measured).
 	const float farPlane = myCameraInstance->GetFarPlane();
-	float limit = farPlane * farPlane;
-	ResetIndices();
+	const float limit = farPlane * farPlane;
+	std::vector<PickHit> hits;
+	const auto take = [&](ObjectKind aKind, int anIndex, const Vector3<float>& aPosition) {
+		const float distance = (aPosition - ray.myOrigin).LengthFast();
+		if (distance < limit)
+		{
+			hits.push_back({aKind, anIndex, distance});
+		}
+	};
 
 	const float half = myNodeHalfDimensions;
 	const Vector3<float> markerHalfExtents(half, half, half);
 	switch (myMode)
 	{
 	case LIGHT_MODE: {
-		// A light is hit by its marker box or, when icons are shown, by its icon; point and
-		// spot lights share one limit, so the nearest light of either kind wins.
+		// A light is hit by its marker box or, when icons are shown, by its icon.
 		const bool iconsFlag = myLightIconsFlag.load();
 		const LightOverlays::View view =
 		    LightOverlays::MakeView(*myCameraInstance, setup.myWidth, setup.myHeight);
 		const auto hit = [&](const Vector3<float>& aPosition) {
-			return TakeIfNearer(ray, aPosition, markerHalfExtents, limit) ||
-			       (iconsFlag && TakeIconIfNearer(view, ray, aPosition, aMouseX, aMouseY, limit));
+			return HitsBox(ray, aPosition, markerHalfExtents) ||
+			       (iconsFlag && LightOverlays::IconCovers(view, aPosition, aMouseX, aMouseY));
 		};
 		for (int index = 0; index < myEnvironmentPointLights.Count(); ++index)
 		{
 			if (hit(myEnvironmentPointLights[index].myPosition))
 			{
-				myCurrentSelectedPoint = index;
+				take(ObjectKind::POINT_LIGHT, index, myEnvironmentPointLights[index].myPosition);
 			}
 		}
 		for (int index = 0; index < myEnvironmentSpotLights.Count(); ++index)
 		{
-			if (hit(myEnvironmentSpotLights[index].myOrientation.GetPosition()))
+			const Vector3<float> position = myEnvironmentSpotLights[index].myOrientation.GetPosition();
+			if (hit(position))
 			{
-				myCurrentSelectedSpot = index;
+				take(ObjectKind::SPOT_LIGHT, index, position);
 			}
-		}
-		// A spot light taken after a point light was nearer: only one light stays selected.
-		if (myCurrentSelectedSpot != -1)
-		{
-			myCurrentSelectedPoint = -1;
 		}
 		break;
 	}
 	case NODE_MODE:
 		for (int index = 0; index < myNodes.Count(); ++index)
 		{
-			if (TakeIfNearer(ray, myNodes[index].GetPosition(), markerHalfExtents, limit))
+			if (HitsBox(ray, myNodes[index].GetPosition(), markerHalfExtents))
 			{
-				myCurrentSelectedNode = index;
+				take(ObjectKind::PATH_NODE, index, myNodes[index].GetPosition());
 			}
 		}
 		break;
@@ -136,15 +108,45 @@ void LumoraWrapper::DoIntersection(float aMouseX, float aMouseY)
 		for (int index = 0; index < myDecals.Count(); ++index)
 		{
 			const Zeph::DecalData& decal = myDecals[index];
-			const Vector3<float> halfExtents(decal.mySize, decal.mySize, ourDecalPickDepth);
-			if (TakeIfNearer(ray, decal.myPosition, halfExtents, limit))
+			if (HitsBox(ray, decal.myPosition, Vector3<float>(decal.mySize, decal.mySize, ourDecalPickDepth)))
 			{
-				myCurrentSelectedDecal = index;
+				take(ObjectKind::DECAL, index, decal.myPosition);
 			}
 		}
 		break;
 	default:
 		// A mode outside the three picks nothing.
+		break;
+	}
+	// Nearest first; of equal distance the one met first (point lights before spot lights,
+	// lower indices first), as a click has always chosen.
+	std::stable_sort(hits.begin(), hits.end(),
+	                 [](const PickHit& a, const PickHit& b) { return a.myDistance < b.myDistance; });
+	return hits;
+}
+
+void LumoraWrapper::DoIntersection(float aMouseX, float aMouseY)
+{
+	const std::vector<PickHit> hits = PickAll(aMouseX, aMouseY);
+	ResetIndices();
+	if (hits.empty())
+	{
+		return;
+	}
+	const PickHit& nearest = hits.front();
+	switch (nearest.myKind)
+	{
+	case ObjectKind::POINT_LIGHT:
+		myCurrentSelectedPoint = nearest.myIndex;
+		break;
+	case ObjectKind::SPOT_LIGHT:
+		myCurrentSelectedSpot = nearest.myIndex;
+		break;
+	case ObjectKind::DECAL:
+		myCurrentSelectedDecal = nearest.myIndex;
+		break;
+	case ObjectKind::PATH_NODE:
+		myCurrentSelectedNode = nearest.myIndex;
 		break;
 	}
 }

@@ -699,6 +699,26 @@ INSTANTIATE_TEST_SUITE_P(
         NearestCase{"OffTheLine", {{false, Vector3<float>(1.0f, 10.0f, 5.0f)}}, {-1, -1, -1, -1}}),
     [](const testing::TestParamInfo<NearestCase>& anInfo) { return std::string(anInfo.param.myName); });
 
+// Every light a click would hit, nearest first, for a front end that cycles through lights
+// behind each other: the first is what the click selects; lights off the line are not listed.
+TEST_F(PickingTest, EveryLightUnderTheClickIsListedNearestFirst)
+{
+	PlaceLights(
+	    {Ahead(false, 9), Ahead(true, 3), Ahead(false, 6), {false, Vector3<float>(1.0f, 10.0f, 5.0f)}});
+	const std::vector<LumoraWrapper::PickHit> hits = Facade().PickAll(0.5f * ourWidth, 0.5f * ourHeight);
+	ASSERT_EQ(hits.size(), 3u);
+	EXPECT_EQ(hits[0].myKind, LumoraWrapper::ObjectKind::SPOT_LIGHT);
+	EXPECT_EQ(hits[0].myIndex, 0);
+	EXPECT_EQ(hits[1].myKind, LumoraWrapper::ObjectKind::POINT_LIGHT);
+	EXPECT_EQ(hits[1].myIndex, 1);
+	EXPECT_EQ(hits[2].myIndex, 0);
+	EXPECT_LT(hits[0].myDistance, hits[1].myDistance);
+	EXPECT_LT(hits[1].myDistance, hits[2].myDistance);
+	ClickCentre();
+	EXPECT_EQ(Selection(), (std::array{-1, 0, -1, -1}));
+	EXPECT_TRUE(Facade().PickAll(0.0f, 0.0f).empty());
+}
+
 // The queries report the stored values of the selection, whatever the mode, and leave the
 // caller's record alone when nothing of their kind is selected.
 TEST_F(PickingTest, QueriesReportTheSelectionOrLeaveTheRecordAlone)
