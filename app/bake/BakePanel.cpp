@@ -178,13 +178,13 @@ void BakePanel::ShowProgress(const BakeProgress& aProgress)
 	long long done = 0;
 	long long total = 0;
 	QString format;
-	if (aProgress.myPhase == QLatin1String("ambient") && aProgress.myProbesTotal > 0)
+	if (aProgress.myPhase == Zeph::BakePhase::AMBIENT && aProgress.myProbesTotal > 0)
 	{
 		done = aProgress.myProbesDone;
 		total = aProgress.myProbesTotal;
 		format = tr("%1/%2 probes").arg(done).arg(total);
 	}
-	else if (aProgress.myPhase == QLatin1String("reflections") && aProgress.myRoomsTotal > 0)
+	else if (aProgress.myPhase == Zeph::BakePhase::REFLECTIONS && aProgress.myRoomsTotal > 0)
 	{
 		done = aProgress.myRoomsDone;
 		total = aProgress.myRoomsTotal;

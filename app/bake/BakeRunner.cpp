@@ -72,7 +72,7 @@ void BakeRunner::Poll()
 		return;
 	}
 	myProgress = myBackend.myProgress();
-	if (myCancelFlag && myProgress.myRunningFlag)
+	if (myCancelFlag && myProgress.myPhase != Zeph::BakePhase::IDLE)
 	{
 		myBackend.myCancel();
 	}
@@ -130,13 +130,13 @@ QString BakeRunner::DescribeSeconds(double aSeconds)
 
 QString BakeRunner::Describe(const BakeProgress& aProgress)
 {
-	if (!aProgress.myRunningFlag)
+	if (aProgress.myPhase == Zeph::BakePhase::IDLE)
 	{
 		return QString();
 	}
 	QStringList parts;
 	QString phase;
-	if (aProgress.myPhase == QLatin1String("ambient"))
+	if (aProgress.myPhase == Zeph::BakePhase::AMBIENT)
 	{
 		phase = tr("Ambient");
 		if (aProgress.myBounceCount > 0)
@@ -148,7 +148,7 @@ QString BakeRunner::Describe(const BakeProgress& aProgress)
 			parts << tr("%1/%2 probes").arg(aProgress.myProbesDone).arg(aProgress.myProbesTotal);
 		}
 	}
-	else if (aProgress.myPhase == QLatin1String("reflections"))
+	else if (aProgress.myPhase == Zeph::BakePhase::REFLECTIONS)
 	{
 		phase = tr("Reflections");
 		if (aProgress.myRoomsTotal > 0)

@@ -3,6 +3,8 @@
 #include <QString>
 #include <QStringList>
 
+#include "renderer/BakeStatus.h"
+
 namespace LumoraEditor
 {
 struct BakeRequest
@@ -15,23 +17,9 @@ struct BakeRequest
 	QStringList myRoomIds;
 };
 
-// Where a running bake is (a copy any thread may hold).
-struct BakeProgress
-{
-	bool myRunningFlag = false;
-	// "ambient" or "reflections" while running.
-	QString myPhase;
-	int myBounce = 0;
-	int myBounceCount = 0;
-	long long myProbesDone = 0;
-	long long myProbesTotal = 0;
-	int myRoomsDone = 0;
-	int myRoomsTotal = 0;
-	double myElapsedSeconds = 0.0;
-	// Negative until the bake can tell.
-	double mySecondsLeft = -1.0;
-	QString myLastMessage;
-};
+// Where a running bake is, or how the last one ended: the library's own status (a copy any
+// thread may hold).
+using BakeProgress = Zeph::BakeStatus;
 
 enum class BakeOutcome
 {

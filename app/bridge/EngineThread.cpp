@@ -537,27 +537,8 @@ void EngineThread::CancelBake()
 
 BakeProgress EngineThread::GetBakeProgress() const
 {
-	BakeProgress progress;
 	const LumoraWrapper* facade = LumoraWrapper::GetInstance();
-	if (facade == nullptr)
-	{
-		return progress;
-	}
-	const Zeph::BakeStatus status = facade->GetBakeStatus();
-	progress.myRunningFlag = status.myPhase != Zeph::BakePhase::IDLE;
-	progress.myPhase = status.myPhase == Zeph::BakePhase::AMBIENT       ? QStringLiteral("ambient")
-	                   : status.myPhase == Zeph::BakePhase::REFLECTIONS ? QStringLiteral("reflections")
-	                                                                    : QString();
-	progress.myBounce = status.myBounce;
-	progress.myBounceCount = status.myBounceCount;
-	progress.myProbesDone = status.myProbesDone;
-	progress.myProbesTotal = status.myProbesTotal;
-	progress.myRoomsDone = status.myRoomsDone;
-	progress.myRoomsTotal = status.myRoomsTotal;
-	progress.myElapsedSeconds = status.myElapsedSeconds;
-	progress.mySecondsLeft = status.mySecondsLeft;
-	progress.myLastMessage = QString::fromStdString(status.myLastMessage);
-	return progress;
+	return facade != nullptr ? facade->GetBakeStatus() : BakeProgress();
 }
 
 void EngineThread::Run(std::function<void(LumoraWrapper&)> aWork, std::function<void()> aDone)

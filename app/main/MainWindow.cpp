@@ -96,7 +96,7 @@ MainWindow::MainWindow()
 		myController->FrameSelection();
 	});
 	connect(myBakeRunner, &BakeRunner::progressChanged, this, [this](const BakeProgress& aProgress) {
-		if (aProgress.myRunningFlag)
+		if (aProgress.myPhase != Zeph::BakePhase::IDLE)
 		{
 			myBakeLabel->setText(tr("Baking: %1").arg(BakeRunner::Describe(aProgress)));
 			myBakeLabel->setStyleSheet(QString());

@@ -396,8 +396,7 @@ private slots:
 	{
 		BakeProgress progress;
 		QCOMPARE(BakeRunner::Describe(progress), QString());
-		progress.myRunningFlag = true;
-		progress.myPhase = QStringLiteral("ambient");
+		progress.myPhase = Zeph::BakePhase::AMBIENT;
 		progress.myBounce = 1;
 		progress.myBounceCount = 2;
 		progress.myProbesDone = 120;
@@ -410,8 +409,7 @@ private slots:
 		QCOMPARE(BakeRunner::Describe(progress),
 		         QStringLiteral("Ambient: bounce 1/2, 120/468 probes, about 3 min 05 s left"));
 		progress = BakeProgress();
-		progress.myRunningFlag = true;
-		progress.myPhase = QStringLiteral("reflections");
+		progress.myPhase = Zeph::BakePhase::REFLECTIONS;
 		progress.myRoomsDone = 3;
 		progress.myRoomsTotal = 8;
 		progress.myElapsedSeconds = 2.2;
@@ -451,8 +449,7 @@ private slots:
 		QCOMPARE(bake.myRequests.size(), 1);
 
 		// Progress is polled while it runs.
-		bake.myProgress.myRunningFlag = true;
-		bake.myProgress.myPhase = QStringLiteral("ambient");
+		bake.myProgress.myPhase = Zeph::BakePhase::AMBIENT;
 		bake.myProgress.myProbesDone = 5;
 		bake.myProgress.myProbesTotal = 10;
 		QTRY_COMPARE(Child<QProgressBar>(panel, "progress")->value(), 500);
