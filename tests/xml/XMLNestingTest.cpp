@@ -48,6 +48,9 @@ TEST(XMLNestingScan, CountsOnlyWhatTinyXmlEntersAndNamesTheLine)
 	    // '<' before anything but a letter, '_' or a UTF-8 byte opens no element.
 	    {"<a><b>< c><1><_><\xc3\xa9>", 1},
 	    {std::string("<a><b>\0<c><d>", 12), 0},
+	    // A NUL where a character starts ends the text; one right after a lead byte is part of
+	    // that character, and the parser reads on past it.
+	    {std::string("<a>\xd0\0<b><c>", 11), 1},
 	    // End tags outside every element close nothing.
 	    {"</a></a></a><a><b><c>", 1},
 	};

@@ -10,12 +10,12 @@ namespace
 class Scanner
 {
 public:
-	explicit Scanner(std::string_view aText) : myText(aText.substr(0, aText.find('\0'))) {}
+	explicit Scanner(std::string_view aText) : myText(aText) {}
 
 	int FindTooDeep(int aMaxDepth)
 	{
 		int depth = 0;
-		while (myAt < myText.size())
+		while (More())
 		{
 			if (myText[myAt] != '<')
 			{
@@ -88,7 +88,7 @@ private:
 
 	bool AtWhiteSpace() const
 	{
-		return myAt < myText.size() && std::isspace(static_cast<unsigned char>(myText[myAt])) != 0;
+		return More() && std::isspace(static_cast<unsigned char>(myText[myAt])) != 0;
 	}
 
 	void SkipWhiteSpace()
@@ -109,7 +109,7 @@ private:
 		{
 			Step();
 		}
-		while (myAt < myText.size())
+		while (More())
 		{
 			if (myText[myAt] == '>')
 			{
@@ -124,7 +124,7 @@ private:
 			}
 			else
 			{
-				while (myAt < myText.size() && myText[myAt] != '>' && !AtWhiteSpace())
+				while (More() && myText[myAt] != '>' && !AtWhiteSpace())
 				{
 					Step();
 				}
@@ -135,7 +135,7 @@ private:
 	// name = value, the value quoted or up to white space, '/' or '>'.
 	void SkipAttribute()
 	{
-		while (myAt < myText.size() && myText[myAt] != '=' && myText[myAt] != '>' && !AtWhiteSpace())
+		while (More() && myText[myAt] != '=' && myText[myAt] != '>' && !AtWhiteSpace())
 		{
 			Step();
 		}
@@ -146,21 +146,21 @@ private:
 		}
 		Step();
 		SkipWhiteSpace();
-		if (myAt < myText.size() && (myText[myAt] == '"' || myText[myAt] == '\''))
+		if (More() && (myText[myAt] == '"' || myText[myAt] == '\''))
 		{
 			const char quote = myText[myAt];
 			Step();
-			while (myAt < myText.size() && myText[myAt] != quote)
+			while (More() && myText[myAt] != quote)
 			{
 				StepCharacter();
 			}
-			if (myAt < myText.size())
+			if (More())
 			{
 				Step();
 			}
 			return;
 		}
-		while (myAt < myText.size() && myText[myAt] != '/' && myText[myAt] != '>' && !AtWhiteSpace())
+		while (More() && myText[myAt] != '/' && myText[myAt] != '>' && !AtWhiteSpace())
 		{
 			Step();
 		}
@@ -177,6 +177,11 @@ private:
 		const unsigned char next = static_cast<unsigned char>(myText[myAt + 1]);
 		return next == '_' || next >= 127 || (next >= 'a' && next <= 'z') || (next >= 'A' && next <= 'Z');
 	}
+
+	// TinyXML parses the text as a C string: it ends at a NUL met where a character starts. A NUL
+	// right after a UTF-8 lead byte belongs to that character (StepCharacter steps over it), and
+	// the parser reads on past it.
+	bool More() const { return myAt < myText.size() && myText[myAt] != '\0'; }
 
 	void Step()
 	{
@@ -206,7 +211,7 @@ private:
 	void SkipPast(const char* aTerminator, bool aCharactersFlag = false)
 	{
 		const size_t length = std::strlen(aTerminator);
-		while (myAt < myText.size() && myText.compare(myAt, length, aTerminator) != 0)
+		while (More() && myText.compare(myAt, length, aTerminator) != 0)
 		{
 			if (aCharactersFlag)
 			{
@@ -228,17 +233,17 @@ private:
 	bool OpenTag()
 	{
 		Step();
-		while (myAt < myText.size())
+		while (More())
 		{
 			const char c = myText[myAt];
 			if (c == '"' || c == '\'')
 			{
 				Step();
-				while (myAt < myText.size() && myText[myAt] != c)
+				while (More() && myText[myAt] != c)
 				{
 					StepCharacter();
 				}
-				if (myAt < myText.size())
+				if (More())
 				{
 					Step();
 				}
