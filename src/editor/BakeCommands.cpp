@@ -48,6 +48,41 @@ std::string FindRooms(const GrowingArray<Zeph::Room*>& someRooms, const std::vec
 	return someIDs.empty() ? "no room IDs given" : std::string();
 }
 
+// The record of a bake whose outputs are in place: what it wrote and what it was made from.
+bool WriteRecord(const std::string& aLevel, BakePhase aPhase, const std::vector<std::string>& someRooms,
+                 const GrowingArray<Zeph::Room*>& someLevelRooms, int aBounces,
+                 const std::map<std::string, double>& someTimings, std::string& aMessageOut)
+{
+	std::vector<std::string> written;
+	if (aPhase == BakePhase::AMBIENT)
+	{
+		written.push_back(AmbientPath(ToWide(aLevel)));
+	}
+	else
+	{
+		for (int index = 0; index < someLevelRooms.Count(); ++index)
+		{
+			const std::string& id = someLevelRooms[index]->GetID();
+			const std::string file = Zeph::CubemapContainer::GetRoomFile(aLevel, id);
+			if (!file.empty() &&
+			    (someRooms.empty() || std::find(someRooms.begin(), someRooms.end(), id) != someRooms.end()))
+			{
+				written.push_back(file);
+			}
+		}
+	}
+	BakePhaseRecord record = MakeBakePhaseRecord(someRooms, written, someTimings, CollectBakeInputs(aLevel));
+	if (aPhase == BakePhase::AMBIENT)
+	{
+		const Zeph::AmbientGrid grid = Zeph::AmbientGrid::FromRooms(someLevelRooms);
+		record.myBounces = aBounces;
+		std::copy(grid.myCounts, grid.myCounts + 3, record.myGrid.myCounts);
+		record.myGrid.myWorldMin = grid.myWorldMin;
+		record.myGrid.myWorldSize = grid.myWorldSize;
+	}
+	return RecordBakePhase(aLevel, aPhase, record, aMessageOut);
+}
+
 // After a bake that finished, what it wrote and what it was made from go into the level's
 // bake.json. A record that cannot be written is an error entry; the baked files stand.
 void RecordPhase(const std::u16string& aLevel, BakePhase aPhase, const std::vector<std::string>& someRooms,
@@ -59,40 +94,15 @@ void RecordPhase(const std::u16string& aLevel, BakePhase aPhase, const std::vect
 	{
 		return;
 	}
-	const std::string level = ToNarrow(aLevel);
-	std::vector<std::string> written;
 	std::map<std::string, double> timings{{"total", status.myElapsedSeconds}};
 	if (aPhase == BakePhase::AMBIENT)
 	{
-		written.push_back(AmbientPath(aLevel));
 		timings["rendering"] = renderer.GetBakeTimings().myRendering;
 		timings["readback"] = renderer.GetBakeTimings().myReadback;
 		timings["projection"] = renderer.GetBakeTimings().myProjection;
 	}
-	else
-	{
-		for (int index = 0; index < someLevelRooms.Count(); ++index)
-		{
-			const std::string& id = someLevelRooms[index]->GetID();
-			const std::string file = Zeph::CubemapContainer::GetRoomFile(level, id);
-			if (!file.empty() &&
-			    (someRooms.empty() || std::find(someRooms.begin(), someRooms.end(), id) != someRooms.end()))
-			{
-				written.push_back(file);
-			}
-		}
-	}
-	BakePhaseRecord record = MakeBakePhaseRecord(someRooms, written, timings, CollectBakeInputs(level));
-	if (aPhase == BakePhase::AMBIENT)
-	{
-		const Zeph::AmbientGrid grid = Zeph::AmbientGrid::FromRooms(someLevelRooms);
-		record.myBounces = aBounces;
-		std::copy(grid.myCounts, grid.myCounts + 3, record.myGrid.myCounts);
-		record.myGrid.myWorldMin = grid.myWorldMin;
-		record.myGrid.myWorldSize = grid.myWorldSize;
-	}
 	std::string message;
-	if (!RecordBakePhase(level, aPhase, record, message))
+	if (!WriteRecord(ToNarrow(aLevel), aPhase, someRooms, someLevelRooms, aBounces, timings, message))
 	{
 		Zeph::ReportError(__LINE__, "Lumora::LumoraWrapper::RecordBake", "%s", message.c_str());
 	}
@@ -285,6 +295,39 @@ bool LumoraWrapper::MergeAmbientParts(const std::u16string& aLevel, const std::v
 	Zeph::AmbientVolume volume;
 	return Zeph::MergeAmbientParts(someParts, expected, volume, aProblemOut) &&
 	       Zeph::WriteAmbientVolume(anOutFile, volume, aProblemOut);
+}
+
+bool LumoraWrapper::BakeSpecularPart(const std::u16string& aLevel, const std::string& aRoomID,
+                                     const std::string& anAmbientFile, const std::string& anOutFile,
+                                     std::string& aProblemOut)
+{
+	Claim();
+	Zeph::Renderer& renderer = Zeph::Engine::GetInstance()->GetRenderer();
+	if (!anAmbientFile.empty())
+	{
+		renderer.SetSH(anAmbientFile);
+	}
+	QueueBakeScene();
+	const bool bakedFlag = renderer.GenerateReflectionPart(myRooms, aRoomID, anOutFile);
+	renderer.DiscardLateItems();
+	if (!anAmbientFile.empty())
+	{
+		renderer.SetSH(AmbientPath(aLevel));
+	}
+	Release();
+	aProblemOut = bakedFlag ? std::string() : UnfinishedBake("reflection part");
+	return bakedFlag;
+}
+
+bool LumoraWrapper::RecordBake(const std::u16string& aLevel, BakePhase aPhase,
+                               const std::vector<std::string>& someRooms, int aBounces,
+                               const std::map<std::string, double>& someTimings, std::string& aProblemOut)
+{
+	Claim();
+	const bool writtenFlag =
+	    WriteRecord(ToNarrow(aLevel), aPhase, someRooms, myRooms, aBounces, someTimings, aProblemOut);
+	Release();
+	return writtenFlag;
 }
 
 void LumoraWrapper::CancelBake()

@@ -40,6 +40,7 @@
 #include "core/GrowingArray.h"
 #include "editor/DecalStruct.h"
 #include "editor/DecalType.h"
+#include "editor/BakeRecord.h"
 #include "editor/DecalTypeStruct.h"
 #include "editor/LightOverlays.h"
 #include "editor/LumoraMode.h"
@@ -235,6 +236,20 @@ public:
 	// volumes, overlaps and gaps.
 	bool MergeAmbientParts(const std::u16string& aLevel, const std::vector<std::string>& someParts,
 	                       const std::string& anOutFile, std::string& aProblemOut);
+	// The reflection bake spread over machines: the cubemap of the loaded level's room aRoomID,
+	// rendered as BakeSpecular renders it, lit by the ambient volume in anAmbientFile (the
+	// merged volume of an ambient bake that has not replaced the level's yet; empty: the
+	// level's own ambient.sh), into anOutFile. The level's files, its bake record and the
+	// reflections shown are untouched.
+	bool BakeSpecularPart(const std::u16string& aLevel, const std::string& aRoomID,
+	                      const std::string& anAmbientFile, const std::string& anOutFile,
+	                      std::string& aProblemOut);
+	// Writes a phase's entry of the level's bake record (bake.json) for outputs that are in place,
+	// hashing the loaded level's inputs: what the driver of a bake spread over machines calls once
+	// it has put the outputs together. someRooms empty: every room; aBounces: the ambient phase's.
+	// False, with the reason, when the record cannot be written (the old one stays).
+	bool RecordBake(const std::u16string& aLevel, BakePhase aPhase, const std::vector<std::string>& someRooms,
+	                int aBounces, const std::map<std::string, double>& someTimings, std::string& aProblemOut);
 
 	// Post-processing settings.
 	void UpdateSSAO(float aScale, float aSampleRadius, float aBias, float anIntensity);

@@ -157,22 +157,11 @@ void Renderer::GenerateReflections(const GrowingArray<Room*>& someRooms, const s
 			myBakeMonitor.AddRoom();
 			continue;
 		}
-		// The filter of the previous room drew through viewports of its own.
-		context.SetViewport(cube->GetViewport());
-		for (int face = 0; face < DynamicCubemap::ourFaceCount && !cancelledFlag; ++face)
-		{
-			cancelledFlag = myBakeMonitor.IsCancelRequested();
-			if (!cancelledFlag)
-			{
-				RenderProbeFace(*cube, face, room->GetCenterPosition(), gbuffer, true);
-			}
-		}
-		cancelledFlag = cancelledFlag || myBakeMonitor.IsCancelRequested();
+		cancelledFlag = !RenderRoomReflection(*cube, *room, gbuffer);
 		if (cancelledFlag)
 		{
 			break;
 		}
-		PrefilterReflection(*cube);
 		// A file that cannot be written leaves the room with its old cubemap; the save
 		// reports it, the bake goes on.
 		std::string temporary;
@@ -202,6 +191,62 @@ void Renderer::GenerateReflections(const GrowingArray<Room*>& someRooms, const s
 	gbuffer.Destroy();
 	myBakeMonitor.End(cancelledFlag ? BakeResult::CANCELLED : BakeResult::FINISHED,
 	                  cancelledFlag ? "every cubemap is left as it was" : "");
+}
+
+bool Renderer::RenderRoomReflection(DynamicCubemap& aCube, const Room& aRoom,
+                                    DeferredRenderTargetHelper& aGBuffer)
+{
+	Gpu::Context& context = Engine::GetInstance()->GetContext();
+	// The filter of the previous room drew through viewports of its own.
+	context.SetViewport(aCube.GetViewport());
+	for (int face = 0; face < DynamicCubemap::ourFaceCount; ++face)
+	{
+		if (myBakeMonitor.IsCancelRequested())
+		{
+			return false;
+		}
+		RenderProbeFace(aCube, face, aRoom.GetCenterPosition(), aGBuffer, true);
+	}
+	if (myBakeMonitor.IsCancelRequested())
+	{
+		return false;
+	}
+	PrefilterReflection(aCube);
+	return true;
+}
+
+bool Renderer::GenerateReflectionPart(const GrowingArray<Room*>& someRooms, const std::string& aRoomID,
+                                      const std::string& anOutFile)
+{
+	Engine* engine = Engine::GetInstance();
+	DynamicCubemap* cube = myProbeHelper ? myProbeHelper->GetReflectionCubemap() : nullptr;
+	const Room* room = nullptr;
+	for (int index = 0; index < someRooms.Count() && room == nullptr; ++index)
+	{
+		room = someRooms[index]->GetID() == aRoomID ? someRooms[index] : nullptr;
+	}
+	if (engine == nullptr || cube == nullptr || cube->GetTexture() == nullptr || room == nullptr)
+	{
+		myBakeMonitor.End(BakeResult::FAILED, room == nullptr ? "the level has no room with the ID '" + aRoomID + "'"
+		                                                      : std::string("the reflection cubemap could not be made"));
+		return false;
+	}
+	myBakeMonitor.Begin(BakePhase::REFLECTIONS, 0, 1, 0);
+	myBakingProgress = 0;
+	DeferredRenderTargetHelper gbuffer;
+	gbuffer.Init(cube->GetSize(), cube->GetSize());
+	const bool renderedFlag = RenderRoomReflection(*cube, *room, gbuffer);
+	const bool savedFlag = renderedFlag && Gpu::SaveTextureToDds(engine->GetContext(), *cube->GetTexture(), anOutFile);
+	myCollector.Reset();
+	gbuffer.Destroy();
+	if (renderedFlag)
+	{
+		myBakingProgress = 100;
+		myBakeMonitor.AddRoom();
+	}
+	myBakeMonitor.End(!renderedFlag ? BakeResult::CANCELLED : savedFlag ? BakeResult::FINISHED : BakeResult::FAILED,
+	                  !renderedFlag ? "nothing written" : savedFlag ? "" : "cannot write " + anOutFile);
+	return savedFlag;
 }
 
 void Renderer::PrefilterReflection(DynamicCubemap& aCube)

@@ -184,6 +184,11 @@ public:
 	// cubemaps are written when the last is done, so a cancelled bake writes none.
 	void GenerateReflections(const GrowingArray<Room*>& someRooms, const std::string& aLevel,
 	                         const std::vector<std::string>* someBakedRooms = nullptr);
+	// A bake spread over machines: the room with the ID aRoomID rendered as GenerateReflections
+	// renders it, into anOutFile (through a temporary); the level's cubemaps are untouched.
+	// False when the room is not found (the status's message says so), cancelled or not written.
+	bool GenerateReflectionPart(const GrowingArray<Room*>& someRooms, const std::string& aRoomID,
+	                            const std::string& anOutFile);
 	int GetBakingProgress() const { return myBakingProgress.load(); }
 	// Any thread: the running bake stops within one probe (ambient) or one cube face
 	// (reflections) and writes nothing; the volume shown is reloaded from the file. A
@@ -250,6 +255,9 @@ private:
 	// The reflection cubemap's mips 1..8 filtered from mip 0 through the cross of each
 	// face and its neighbours (the ProbeHelper's filter target).
 	void PrefilterReflection(DynamicCubemap& aCube);
+	// A room's six faces rendered from its centre into aCube and pre-filtered; false when the
+	// bake was asked to stop.
+	bool RenderRoomReflection(DynamicCubemap& aCube, const Room& aRoom, DeferredRenderTargetHelper& aGBuffer);
 	// The ambient bakes' common run: bounces of the selected probes into someBlocks
 	// (AmbientBake.cpp). False when cancelled.
 	struct SHBakeJob;

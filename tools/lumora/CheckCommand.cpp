@@ -1,12 +1,8 @@
 // lumora check: the level read the way the editor reads it, with every report made
 // non-fatal and listed, and what loading passes over in silence (LevelCheck.h).
-#include <algorithm>
-#include <cctype>
 #include <cstdio>
-#include <cstring>
 #include <nlohmann/json.hpp>
 #include <string>
-#include <string_view>
 #include <vector>
 
 #include "Commands.h"
@@ -17,55 +13,15 @@ namespace LumoraTool
 {
 namespace
 {
-// A name as the XML reader writes element and attribute names into its messages.
-bool IsName(std::string_view aText)
-{
-	if (aText.empty() || !(std::isalpha(static_cast<unsigned char>(aText[0])) || aText[0] == '_'))
-	{
-		return false;
-	}
-	return std::all_of(aText.begin(), aText.end(), [](char aCharacter) {
-		return std::isalnum(static_cast<unsigned char>(aCharacter)) || std::strchr("-_.:", aCharacter) != nullptr;
-	});
-}
-
-// One problem line as a record: the file it names (the first data/... path), the element or
-// attribute it names (the first name in brackets, as the XML reader names them, or in quotes),
-// and the line itself.
 nlohmann::json ProblemRecord(const std::string& aProblem, bool aBakedFlag)
 {
-	nlohmann::json record;
-	record["message"] = aProblem;
-	std::string file;
-	if (const size_t start = aProblem.find("data/"); start != std::string::npos)
-	{
-		const size_t end = aProblem.find_first_of(" \t:,;\"'[]()", start);
-		file = aProblem.substr(start, end == std::string::npos ? std::string::npos : end - start);
-	}
-	record["file"] = file;
-	std::string element;
-	for (size_t open = aProblem.find_first_of("[\""); open != std::string::npos && element.empty();
-	     open = aProblem.find_first_of("[\"", open + 1))
-	{
-		const size_t close = aProblem.find(aProblem[open] == '[' ? ']' : '"', open + 1);
-		if (close == std::string::npos)
-		{
-			break;
-		}
-		const std::string_view inside = std::string_view(aProblem).substr(open + 1, close - open - 1);
-		if (IsName(inside))
-		{
-			element = std::string(inside);
-		}
-		else if (aProblem[open] == '"')
-		{
-			// A quoted text that is no name: its closing quote opens nothing.
-			open = close;
-		}
-	}
-	record["element"] = element;
-	record["baked"] = aBakedFlag;
-	return record;
+	const CheckRecord record = MakeCheckRecord(aProblem, aBakedFlag);
+	nlohmann::json json;
+	json["message"] = record.myMessage;
+	json["file"] = record.myFile;
+	json["element"] = record.myElement;
+	json["baked"] = record.myBakedFlag;
+	return json;
 }
 
 int PrintJson(const std::string& aLevel, const LevelReport& aReport)

@@ -1,6 +1,10 @@
 #include "LevelCheck.h"
 
+#include <algorithm>
+#include <cctype>
+#include <cstring>
 #include <filesystem>
+#include <string_view>
 #include <map>
 #include <set>
 #include <sstream>
@@ -250,6 +254,18 @@ void CheckSavedSections(const std::string& aLevel, LevelReport& aReport)
 		}
 	}
 }
+
+// A name as the XML reader writes element and attribute names into its messages.
+bool IsName(std::string_view aText)
+{
+	if (aText.empty() || !(std::isalpha(static_cast<unsigned char>(aText[0])) || aText[0] == '_'))
+	{
+		return false;
+	}
+	return std::all_of(aText.begin(), aText.end(), [](char aCharacter) {
+		return std::isalnum(static_cast<unsigned char>(aCharacter)) || std::strchr("-_.:", aCharacter) != nullptr;
+	});
+}
 } // namespace
 
 LevelReport CheckLevel(EditorSession& aSession, const std::string& aLevel)
@@ -270,5 +286,41 @@ LevelReport CheckLevel(EditorSession& aSession, const std::string& aLevel)
 	const auto [ambientFlag, reflectionsFlag] = NoteUnbakedFiles(aLevel, editor, report);
 	CheckBakeRecord(aLevel, ambientFlag, reflectionsFlag, report);
 	return report;
+}
+
+CheckRecord MakeCheckRecord(const std::string& aProblem, bool aBakedFlag)
+{
+	CheckRecord record;
+	record.myMessage = aProblem;
+	std::string file;
+	if (const size_t start = aProblem.find("data/"); start != std::string::npos)
+	{
+		const size_t end = aProblem.find_first_of(" \t:,;\"'[]()", start);
+		file = aProblem.substr(start, end == std::string::npos ? std::string::npos : end - start);
+	}
+	record.myFile = file;
+	std::string element;
+	for (size_t open = aProblem.find_first_of("[\""); open != std::string::npos && element.empty();
+	     open = aProblem.find_first_of("[\"", open + 1))
+	{
+		const size_t close = aProblem.find(aProblem[open] == '[' ? ']' : '"', open + 1);
+		if (close == std::string::npos)
+		{
+			break;
+		}
+		const std::string_view inside = std::string_view(aProblem).substr(open + 1, close - open - 1);
+		if (IsName(inside))
+		{
+			element = std::string(inside);
+		}
+		else if (aProblem[open] == '"')
+		{
+			// A quoted text that is no name: its closing quote opens nothing.
+			open = close;
+		}
+	}
+	record.myElement = element;
+	record.myBakedFlag = aBakedFlag;
+	return record;
 }
 } // namespace LumoraTool

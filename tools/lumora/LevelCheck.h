@@ -28,6 +28,18 @@ struct LevelReport
 	std::vector<std::string> myNotes;
 };
 
+// One problem line as a record for tools: the file it names (the first data/... path), the element
+// or attribute it names (the first name in brackets, as the XML reader names them, or in quotes),
+// and the line itself. aBakedFlag: one of the baked outputs' problems.
+struct CheckRecord
+{
+	std::string myMessage;
+	std::string myFile;
+	std::string myElement;
+	bool myBakedFlag = false;
+};
+CheckRecord MakeCheckRecord(const std::string& aProblem, bool aBakedFlag);
+
 // Loads aLevel into the started session and checks it. The reports made while the session
 // started (the catalogues are read then) count as the level's problems too.
 LevelReport CheckLevel(EditorSession& aSession, const std::string& aLevel);
