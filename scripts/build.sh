@@ -19,5 +19,10 @@ if [ "${CI:-}" = "true" ]; then
 	options+=(-DLUMORA_WERROR=ON)
 fi
 
+# The Python module is built for Debian's interpreter, whose packages (NumPy, Dask, pytest) the
+# install script puts in place; another python3 earlier on the PATH would lack them.
+if [ -x /usr/bin/python3 ]; then
+	options+=(-DPython3_EXECUTABLE=/usr/bin/python3)
+fi
 cmake -S . -B "$dir" -G Ninja -DCMAKE_BUILD_TYPE=RelWithDebInfo "${options[@]}"
 cmake --build "$dir" -j "$(nproc)"

@@ -24,6 +24,9 @@ PACKAGES=(
 	libx11-dev xvfb
 	# the desktop editor: Qt 6 Widgets and Qt Test (its window tests run under Xvfb)
 	qt6-base-dev
+	# the Python module (pybind11 over the library, built for Debian's /usr/bin/python3), its
+	# tests (pytest, NumPy) and the bakes spread over a Dask cluster
+	python3-dev pybind11-dev python3-numpy python3-pytest python3-dask python3-distributed
 	# screen text: fontconfig finds families, FreeType rasterises; Liberation stands in for Arial
 	libfontconfig-dev libfreetype-dev fonts-liberation
 )

@@ -280,7 +280,7 @@ void WriteObject(LumoraWrapper& aFacade, const Checked& someValues)
 
 void SelectOrThrow(LumoraWrapper& aFacade, int aKind, int anIndex)
 {
-	if (!aFacade.Select(FacadeKind(aKind), anIndex))
+	if (anIndex < 0 || !aFacade.Select(FacadeKind(aKind), anIndex))
 	{
 		throw std::out_of_range(std::string("no ") + ourKindNames[aKind] + " " + std::to_string(anIndex) +
 		                        " (the level has " + std::to_string(Count(aFacade, aKind)) + ")");
