@@ -10,11 +10,14 @@ lumora.distributed bakes a level over a Dask cluster.
 """
 
 from ._editor import Editor, LumoraError, check
+from ._files import (AmbientVolume, BakeGrid, BakePhaseRecord, BakeRecord, BakeRoomUpdate, DdsImage,
+                     read_bake_record, stale_inputs)
 from ._records import (BakeResult, BakeStatus, CheckReport, Decal, PathNode, PointLight, Problem, Room,
                        SpotLight)
 
 __all__ = [
     "Editor", "LumoraError", "check",
     "PointLight", "SpotLight", "Decal", "PathNode", "Room", "Problem", "CheckReport", "BakeStatus",
-    "BakeResult",
+    "BakeResult", "AmbientVolume", "DdsImage", "BakeRecord", "BakePhaseRecord", "BakeGrid", "BakeRoomUpdate",
+    "read_bake_record", "stale_inputs",
 ]

@@ -67,6 +67,12 @@ EngineSession::EngineSession(const std::string& aDataFolder, int aWidth, int aHe
 	const std::vector<std::string> problems = ReportCollector::Get().ProblemsSince(mark);
 	if (!createdFlag || Lumora::LumoraWrapper::GetInstance() == nullptr)
 	{
+		// What did start is shut down, so the next Editor can start.
+		if (Lumora::LumoraWrapper::GetInstance() != nullptr)
+		{
+			py::gil_scoped_release unlocked;
+			Lumora::LumoraWrapper::ShutDown();
+		}
 		ReportCollector::Get().StopListening();
 		throw LumoraError("the engine did not start in " + myDataFolder +
 		                  (problems.empty() ? std::string(" (is an OpenGL 4.5 driver installed?)")

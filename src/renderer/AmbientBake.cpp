@@ -8,6 +8,7 @@
 #include <cmath>
 #include <cstring>
 #include <functional>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -205,6 +206,9 @@ struct Renderer::SHBakeJob
 	int myFirstBounce = 1;
 	int myBounceCount = 1;
 	bool myDebugFlag = false;
+	// A part of a bake spread over machines: its probes start from the G-buffer the whole bake
+	// would have (RunSHBake).
+	bool myPartFlag = false;
 	// Where the volume goes, for the log.
 	std::string myTarget;
 };
@@ -258,6 +262,42 @@ Renderer::SHBakeRun Renderer::RunSHBake(const SHBakeJob& aJob, std::vector<uint3
 	}
 
 	Gpu::Context& context = engine->GetContext();
+	if (aJob.myPartFlag)
+	{
+		// Every probe of a bake draws into this one G-buffer, which is not cleared between faces
+		// or probes: where a face sees nothing, what the faces before it drew stays, and the
+		// ambient pass lights it. A part starts where the whole bake would be: the probe the whole
+		// bake draws just before the part's first (in this bounce, or the last of the bounce
+		// before) is drawn first and thrown away. Exact wherever that probe's six faces cover
+		// what the part's first face leaves empty, as they do in rooms closed but for doors.
+		std::optional<Vector3<float>> last;
+		std::optional<Vector3<float>> beforeFirst;
+		bool firstFoundFlag = false;
+		grid.ForEachProbe([&](const Vector3<float>& aProbe, int, int, int, size_t aCell) {
+			if (!firstFoundFlag && selected(aProbe, aCell))
+			{
+				firstFoundFlag = true;
+				beforeFirst = last;
+			}
+			if (AmbientGrid::StrictlyInsideAnyRoom(rooms, aProbe))
+			{
+				last = aProbe;
+			}
+		});
+		if (!beforeFirst && aJob.myFirstBounce > 1)
+		{
+			beforeFirst = last;
+		}
+		if (beforeFirst)
+		{
+			Stopwatch watch;
+			for (int face = 0; face < 6; ++face)
+			{
+				RenderProbeFace(*cube, face, *beforeFirst, gbuffer, false);
+			}
+			myBakeTimings.myRendering += watch.Lap();
+		}
+	}
 	ProbeAtlas atlas;
 	const bool batchedFlag =
 	    myProbeReadback == ProbeReadback::BATCHED && atlas.Init(context, cube->GetSize());
@@ -555,6 +595,7 @@ bool Renderer::GenerateSHPart(const GrowingArray<Room*>& someRooms, int aBounce,
 	job.myFirstLight = aBounce > 1 ? aPrevious->myBlocks : nullptr;
 	job.myFirstBounce = aBounce;
 	job.myBounceCount = 1;
+	job.myPartFlag = true;
 	job.myTarget = "cells " + std::to_string(aFirst) + " to " + std::to_string(aFirst + aCount - 1) +
 	               " of bounce " + std::to_string(aBounce);
 	const SHBakeRun run = RunSHBake(job, blocks);

@@ -32,7 +32,7 @@ def _level_files(data_root: str, level: str) -> List[Tuple[str, str]]:
     """(path relative to data_root, absolute path) of every file the level's bake reads, sorted."""
     files = []
     data = os.path.join(data_root, "data")
-    for folder, subfolders, names in os.walk(data):
+    for folder, subfolders, names in os.walk(data, followlinks=True):
         relative = os.path.relpath(folder, data_root)
         parts = tuple(part.lower() for part in relative.split(os.sep))[1:]
         kept = []
