@@ -8,6 +8,6 @@ namespace LumoraPython
 void RegisterEngine(pybind11::module_& aModule);
 // check(data, level) (CheckBinding.cpp).
 void RegisterCheck(pybind11::module_& aModule);
-// read_ambient, read_dds, read_bake_record, write_png (FileBinding.cpp).
+// read_ambient, read_dds, read_bake_record, stale_inputs (FileBinding.cpp).
 void RegisterFiles(pybind11::module_& aModule);
 } // namespace LumoraPython
