@@ -19,7 +19,7 @@ from .._editor import Editor
 _WIDTH, _HEIGHT = 320, 180
 
 _lock = threading.Lock()
-_state = {"key": None, "editor": None}
+_state = {"key": None, "editor": None, "fresh": False}
 
 
 def _base_folder() -> str:
@@ -49,7 +49,7 @@ def _editor_for(package, level: str) -> Editor:
     except BaseException:
         editor.close()
         raise
-    _state["editor"], _state["key"] = editor, key
+    _state["editor"], _state["key"], _state["fresh"] = editor, key, True
     return editor
 
 
@@ -62,6 +62,12 @@ def bake_ambient_part(package, level: str, bounce: int, previous: Optional[bytes
     """Bounce ``bounce`` of cells first .. first + count - 1, lit by the merged volume ``previous``
     of the bounce before (None for bounce 1): the part file's bytes."""
     with _lock:
+        if not _state["fresh"] and _state["editor"] is not None:
+            # A part is tied to the hash of the inputs the engine has loaded; a reflection bake loads
+            # textures of its own, which the driver's freshly started engine does not list. The
+            # engine is started again.
+            _state["editor"].close()
+            _state["editor"] = None
         editor = _editor_for(package, level)
         scratch = _scratch(editor)
         try:
@@ -83,6 +89,7 @@ def bake_reflection(package, level: str, room: str, ambient: Optional[bytes]) ->
     level's own ambient.sh)."""
     with _lock:
         editor = _editor_for(package, level)
+        _state["fresh"] = False
         scratch = _scratch(editor)
         try:
             ambient_path = None
