@@ -43,10 +43,12 @@ py::dict Check(const std::string& aDataFolder, const std::string& aLevel)
 	}
 	if (!startedFlag)
 	{
-		throw LumoraError("the engine did not start to check '" + aLevel + "' (the reason is on standard error)");
+		throw LumoraError("the engine did not start to check '" + aLevel +
+		                  "' (the reason is on standard error)");
 	}
 	py::list problems;
-	for (const auto& [list, bakedFlag] : {std::pair{&report.myProblems, false}, std::pair{&report.myBakedProblems, true}})
+	for (const auto& [list, bakedFlag] :
+	     {std::pair{&report.myProblems, false}, std::pair{&report.myBakedProblems, true}})
 	{
 		for (const std::string& line : *list)
 		{
@@ -69,8 +71,9 @@ py::dict Check(const std::string& aDataFolder, const std::string& aLevel)
 
 void RegisterCheck(py::module_& aModule)
 {
-	aModule.def("check", &Check, py::arg("data"), py::arg("level"),
-	            "The level's problems (dicts: message, file, element, baked) and notes, as `lumora check --json` "
-	            "lists them.");
+	aModule.def(
+	    "check", &Check, py::arg("data"), py::arg("level"),
+	    "The level's problems (dicts: message, file, element, baked) and notes, as `lumora check --json` "
+	    "lists them.");
 }
 } // namespace LumoraPython

@@ -50,8 +50,8 @@ EngineSession::EngineSession(const std::string& aDataFolder, int aWidth, int aHe
 	}
 	if (aWidth < 1 || aHeight < 1 || aWidth > 16384 || aHeight > 16384)
 	{
-		throw std::invalid_argument("the view size must be 1..16384 pixels each way, not " + std::to_string(aWidth) +
-		                            " x " + std::to_string(aHeight));
+		throw std::invalid_argument("the view size must be 1..16384 pixels each way, not " +
+		                            std::to_string(aWidth) + " x " + std::to_string(aHeight));
 	}
 	WorkingFolder here(myDataFolder);
 	// Nothing the library reports ends the interpreter: every report is collected and the
@@ -205,7 +205,8 @@ void EngineSession::Save()
 		facade.SaveLights(Lumora::ToWide(myLevel));
 		facade.SaveDecals(Lumora::ToWide(myLevel));
 	}
-	if (const std::vector<std::string> problems = ReportCollector::Get().ProblemsSince(mark); !problems.empty())
+	if (const std::vector<std::string> problems = ReportCollector::Get().ProblemsSince(mark);
+	    !problems.empty())
 	{
 		throw LumoraError("level '" + myLevel + "' was not saved whole:\n" + JoinLines(problems));
 	}
@@ -221,18 +222,20 @@ py::tuple EngineSession::GetCamera() const
 }
 
 py::array_t<uint8_t> EngineSession::Render(int aWidth, int aHeight, const py::object& aCamera, int aFrames,
-                                           const std::string& aMode, bool aMarkersFlag, const std::string& aPngPath)
+                                           const std::string& aMode, bool aMarkersFlag,
+                                           const std::string& aPngPath)
 {
 	Lumora::LumoraWrapper& facade = Facade();
 	if (aFrames < 1)
 	{
 		throw std::invalid_argument("frames must be at least 1");
 	}
-	const int mode = aMode == "light"  ? Lumora::LIGHT_MODE
-	                 : aMode == "node" ? Lumora::NODE_MODE
-	                 : aMode == "decal"
-	                     ? Lumora::DECAL_MODE
-	                     : throw std::invalid_argument("mode must be 'light', 'node' or 'decal', not '" + aMode + "'");
+	const int mode =
+	    aMode == "light"  ? Lumora::LIGHT_MODE
+	    : aMode == "node" ? Lumora::NODE_MODE
+	    : aMode == "decal"
+	        ? Lumora::DECAL_MODE
+	        : throw std::invalid_argument("mode must be 'light', 'node' or 'decal', not '" + aMode + "'");
 	Vector3<float> position;
 	float yaw = 0.0f;
 	float pitch = 0.0f;
@@ -278,8 +281,8 @@ py::array_t<uint8_t> EngineSession::Render(int aWidth, int aHeight, const py::ob
 	}
 	if (!sizedFlag)
 	{
-		throw LumoraError("cannot render at " + std::to_string(aWidth) + " x " + std::to_string(aHeight) + ": " +
-		                  ReportCollector::Get().LastSince(mark));
+		throw LumoraError("cannot render at " + std::to_string(aWidth) + " x " + std::to_string(aHeight) +
+		                  ": " + ReportCollector::Get().LastSince(mark));
 	}
 	if (!readFlag || pixels.size() != static_cast<size_t>(aWidth) * static_cast<size_t>(aHeight) * 4)
 	{
@@ -332,8 +335,8 @@ void RegisterEngine(py::module_& aModule)
 	    .def("merge_ambient_parts", &EngineSession::MergeAmbientParts, py::arg("parts"), py::arg("out"))
 	    .def("bake_reflection_part", &EngineSession::BakeReflectionPart, py::arg("room"), py::arg("ambient"),
 	         py::arg("out"))
-	    .def("record_bake", &EngineSession::RecordBake, py::arg("phase"), py::arg("rooms"), py::arg("bounces"),
-	         py::arg("seconds"))
+	    .def("record_bake", &EngineSession::RecordBake, py::arg("phase"), py::arg("rooms"),
+	         py::arg("bounces"), py::arg("seconds"))
 	    .def("render", &EngineSession::Render, py::arg("width"), py::arg("height"), py::arg("camera"),
 	         py::arg("frames"), py::arg("mode"), py::arg("markers"), py::arg("png"))
 	    .def("camera", &EngineSession::GetCamera);

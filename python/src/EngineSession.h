@@ -73,7 +73,8 @@ public:
 	void BakeAmbientPart(int aBounce, const std::string& aPrevious, long long aFirst, long long aCount,
 	                     const std::string& anOutFile);
 	void MergeAmbientParts(const std::vector<std::string>& someParts, const std::string& anOutFile);
-	void BakeReflectionPart(const std::string& aRoom, const std::string& anAmbientFile, const std::string& anOutFile);
+	void BakeReflectionPart(const std::string& aRoom, const std::string& anAmbientFile,
+	                        const std::string& anOutFile);
 	std::string RecordBake(const std::string& aPhase, const std::vector<std::string>& someRooms, int aBounces,
 	                       double aSeconds);
 
@@ -81,7 +82,8 @@ public:
 	// aFrames frames for the eye adaptation: an array of height x width x 3 bytes (RGB), also
 	// written to aPngPath when that is not empty.
 	pybind11::array_t<uint8_t> Render(int aWidth, int aHeight, const pybind11::object& aCamera, int aFrames,
-	                                  const std::string& aMode, bool aMarkersFlag, const std::string& aPngPath);
+	                                  const std::string& aMode, bool aMarkersFlag,
+	                                  const std::string& aPngPath);
 	// The camera's position, yaw and pitch.
 	pybind11::tuple GetCamera() const;
 

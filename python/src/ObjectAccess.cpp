@@ -49,8 +49,7 @@ int Count(const LumoraWrapper& aFacade, int aKind)
 	}
 }
 
-template <size_t N>
-py::tuple Tuple(const std::array<float, N>& someValues, size_t aCount = N)
+template <size_t N> py::tuple Tuple(const std::array<float, N>& someValues, size_t aCount = N)
 {
 	py::tuple tuple(aCount);
 	for (size_t index = 0; index < aCount; ++index)
@@ -136,7 +135,8 @@ float Number(const py::dict& someValues, const char* aKey)
 std::array<float, 3> Vector(const py::dict& someValues, const char* aKey)
 {
 	const auto values = someValues[aKey].cast<std::vector<float>>();
-	if (values.size() != 3 || !std::isfinite(values[0]) || !std::isfinite(values[1]) || !std::isfinite(values[2]))
+	if (values.size() != 3 || !std::isfinite(values[0]) || !std::isfinite(values[1]) ||
+	    !std::isfinite(values[2]))
 	{
 		throw std::invalid_argument(std::string(aKey) + " must be three finite numbers");
 	}
@@ -170,7 +170,8 @@ Checked Check(const LumoraWrapper& aFacade, int aKind, const py::dict& someValue
 		const std::string name = key.cast<std::string>();
 		if (ourKeys[aKind].count(name) == 0)
 		{
-			throw std::invalid_argument(std::string("a ") + ourKindNames[aKind] + " has no value '" + name + "'");
+			throw std::invalid_argument(std::string("a ") + ourKindNames[aKind] + " has no value '" + name +
+			                            "'");
 		}
 	}
 	Checked checked;
@@ -219,10 +220,12 @@ Checked Check(const LumoraWrapper& aFacade, int aKind, const py::dict& someValue
 		}
 		checked.myInnerCos = Number(someValues, "inner_cos");
 		checked.myOuterCos = Number(someValues, "outer_cos");
-		if (*checked.myInnerCos > 1.0f || *checked.myOuterCos < -1.0f || *checked.myInnerCos < *checked.myOuterCos)
+		if (*checked.myInnerCos > 1.0f || *checked.myOuterCos < -1.0f ||
+		    *checked.myInnerCos < *checked.myOuterCos)
 		{
-			throw std::invalid_argument("the cone's cosines must satisfy 1 >= inner_cos >= outer_cos >= -1 (the "
-			                            "inner cone inside the outer)");
+			throw std::invalid_argument(
+			    "the cone's cosines must satisfy 1 >= inner_cos >= outer_cos >= -1 (the "
+			    "inner cone inside the outer)");
 		}
 	}
 	if (has("type"))
@@ -230,7 +233,8 @@ Checked Check(const LumoraWrapper& aFacade, int aKind, const py::dict& someValue
 		checked.myType = someValues["type"].cast<std::string>();
 		if (aFacade.GetDecalTypes().count(*checked.myType) == 0)
 		{
-			throw std::invalid_argument("no decal type '" + *checked.myType + "' in the decal type catalogue");
+			throw std::invalid_argument("no decal type '" + *checked.myType +
+			                            "' in the decal type catalogue");
 		}
 	}
 	return checked;
@@ -333,8 +337,8 @@ int EngineSession::AddObject(int aKind, const py::dict& someValues)
 	}
 	if (Count(facade, aKind) != before + 1)
 	{
-		throw LumoraError(std::string("no ") + ourKindNames[aKind] + " added: " +
-		                  ReportCollector::Get().LastSince(mark));
+		throw LumoraError(std::string("no ") + ourKindNames[aKind] +
+		                  " added: " + ReportCollector::Get().LastSince(mark));
 	}
 	SelectOrThrow(facade, aKind, before);
 	WriteObject(facade, checked);
@@ -362,8 +366,8 @@ void EngineSession::RemoveObject(int aKind, int anIndex)
 	if (aKind == PATH_NODE && anIndex != before - 1 && anIndex >= 0 && anIndex < before)
 	{
 		// Removing another node would move the last one, and the edges holding it.
-		throw LumoraError("only the last path node (" + std::to_string(before - 1) + ") can be removed, not " +
-		                  std::to_string(anIndex));
+		throw LumoraError("only the last path node (" + std::to_string(before - 1) +
+		                  ") can be removed, not " + std::to_string(anIndex));
 	}
 	SelectOrThrow(facade, aKind, anIndex);
 	switch (aKind)
@@ -384,7 +388,8 @@ void EngineSession::RemoveObject(int aKind, int anIndex)
 	facade.Select(FacadeKind(aKind), -1);
 	if (Count(facade, aKind) != before - 1)
 	{
-		throw LumoraError(std::string(ourKindNames[aKind]) + " " + std::to_string(anIndex) + " was not removed");
+		throw LumoraError(std::string(ourKindNames[aKind]) + " " + std::to_string(anIndex) +
+		                  " was not removed");
 	}
 }
 } // namespace LumoraPython

@@ -73,6 +73,7 @@ std::string ReportCollector::LastSince(size_t aMark) const
 std::string DescribeReport(const ReportCollector::Report& aReport)
 {
 	const int level = aReport.myLevel >= 0 && aReport.myLevel <= 3 ? aReport.myLevel : 1;
-	return LumoraTool::Describe({static_cast<Debug::AssertLevels>(level), aReport.myFunction, aReport.myText});
+	return LumoraTool::Describe(
+	    {static_cast<Debug::AssertLevels>(level), aReport.myFunction, aReport.myText});
 }
 } // namespace LumoraPython

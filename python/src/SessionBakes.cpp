@@ -181,8 +181,8 @@ py::dict EngineSession::Bake(int aBounces, bool anAmbientFlag, bool aReflections
 	return outcome;
 }
 
-void EngineSession::BakeAmbientPart(int aBounce, const std::string& aPrevious, long long aFirst, long long aCount,
-                                    const std::string& anOutFile)
+void EngineSession::BakeAmbientPart(int aBounce, const std::string& aPrevious, long long aFirst,
+                                    long long aCount, const std::string& anOutFile)
 {
 	RequireLevel();
 	Lumora::LumoraWrapper& facade = Facade();
@@ -192,12 +192,13 @@ void EngineSession::BakeAmbientPart(int aBounce, const std::string& aPrevious, l
 	bool bakedFlag = false;
 	{
 		py::gil_scoped_release unlocked;
-		bakedFlag = facade.BakeAmbientPart(Lumora::ToWide(myLevel), aBounce, aPrevious, aFirst, aCount, anOutFile,
-		                                   problem);
+		bakedFlag = facade.BakeAmbientPart(Lumora::ToWide(myLevel), aBounce, aPrevious, aFirst, aCount,
+		                                   anOutFile, problem);
 	}
 	if (!bakedFlag)
 	{
-		throw LumoraError("ambient part not baked: " + problem + JoinProblems(ReportCollector::Get().ProblemsSince(mark)));
+		throw LumoraError("ambient part not baked: " + problem +
+		                  JoinProblems(ReportCollector::Get().ProblemsSince(mark)));
 	}
 }
 
@@ -229,7 +230,8 @@ void EngineSession::BakeReflectionPart(const std::string& aRoom, const std::stri
 	bool bakedFlag = false;
 	{
 		py::gil_scoped_release unlocked;
-		bakedFlag = facade.BakeSpecularPart(Lumora::ToWide(myLevel), aRoom, anAmbientFile, anOutFile, problem);
+		bakedFlag =
+		    facade.BakeSpecularPart(Lumora::ToWide(myLevel), aRoom, anAmbientFile, anOutFile, problem);
 	}
 	if (!bakedFlag)
 	{
@@ -253,7 +255,8 @@ std::string EngineSession::RecordBake(const std::string& aPhase, const std::vect
 	{
 		py::gil_scoped_release unlocked;
 		writtenFlag = facade.RecordBake(Lumora::ToWide(myLevel),
-		                                aPhase == "ambient" ? Lumora::BakePhase::AMBIENT : Lumora::BakePhase::REFLECTIONS,
+		                                aPhase == "ambient" ? Lumora::BakePhase::AMBIENT
+		                                                    : Lumora::BakePhase::REFLECTIONS,
 		                                someRooms, aBounces, {{"total", aSeconds}}, message);
 	}
 	if (!writtenFlag)

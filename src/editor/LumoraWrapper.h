@@ -38,9 +38,9 @@
 #include "ai/NGEdge.h"
 #include "ai/NGNode.h"
 #include "core/GrowingArray.h"
+#include "editor/BakeRecord.h"
 #include "editor/DecalStruct.h"
 #include "editor/DecalType.h"
-#include "editor/BakeRecord.h"
 #include "editor/DecalTypeStruct.h"
 #include "editor/LightOverlays.h"
 #include "editor/LumoraMode.h"
@@ -122,8 +122,8 @@ public:
 	bool ProjectToView(const Vector3<float>& aWorld, float& aX, float& aY) const;
 	// Every point and spot light drawn over the frame as an icon about 24 pixels across
 	// whatever its distance (a bulb with rays, or a lamp throwing a cone of light with a tick
-	// along the spot's direction), in the light's colour, the selected one in a ring; a click on an icon picks
-	// its light. In LIGHT_MODE only, where the icons take the marker boxes' place. Off by default.
+	// along the spot's direction), in the light's colour, the selected one in a ring; a click on an icon
+	// picks its light. In LIGHT_MODE only, where the icons take the marker boxes' place. Off by default.
 	void SetLightIconsFlag(bool aFlag);
 	// Which lights show their reach as wire over the frame, in LIGHT_MODE: a point light's
 	// falloff sphere as three great circles, a spot light's outer cone out to its reach with

@@ -227,8 +227,9 @@ bool Renderer::GenerateReflectionPart(const GrowingArray<Room*>& someRooms, cons
 	}
 	if (engine == nullptr || cube == nullptr || cube->GetTexture() == nullptr || room == nullptr)
 	{
-		myBakeMonitor.End(BakeResult::FAILED, room == nullptr ? "the level has no room with the ID '" + aRoomID + "'"
-		                                                      : std::string("the reflection cubemap could not be made"));
+		myBakeMonitor.End(BakeResult::FAILED, room == nullptr
+		                                          ? "the level has no room with the ID '" + aRoomID + "'"
+		                                          : std::string("the reflection cubemap could not be made"));
 		return false;
 	}
 	myBakeMonitor.Begin(BakePhase::REFLECTIONS, 0, 1, 0);
@@ -236,7 +237,8 @@ bool Renderer::GenerateReflectionPart(const GrowingArray<Room*>& someRooms, cons
 	DeferredRenderTargetHelper gbuffer;
 	gbuffer.Init(cube->GetSize(), cube->GetSize());
 	const bool renderedFlag = RenderRoomReflection(*cube, *room, gbuffer);
-	const bool savedFlag = renderedFlag && Gpu::SaveTextureToDds(engine->GetContext(), *cube->GetTexture(), anOutFile);
+	const bool savedFlag =
+	    renderedFlag && Gpu::SaveTextureToDds(engine->GetContext(), *cube->GetTexture(), anOutFile);
 	myCollector.Reset();
 	gbuffer.Destroy();
 	if (renderedFlag)
@@ -244,8 +246,12 @@ bool Renderer::GenerateReflectionPart(const GrowingArray<Room*>& someRooms, cons
 		myBakingProgress = 100;
 		myBakeMonitor.AddRoom();
 	}
-	myBakeMonitor.End(!renderedFlag ? BakeResult::CANCELLED : savedFlag ? BakeResult::FINISHED : BakeResult::FAILED,
-	                  !renderedFlag ? "nothing written" : savedFlag ? "" : "cannot write " + anOutFile);
+	myBakeMonitor.End(!renderedFlag ? BakeResult::CANCELLED
+	                  : savedFlag   ? BakeResult::FINISHED
+	                                : BakeResult::FAILED,
+	                  !renderedFlag ? "nothing written"
+	                  : savedFlag   ? ""
+	                                : "cannot write " + anOutFile);
 	return savedFlag;
 }
 

@@ -4,10 +4,10 @@
 #include <cctype>
 #include <cstring>
 #include <filesystem>
-#include <string_view>
 #include <map>
 #include <set>
 #include <sstream>
+#include <string_view>
 #include <system_error>
 #include <utility>
 
@@ -263,7 +263,8 @@ bool IsName(std::string_view aText)
 		return false;
 	}
 	return std::all_of(aText.begin(), aText.end(), [](char aCharacter) {
-		return std::isalnum(static_cast<unsigned char>(aCharacter)) || std::strchr("-_.:", aCharacter) != nullptr;
+		return std::isalnum(static_cast<unsigned char>(aCharacter)) ||
+		       std::strchr("-_.:", aCharacter) != nullptr;
 	});
 }
 } // namespace
