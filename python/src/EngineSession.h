@@ -11,6 +11,7 @@
 #include <pybind11/numpy.h>
 #include <pybind11/pybind11.h>
 
+#include <functional>
 #include <string>
 #include <vector>
 
@@ -91,6 +92,10 @@ private:
 	Lumora::LumoraWrapper& Facade() const;
 	// Throws LumoraError unless a level is open.
 	void RequireLevel() const;
+	// Runs one piece of a distributed bake in the data folder without Python's lock; LumoraError,
+	// starting with aWhat, with the piece's problem and the reports made meanwhile, when it fails.
+	void RunPiece(const std::string& aWhat,
+	              const std::function<bool(Lumora::LumoraWrapper&, std::string&)>& aPiece);
 
 	std::string myDataFolder;
 	std::string myLevel;

@@ -6,6 +6,7 @@
 #include <atomic>
 #include <chrono>
 #include <exception>
+#include <functional>
 #include <thread>
 
 #include "EngineSession.h"
@@ -181,63 +182,48 @@ py::dict EngineSession::Bake(int aBounces, bool anAmbientFlag, bool aReflections
 	return outcome;
 }
 
-void EngineSession::BakeAmbientPart(int aBounce, const std::string& aPrevious, long long aFirst,
-                                    long long aCount, const std::string& anOutFile)
+void EngineSession::RunPiece(const std::string& aWhat,
+                             const std::function<bool(Lumora::LumoraWrapper&, std::string&)>& aPiece)
 {
 	RequireLevel();
 	Lumora::LumoraWrapper& facade = Facade();
 	WorkingFolder here(myDataFolder);
 	const size_t mark = ReportCollector::Get().Mark();
 	std::string problem;
-	bool bakedFlag = false;
+	bool doneFlag = false;
 	{
 		py::gil_scoped_release unlocked;
-		bakedFlag = facade.BakeAmbientPart(Lumora::ToWide(myLevel), aBounce, aPrevious, aFirst, aCount,
-		                                   anOutFile, problem);
+		doneFlag = aPiece(facade, problem);
 	}
-	if (!bakedFlag)
+	if (!doneFlag)
 	{
-		throw LumoraError("ambient part not baked: " + problem +
-		                  JoinProblems(ReportCollector::Get().ProblemsSince(mark)));
+		throw LumoraError(aWhat + ": " + problem + JoinProblems(ReportCollector::Get().ProblemsSince(mark)));
 	}
+}
+
+void EngineSession::BakeAmbientPart(int aBounce, const std::string& aPrevious, long long aFirst,
+                                    long long aCount, const std::string& anOutFile)
+{
+	RunPiece("ambient part not baked", [&](Lumora::LumoraWrapper& aFacade, std::string& aProblem) {
+		return aFacade.BakeAmbientPart(Lumora::ToWide(myLevel), aBounce, aPrevious, aFirst, aCount, anOutFile,
+		                               aProblem);
+	});
 }
 
 void EngineSession::MergeAmbientParts(const std::vector<std::string>& someParts, const std::string& anOutFile)
 {
-	RequireLevel();
-	Lumora::LumoraWrapper& facade = Facade();
-	WorkingFolder here(myDataFolder);
-	std::string problem;
-	bool mergedFlag = false;
-	{
-		py::gil_scoped_release unlocked;
-		mergedFlag = facade.MergeAmbientParts(Lumora::ToWide(myLevel), someParts, anOutFile, problem);
-	}
-	if (!mergedFlag)
-	{
-		throw LumoraError("ambient parts not merged: " + problem);
-	}
+	RunPiece("ambient parts not merged", [&](Lumora::LumoraWrapper& aFacade, std::string& aProblem) {
+		return aFacade.MergeAmbientParts(Lumora::ToWide(myLevel), someParts, anOutFile, aProblem);
+	});
 }
 
 void EngineSession::BakeReflectionPart(const std::string& aRoom, const std::string& anAmbientFile,
                                        const std::string& anOutFile)
 {
-	RequireLevel();
-	Lumora::LumoraWrapper& facade = Facade();
-	WorkingFolder here(myDataFolder);
-	const size_t mark = ReportCollector::Get().Mark();
-	std::string problem;
-	bool bakedFlag = false;
-	{
-		py::gil_scoped_release unlocked;
-		bakedFlag =
-		    facade.BakeSpecularPart(Lumora::ToWide(myLevel), aRoom, anAmbientFile, anOutFile, problem);
-	}
-	if (!bakedFlag)
-	{
-		throw LumoraError("reflection of room '" + aRoom + "' not baked: " + problem +
-		                  JoinProblems(ReportCollector::Get().ProblemsSince(mark)));
-	}
+	RunPiece("reflection of room '" + aRoom + "' not baked", [&](Lumora::LumoraWrapper& aFacade,
+	                                                             std::string& aProblem) {
+		return aFacade.BakeSpecularPart(Lumora::ToWide(myLevel), aRoom, anAmbientFile, anOutFile, aProblem);
+	});
 }
 
 std::string EngineSession::RecordBake(const std::string& aPhase, const std::vector<std::string>& someRooms,

@@ -53,8 +53,22 @@ def _editor_for(package, level: str) -> Editor:
     return editor
 
 
-def _scratch(editor: Editor) -> str:
-    return tempfile.mkdtemp(prefix=".lumora-task-", dir=editor.data)
+def _run(editor: Editor, given: Optional[bytes], bake) -> bytes:
+    """bake(input path or None, output path) in a scratch folder of the worker's own: ``given`` is
+    written to the input first; the output's bytes are returned."""
+    scratch = tempfile.mkdtemp(prefix=".lumora-task-", dir=editor.data)
+    try:
+        given_path = None
+        if given is not None:
+            given_path = os.path.join(scratch, "input")
+            with open(given_path, "wb") as file:
+                file.write(given)
+        out = os.path.join(scratch, "output")
+        bake(given_path, out)
+        with open(out, "rb") as file:
+            return file.read()
+    finally:
+        shutil.rmtree(scratch, ignore_errors=True)
 
 
 def bake_ambient_part(package, level: str, bounce: int, previous: Optional[bytes], first: int,
@@ -69,19 +83,8 @@ def bake_ambient_part(package, level: str, bounce: int, previous: Optional[bytes
             _state["editor"].close()
             _state["editor"] = None
         editor = _editor_for(package, level)
-        scratch = _scratch(editor)
-        try:
-            previous_path = None
-            if previous is not None:
-                previous_path = os.path.join(scratch, "previous.sh")
-                with open(previous_path, "wb") as file:
-                    file.write(previous)
-            out = os.path.join(scratch, "part")
-            editor.bake_ambient_part(bounce, previous_path, first, count, out)
-            with open(out, "rb") as file:
-                return file.read()
-        finally:
-            shutil.rmtree(scratch, ignore_errors=True)
+        return _run(editor, previous,
+                    lambda previous_path, out: editor.bake_ambient_part(bounce, previous_path, first, count, out))
 
 
 def bake_reflection(package, level: str, room: str, ambient: Optional[bytes]) -> bytes:
@@ -90,19 +93,8 @@ def bake_reflection(package, level: str, room: str, ambient: Optional[bytes]) ->
     with _lock:
         editor = _editor_for(package, level)
         _state["fresh"] = False
-        scratch = _scratch(editor)
-        try:
-            ambient_path = None
-            if ambient is not None:
-                ambient_path = os.path.join(scratch, "ambient.sh")
-                with open(ambient_path, "wb") as file:
-                    file.write(ambient)
-            out = os.path.join(scratch, "room.dds")
-            editor.bake_reflection_part(room, out, ambient=ambient_path)
-            with open(out, "rb") as file:
-                return file.read()
-        finally:
-            shutil.rmtree(scratch, ignore_errors=True)
+        return _run(editor, ambient,
+                    lambda ambient_path, out: editor.bake_reflection_part(room, out, ambient=ambient_path))
 
 
 def cancel_running() -> bool:
