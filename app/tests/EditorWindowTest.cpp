@@ -104,10 +104,25 @@ private:
 		placement.myPitch = 0.35f;
 		camera.SetPlacement(placement);
 		camera.Frame(Doc().Find(Doc().IdAt(Kind::POINT_LIGHT, 0))->myPosition, 4.0f);
-		// Projected once a frame has been drawn from there: the camera the click is made against.
-		const int frames = myWindow->GetFrameCount();
-		controller.SetCamera(camera.GetPlacement());
-		[&] { QTRY_VERIFY_WITH_TIMEOUT(myWindow->GetFrameCount() > frames, 20000); }();
+		// Projected once the engine holds the camera the click is made against. A frame counted
+		// after the request may have started before it, and the engine runs queued work before it
+		// places the latest camera, so the engine's own placement is what is waited for.
+		const CameraPlacement wanted = camera.GetPlacement();
+		controller.SetCamera(wanted);
+		const auto placed = [this, &wanted] {
+			bool sameFlag = false;
+			OnEngine([&sameFlag, &wanted](Lumora::LumoraWrapper& aFacade) {
+				Vector3<float> position;
+				float yaw = 0.0f;
+				float pitch = 0.0f;
+				aFacade.GetCameraPlacement(position, yaw, pitch);
+				sameFlag = std::abs(position.x - wanted.myPosition[0]) < 1e-3f &&
+				           std::abs(position.y - wanted.myPosition[1]) < 1e-3f &&
+				           std::abs(position.z - wanted.myPosition[2]) < 1e-3f;
+			});
+			return sameFlag;
+		};
+		[&] { QTRY_VERIFY_WITH_TIMEOUT(placed(), 20000); }();
 		std::pair<int, QPointF> found{-1, {}};
 		const QSize size = myWindow->GetView()->DeviceSize();
 		OnEngine([&found, size](Lumora::LumoraWrapper& aFacade) {
