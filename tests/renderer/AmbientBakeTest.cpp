@@ -14,7 +14,9 @@
 #include <utility>
 #include <vector>
 
+#include "ColladaWriter.h"
 #include "FrameFixture.h"
+#include "Models.h"
 #include "engine/Effect.h"
 #include "engine/Room.h"
 #include "model/Model.h"
@@ -42,6 +44,73 @@ class AmbientBakeTest : public FrameTest
 {
 protected:
 	AmbientBakeTest() { myFatalLevels = 12; }
+
+	// The crate with flat textures (albedo anAlbedo, flat normal, full roughness, no occlusion),
+	// mirrored through its centre and scaled to a closed room of 3.96 units a side around
+	// (0, 2, 0), so its faces look inwards; its model, for the caller to change.
+	const Zeph::Model* PlaceClosedBox(const std::string& aName, uint8_t anAlbedo)
+	{
+		std::string document = TestSupport::ReadWholeFile("data/models/crate.dae");
+		EXPECT_FALSE(document.empty()) << "run from the repository root";
+		const std::string prefix = "data/textures/wood_";
+		for (size_t at = document.find(prefix); at != std::string::npos; at = document.find(prefix, at))
+		{
+			document.replace(at, prefix.size(), myScratch.File(aName + "_"));
+		}
+		const std::pair<const char*, std::array<uint8_t, 4>> textures[] = {
+		    {"albedo.dds", {anAlbedo, anAlbedo, anAlbedo, 255}},
+		    {"normal.dds", {128, 128, 255, 255}},
+		    {"roughness.dds", {255, 255, 255, 255}},
+		    {"ao.dds", {255, 255, 255, 255}}};
+		for (const auto& [name, color] : textures)
+		{
+			WriteSolidTexture(aName + "_" + name, color.data());
+		}
+		const std::string model = myScratch.File(aName + ".dae");
+		TestSupport::WriteWholeFile(model, document);
+		Place(model.c_str(), {0.0f, 0.0f, 0.0f});
+		if (HasFatalFailure())
+		{
+			return nullptr;
+		}
+		Matrix44<float> mirror;
+		for (const int diagonal : {0, 5, 10})
+		{
+			mirror.myMatrix[diagonal] = -4.4f;
+		}
+		mirror.SetPosition(
+		    Vector3<float>(0.0f, 3.98f, 0.0f)); // the crate's floor (y = 0) becomes the ceiling
+		myInstances.back()->SetOrientation(mirror);
+		Matrix44<float> local;
+		return Zeph::RenderTargetHelper::FindFirstModel(
+		    Zeph::Engine::GetInstance()->GetModelFactory().GetModel(model), local);
+	}
+
+	// A closed room 4 x 4 x 4 around (0, 2, 0), seen from inside, white (albedo 255), with a flat
+	// normal, full roughness and no occlusion: the sample content's room model without doors.
+	void PlaceWhiteRoom()
+	{
+		std::string document = Content::WriteColladaDocument(Content::Room("white_room", 4.0, 4.0, 4.0, 0,
+		                                                                   Content::MaterialKind::Concrete,
+		                                                                   Content::MaterialKind::Concrete));
+		const std::string prefix = "data/textures/concrete_";
+		for (size_t at = document.find(prefix); at != std::string::npos; at = document.find(prefix, at))
+		{
+			document.replace(at, prefix.size(), myScratch.File("white_"));
+		}
+		const std::pair<const char*, std::array<uint8_t, 4>> textures[] = {
+		    {"white_albedo.dds", {255, 255, 255, 255}},
+		    {"white_normal.dds", {128, 128, 255, 255}},
+		    {"white_roughness.dds", {255, 255, 255, 255}},
+		    {"white_ao.dds", {255, 255, 255, 255}}};
+		for (const auto& [name, color] : textures)
+		{
+			WriteSolidTexture(name, color.data());
+		}
+		const std::string model = myScratch.File("white_room.dae");
+		TestSupport::WriteWholeFile(model, document);
+		Place(model.c_str(), {0.0f, 0.0f, 0.0f});
+	}
 
 	// Rooms owned by the test, handed to the bake as the facade hands its own.
 	Zeph::Room* AddRoom(const Vector3<float>& aMin, const Vector3<float>& aMax)
@@ -197,36 +266,7 @@ TEST_F(AmbientBakeTest, AClosedRoomOfUniformRadianceGivesTheSameAmbientForEveryN
 	// occlusion), mirrored through its centre and scaled to a 4-unit room around the
 	// probe, so its faces look inwards. Glowing and unlit, every wall sends the same
 	// radiance to the probe.
-	std::string document = TestSupport::ReadWholeFile("data/models/crate.dae");
-	ASSERT_FALSE(document.empty()) << "run from the repository root";
-	const std::string prefix = "data/textures/wood_";
-	for (size_t at = document.find(prefix); at != std::string::npos; at = document.find(prefix, at))
-	{
-		document.replace(at, prefix.size(), myScratch.File("flat_"));
-	}
-	const std::pair<const char*, std::array<uint8_t, 4>> textures[] = {
-	    {"flat_albedo.dds", {128, 128, 128, 255}},
-	    {"flat_normal.dds", {128, 128, 255, 255}},
-	    {"flat_roughness.dds", {255, 255, 255, 255}},
-	    {"flat_ao.dds", {255, 255, 255, 255}}};
-	for (const auto& [name, color] : textures)
-	{
-		WriteSolidTexture(name, color.data());
-	}
-	const std::string model = myScratch.File("glowing_box.dae");
-	TestSupport::WriteWholeFile(model, document);
-	Place(model.c_str(), {0.0f, 0.0f, 0.0f});
-	ASSERT_FALSE(HasFatalFailure());
-	Matrix44<float> mirror;
-	for (const int diagonal : {0, 5, 10})
-	{
-		mirror.myMatrix[diagonal] = -4.4f;
-	}
-	mirror.SetPosition(Vector3<float>(0.0f, 3.96f, 0.0f)); // the crate's floor (y = 0) becomes the ceiling
-	myInstances.back()->SetOrientation(mirror);
-	Matrix44<float> local;
-	const Zeph::Model* box = Zeph::RenderTargetHelper::FindFirstModel(
-	    Zeph::Engine::GetInstance()->GetModelFactory().GetModel(model), local);
+	const Zeph::Model* box = PlaceClosedBox("flat", 128);
 	ASSERT_NE(box, nullptr);
 	ASSERT_NE(box->GetEffect(), nullptr);
 	ASSERT_TRUE(box->GetEffect()->GetEffect()->GetVariableByName("EmissiveAmount")->SetFloat(0.25f));
@@ -254,6 +294,67 @@ TEST_F(AmbientBakeTest, AClosedRoomOfUniformRadianceGivesTheSameAmbientForEveryN
 			EXPECT_LE(value, radiance + 7.8e-3f + 1.0f / 255.0f) << "direction " << code;
 		}
 	}
+}
+
+TEST_F(AmbientBakeTest, AWhiteRoomLitByOneLightBakesFalloffSymmetryAndLinearity)
+{
+	LUMORA_RETURN_UNLESS(Start());
+	// A closed white room (4 a side around the probe at (0, 2, 0)) and one light whose reach
+	// takes in the whole room: what the light adds to the probe is measured against the room
+	// baked without it (the fallback cubemap's reflections are in both).
+	PlaceWhiteRoom();
+	ASSERT_FALSE(HasFatalFailure());
+	AddRoom({-1.0f, 1.0f, -1.0f}, {1.0f, 3.0f, 1.0f});
+	const std::string path = myScratch.File("white/ambient.sh");
+	const Vector3<float> axes[6] = {{1.0f, 0.0f, 0.0f},  {-1.0f, 0.0f, 0.0f}, {0.0f, 1.0f, 0.0f},
+	                                {0.0f, -1.0f, 0.0f}, {0.0f, 0.0f, 1.0f},  {0.0f, 0.0f, -1.0f}};
+	// The irradiance (red, over pi) the probe gets from each axis direction.
+	const auto bake = [&](const Vector3<float>& aLight, float anIntensity) {
+		myPointLights.clear();
+		if (anIntensity > 0.0f)
+		{
+			myPointLights.push_back({.myFalloff = 8.0f,
+			                         .myPosition = aLight,
+			                         .myColor = {anIntensity, anIntensity, anIntensity, 1.0f}});
+		}
+		Bake(path, 1);
+		const Zeph::AmbientVolume volume = ReadVolume(path);
+		std::array<float, 6> irradiance{};
+		for (int axis = 0; axis < 6; ++axis)
+		{
+			irradiance[axis] = volume.myBlocks[0].empty() ? 0.0f : RedIrradiance(volume, 0, axes[axis]);
+		}
+		return irradiance;
+	};
+	const std::array<float, 6> dark = bake({}, 0.0f);
+	// One step of the packing is 2/255 per stored value; an axis direction reads up to three of
+	// them, and both bakes are packed.
+	constexpr float packing = 2.0f * 3.0f * 2.0f / 255.0f;
+
+	// At the room's centre: the same light reaches every wall alike, so every direction gets
+	// the same.
+	const std::array<float, 6> centre = bake({0.0f, 2.0f, 0.0f}, 12.0f);
+	for (int axis = 0; axis < 6; ++axis)
+	{
+		EXPECT_GT(centre[axis] - dark[axis], 0.1f)
+		    << "axis " << axis << ": " << centre[axis] << " over " << dark[axis];
+		EXPECT_NEAR(centre[axis] - dark[axis], centre[0] - dark[0], packing) << "axis " << axis;
+	}
+	// Twice the colour, twice the light.
+	const std::array<float, 6> twice = bake({0.0f, 2.0f, 0.0f}, 24.0f);
+	for (int axis = 0; axis < 6; ++axis)
+	{
+		EXPECT_NEAR(twice[axis] - dark[axis], 2.0f * (centre[axis] - dark[axis]), 2.0f * packing)
+		    << "axis " << axis;
+	}
+	// Half a metre from the +x wall: that wall is lit from 0.5 away, the far one from 3.5, so
+	// the probe facing +x gets several times what it gets facing -x.
+	const std::array<float, 6> nearWall = bake({1.5f, 2.0f, 0.0f}, 4.0f);
+	const float facingNear = nearWall[0] - dark[0];
+	const float facingFar = nearWall[1] - dark[1];
+	EXPECT_GT(facingFar, 0.0f);
+	EXPECT_GT(facingNear, 3.0f * facingFar)
+	    << "facing the near wall " << facingNear << ", the far one " << facingFar;
 }
 
 TEST_F(AmbientBakeTest, RoomWallsProgressAFullDiskAGridTooLargeAndNoRoomsKeepWhatTheyMust)

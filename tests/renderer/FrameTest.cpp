@@ -3,6 +3,7 @@
 // quality rule and the empty frame. The settings files reach the effect through the
 // setters the editor calls, in every golden frame.
 #include <algorithm>
+#include <cmath>
 #include <gtest/gtest.h>
 #include <string>
 #include <vector>
@@ -55,6 +56,53 @@ TEST_F(FrameTest, PointLightReachesItsFalloffAndSpotLightItsOuterConeOnly)
 		EXPECT_GT(added(1.5f, angle), 0.0f) << "the light's volume holds its outer cone, angle " << angle;
 		EXPECT_NEAR(added(1.95f, angle), 0.0f, 1e-3f) << "outside the outer cone, angle " << angle;
 	}
+}
+
+TEST_F(FrameTest, PointLightFallsOffWithTheInverseSquareScalesWithItsColourAndEndsAtItsReach)
+{
+	LUMORA_RETURN_UNLESS(Start());
+	Place("data/models/room_small.dae", {0.0f, 0.0f, 0.0f});
+	Look({0.0f, 2.9f, 0.0f}, {0.0f, 0.0f, 0.0f}, {0.0f, 0.0f, 1.0f});
+	Render("falloff-off");
+	const std::vector<float> unlit = myLit;
+	const auto added = [&](float aRadius) {
+		const Pixel pixel = Project({aRadius, 0.0f, 0.0f});
+		return Luminance(myLit, pixel) - Luminance(unlit, pixel);
+	};
+	const auto lightAt = [&](float aHeight, float aReach, float anIntensity) {
+		myPointLights = {{.myFalloff = aReach,
+		                  .myPosition = {0.0f, aHeight, 0.0f},
+		                  .myColor = {anIntensity, anIntensity, anIntensity, 1.0f}}};
+		Render("falloff-on");
+	};
+
+	// The floor under the light, lit and seen from straight above, so only the distance changes
+	// between the two heights: twice as far, a quarter of the light (a reach of 20 takes the
+	// window's share below 0.01 %).
+	lightAt(0.5f, 20.0f, 2.0f);
+	const float halfAMetre = added(0.0f);
+	lightAt(1.0f, 20.0f, 2.0f);
+	const float oneMetre = added(0.0f);
+	ASSERT_GT(oneMetre, 0.01f);
+	EXPECT_NEAR(halfAMetre / oneMetre, 4.0f, 0.04f);
+	// Twice the colour, twice the light.
+	lightAt(1.0f, 20.0f, 4.0f);
+	EXPECT_NEAR(added(0.0f), 2.0f * oneMetre, 2e-3f * oneMetre);
+	// A light almost touching the floor is bright there, not infinite: the distance is held at
+	// the size of a bulb (0.1), about a hundred times the light from 1 m (the pixel's centre lies
+	// a little to the side, which moves the shading's angles).
+	lightAt(0.02f, 20.0f, 2.0f);
+	EXPECT_TRUE(std::isfinite(added(0.0f)));
+	EXPECT_GT(added(0.0f) / oneMetre, 70.0f);
+	EXPECT_LT(added(0.0f) / oneMetre, 130.0f);
+
+	// From 0.5 above the floor with a reach of 1.5: the reach meets the floor at radius
+	// sqrt(1.5^2 - 0.5^2) = 1.414. Just inside it the light still adds, just outside nothing at all.
+	lightAt(0.5f, 1.5f, 8.0f);
+	EXPECT_GT(added(1.25f), 0.0f);
+	EXPECT_GT(added(0.5f), added(1.25f));
+	EXPECT_EQ(added(1.5f), 0.0f);
+	EXPECT_EQ(added(1.8f), 0.0f);
 }
 
 TEST_F(FrameTest, ShadowQualityPicksTheMapAndRepairsTheSettingAndEveryPassRunsWithNothingQueued)

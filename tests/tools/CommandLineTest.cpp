@@ -213,7 +213,7 @@ TEST_F(CommandLineTest, BadInputGetsAClearLineAndAFailingExitTheSmallLevelBakesA
 
 	// A light without its falloff value and a cut-off ambient.sh: check lists both, with
 	// the file and the element; render and bake refuse with the first and end cleanly.
-	Edit("data/XML/levels/sample_small/lights.xml", "<falloff value=\"4\" />", "<falloff />");
+	Edit("data/XML/levels/sample_small/lights.xml", "<falloff value=\"5.2\" />", "<falloff />");
 	TestSupport::WriteWholeFile(myScratch.File("data/XML/levels/sample_small/ambient.sh"),
 	                            std::string(20, '\1'));
 	const ToolRun damaged = Run("check sample_small");

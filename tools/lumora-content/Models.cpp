@@ -45,8 +45,8 @@ void AddBox(MeshBuilder& aMesh, uint32_t aSet, const Vec3& aMin, const Vec3& aMa
 	        aTile);
 }
 
-// A box room [-w/2, w/2] x [0, h] x [-d/2, d/2] seen from inside, with a door 1.2 m wide and 2.2 m
-// high in the middle of each wall named in aDoors. The walls are quads (a polylist in the file).
+} // namespace
+
 ModelDescription Room(const std::string& aName, double aWidth, double aHeight, double aDepth, int aDoors,
                       MaterialKind aWallMaterial, MaterialKind aFloorMaterial)
 {
@@ -95,6 +95,8 @@ ModelDescription Room(const std::string& aName, double aWidth, double aHeight, d
 	return model;
 }
 
+namespace
+{
 ModelDescription FloorTile(const std::string& aName, double aSize, double aThickness, MaterialKind aMaterial)
 {
 	ModelDescription model;

@@ -33,4 +33,9 @@ struct ModelDescription
 };
 
 std::vector<ModelDescription> BuildModels();
+// A box room [-w/2, w/2] x [0, h] x [-d/2, d/2] seen from inside, with a door 1.2 m wide and 2.2 m
+// high in the middle of each wall named in aDoors (DoorSide bits; 0: a closed room). The walls are
+// quads (a polylist in the file); the ceiling is concrete.
+ModelDescription Room(const std::string& aName, double aWidth, double aHeight, double aDepth, int aDoors,
+                      MaterialKind aWallMaterial, MaterialKind aFloorMaterial);
 } // namespace Content

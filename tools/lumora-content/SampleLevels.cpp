@@ -17,6 +17,10 @@ constexpr double ourPi = 3.14159265358979323846;
 // Path nodes stand this high, so their quarter-metre marker boxes rest on the floor.
 constexpr float ourNodeHeight = 0.25f;
 const Color ourWhite(1.0f, 1.0f, 1.0f, 1.0f);
+constexpr float ourIntensity = 4.0f;
+// The falloffs below are scaled by this: the reach at which a light's window has taken it to nothing,
+// well past the floor it lights.
+constexpr float ourReach = 1.3f;
 
 float Cosine(double aDegrees)
 {
@@ -49,15 +53,15 @@ public:
 
 	void AddPointLight(const Point& aPosition, const Color& aColor, float aFalloff)
 	{
-		myLevel.myPointLights.push_back({aPosition, aColor, aFalloff});
+		myLevel.myPointLights.push_back({aPosition, Intensity(aColor), aFalloff * ourReach});
 	}
 
 	// aDirection must be of unit length; the cone's half-angles are given in degrees.
 	void AddSpotLight(const Point& aPosition, const Point& aDirection, const Color& aColor, float aFalloff,
 	                  double anInnerDegrees, double anOuterDegrees)
 	{
-		myLevel.mySpotLights.push_back(
-		    {aPosition, aColor, aFalloff, aDirection, Cosine(anInnerDegrees), Cosine(anOuterDegrees)});
+		myLevel.mySpotLights.push_back({aPosition, Intensity(aColor), aFalloff * ourReach, aDirection,
+		                                Cosine(anInnerDegrees), Cosine(anOuterDegrees)});
 	}
 
 	void AddDecal(const std::string& aType, const Point& aPosition, const Point& aNorm, float aSize,
@@ -88,10 +92,18 @@ public:
 	LevelDescription Take() { return std::move(myLevel); }
 
 private:
+	// A light's colour as the renderer takes it: a linear intensity, the light a surface 1 m away
+	// facing it receives, falling off with the square of the distance.
+	static Color Intensity(const Color& aColor)
+	{
+		return Color(aColor.x * ourIntensity, aColor.y * ourIntensity, aColor.z * ourIntensity, aColor.w);
+	}
+
 	LevelDescription myLevel;
 };
 
-// Light colours: components above 1 make the light brighter.
+// Light colours, each scaled by ourIntensity: a lamp 2.5 m above the floor lights it with about a
+// sixth of its intensity, so the lights are bright near them and pool where they point.
 const Color ourWarm(2.0f, 1.6f, 1.1f, 1.0f);
 const Color ourCool(1.2f, 1.4f, 1.8f, 1.0f);
 const Color ourNeutral(1.6f, 1.5f, 1.3f, 1.0f);

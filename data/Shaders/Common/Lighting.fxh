@@ -125,8 +125,14 @@ vec3 EnvironmentBrdf(vec3 anF0, float aRoughness, float aNdotV)
 	return anF0 * scaleBias.x + scaleBias.y;
 }
 
-// Light falloff that is bright near the light, has no singularity at the light, and
-// reaches exactly zero at aReach (the light volume's radius).
+// How much of a light's intensity reaches a surface aDistance away: the inverse square of the
+// distance, as light from a small source spreads, times a window that takes it smoothly to exactly
+// zero at aReach (the light volume's bound, so no edge shows where the volume ends). The distance is
+// held at least ourLightSourceRadius, a bulb's size, so a surface at the light is bright, not
+// infinite. Linear colours are intensities: a colour of 1 lights a surface 1 m away facing the light
+// with an irradiance of about 1 (over pi).
+const float ourLightSourceRadius = 0.1;
+
 float DistanceAttenuation(float aDistance, float aReach)
 {
 	if (aReach <= 0.0 || aDistance >= aReach)
@@ -136,7 +142,8 @@ float DistanceAttenuation(float aDistance, float aReach)
 	float ratio = aDistance / aReach;
 	float ratio2 = ratio * ratio;
 	float window = clamp(1.0 - ratio2 * ratio2, 0.0, 1.0);
-	return window * window / (1.0 + ratio2 * 4.0);
+	float distance = max(aDistance, ourLightSourceRadius);
+	return window * window / (distance * distance);
 }
 
 // View-space position of the pixel at aUv (0,0 top-left) whose linear depth (view z over
