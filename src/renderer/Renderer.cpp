@@ -712,8 +712,15 @@ void Renderer::RenderPostChain()
 	myHDRManager.Render(myToneMappedTarget->GetRenderTargetView(), GetCurrentHDR());
 	BeginPass("grading");
 	myColorGradingManager.Render(myBackBuffer, myToneMappedTarget.get());
-	BeginPass("outline");
-	myOutlineManager.Render(myBackBuffer, myOutlineHelper.GetTarget());
+	// With nothing outlined (no selection) the mask is empty and the outline would blend a glow of
+	// alpha 0 over the image, leaving every pixel as it is: its blur chain and full-screen pass
+	// (about an eighth of the frame on a software rasterizer) are skipped.
+	if (myCollector.GetBatches(RenderTargetCollector::OUTLINE_LIST).Count() > 0 ||
+	    myCollector.GetBatches(RenderTargetCollector::OUTLINE_SKINNED_LIST).Count() > 0)
+	{
+		BeginPass("outline");
+		myOutlineManager.Render(myBackBuffer, myOutlineHelper.GetTarget());
+	}
 }
 
 void Renderer::RenderLateItems()

@@ -9,6 +9,9 @@
 #include <vector>
 
 #include "FrameFixture.h"
+#include "engine/Engine.h"
+#include "model/Model.h"
+#include "renderer/RenderTargetHelper.h"
 
 using namespace FrameTesting;
 using testing::Contains;
@@ -136,14 +139,43 @@ TEST_F(FrameTest, ShadowQualityPicksTheMapAndRepairsTheSettingAndEveryPassRunsWi
 		    << "quality 0 renders no shadow map";
 	}
 	for (const char* pass : {"G-buffer", "decals", "lights", "SSAO", "ambient", "forward", "tone map",
-	                         "bloom", "grading", "outline", "late"})
+	                         "bloom", "grading", "late"})
 	{
 		EXPECT_THAT(names, Contains(pass));
 	}
 	EXPECT_THAT(names, Not(Contains("shadow resolve")));
+	// Nothing outlined: the outline would blend nothing over the image, and is skipped.
+	EXPECT_THAT(names, Not(Contains("outline")));
 	// An empty lit image is black.
 	for (float value : myLit)
 	{
 		ASSERT_NEAR(value, 0.0f, 1e-6f);
+	}
+
+	// A crate drawn with its outline (as the editor draws a selected entity): the pass runs, and
+	// the glow changes the picture around the crate.
+	Place("data/models/crate.dae", {0.0f, 0.0f, 3.0f});
+	Look({0.0f, 1.0f, 0.0f}, {0.0f, 0.4f, 3.0f});
+	Render("crate");
+	const std::vector<uint8_t> plain = myPixels;
+	Matrix44<float> local;
+	Zeph::Model* crate = const_cast<Zeph::Model*>(Zeph::RenderTargetHelper::FindFirstModel(
+	    Zeph::Engine::GetInstance()->GetModelFactory().GetModel("data/models/crate.dae"), local));
+	ASSERT_NE(crate, nullptr);
+	for (int surface = 0; surface < crate->GetSurfaces().Count(); ++surface)
+	{
+		crate->GetSurfaces()[surface].SetRenderCategory(Zeph::RENDER_CATEGORY_SHADOW_CASTING_OUTLINE);
+	}
+	Render("crate-outlined");
+	names.clear();
+	for (const Zeph::Renderer::PassTime& pass : Renderer().GetPassTimes())
+	{
+		names.push_back(pass.myName);
+	}
+	EXPECT_THAT(names, Contains("outline"));
+	EXPECT_NE(myPixels, plain);
+	for (int surface = 0; surface < crate->GetSurfaces().Count(); ++surface)
+	{
+		crate->GetSurfaces()[surface].SetRenderCategory(Zeph::RENDER_CATEGORY_SHADOW_CASTING);
 	}
 }
