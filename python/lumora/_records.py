@@ -160,8 +160,8 @@ class Room:
 
     @classmethod
     def _from_values(cls, values: dict) -> "Room":
-        return cls(id=values["id"], min=_singles(values["min"]), max=_singles(values["max"]),
-                   center=_singles(values["center"]), cubemap=values["cubemap"])
+        return cls(id=values["id"], min=tuple(values["min"]), max=tuple(values["max"]),
+                   center=tuple(values["center"]), cubemap=values["cubemap"])
 
 
 @dataclass(frozen=True)

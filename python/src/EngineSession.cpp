@@ -8,6 +8,7 @@
 #include "EditorSession.h"
 #include "Errors.h"
 #include "ReportCollector.h"
+#include "Values.h"
 #include "WorkingFolder.h"
 #include "editor/LumoraMode.h"
 #include "editor/LumoraWrapper.h"
@@ -32,11 +33,6 @@ std::string JoinLines(const std::vector<std::string>& someLines)
 		text += (text.empty() ? "" : "\n") + line;
 	}
 	return text;
-}
-
-py::tuple Triple(const Vector3<float>& aVector)
-{
-	return py::make_tuple(aVector.x, aVector.y, aVector.z);
 }
 } // namespace
 

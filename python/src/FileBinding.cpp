@@ -19,6 +19,7 @@
 
 #include "Bindings.h"
 #include "Errors.h"
+#include "Values.h"
 #include "WorkingFolder.h"
 #include "editor/BakeRecord.h"
 #include "platform/dds/DdsFile.h"
@@ -46,27 +47,6 @@ void RequireExisting(const std::string& aPath)
 	{
 		RaiseNotFound(aPath);
 	}
-}
-
-// The float as the shortest decimal that reads back as it (0.1, not 0.10000000149011612), so
-// that bounds print as they were written.
-double Shortest(float aValue)
-{
-	char text[32];
-	const std::to_chars_result end = std::to_chars(text, text + sizeof(text), aValue);
-	double value = aValue;
-	std::from_chars(text, end.ptr, value);
-	return value;
-}
-
-py::tuple Triple(const Vector3<float>& aVector)
-{
-	return py::make_tuple(Shortest(aVector.x), Shortest(aVector.y), Shortest(aVector.z));
-}
-
-py::tuple Triple(const int someValues[3])
-{
-	return py::make_tuple(someValues[0], someValues[1], someValues[2]);
 }
 
 // --- ambient.sh -----------------------------------------------------------------------------

@@ -240,7 +240,8 @@ Checked Check(const LumoraWrapper& aFacade, int aKind, const py::dict& someValue
 	return checked;
 }
 
-void WriteObject(LumoraWrapper& aFacade, const Checked& someValues)
+// The checked values to the selected object of aKind (Check has refused keys the kind lacks).
+void WriteObject(LumoraWrapper& aFacade, int aKind, const Checked& someValues)
 {
 	if (someValues.myPosition)
 	{
@@ -255,14 +256,14 @@ void WriteObject(LumoraWrapper& aFacade, const Checked& someValues)
 	if (someValues.myColor)
 	{
 		const auto& c = *someValues.myColor;
-		aFacade.ChangeColorPointLight(c[0], c[1], c[2]);
-		aFacade.ChangeColorSpotLight(c[0], c[1], c[2]);
-		aFacade.ChangeColorDecal(c[0], c[1], c[2]);
+		aKind == EngineSession::POINT_LIGHT  ? aFacade.ChangeColorPointLight(c[0], c[1], c[2])
+		: aKind == EngineSession::SPOT_LIGHT ? aFacade.ChangeColorSpotLight(c[0], c[1], c[2])
+		                                     : aFacade.ChangeColorDecal(c[0], c[1], c[2]);
 	}
 	if (someValues.myFalloff)
 	{
-		aFacade.ChangeFalloffPointLight(*someValues.myFalloff);
-		aFacade.ChangeFalloffSpotLight(*someValues.myFalloff);
+		aKind == EngineSession::POINT_LIGHT ? aFacade.ChangeFalloffPointLight(*someValues.myFalloff)
+		                                    : aFacade.ChangeFalloffSpotLight(*someValues.myFalloff);
 	}
 	if (someValues.myInnerCos)
 	{
@@ -341,7 +342,7 @@ int EngineSession::AddObject(int aKind, const py::dict& someValues)
 		                  " added: " + ReportCollector::Get().LastSince(mark));
 	}
 	SelectOrThrow(facade, aKind, before);
-	WriteObject(facade, checked);
+	WriteObject(facade, aKind, checked);
 	facade.Select(FacadeKind(aKind), -1);
 	return before;
 }
@@ -353,7 +354,7 @@ void EngineSession::SetObject(int aKind, int anIndex, const py::dict& someValues
 	FacadeKind(aKind);
 	const Checked checked = Check(facade, aKind, someValues);
 	SelectOrThrow(facade, aKind, anIndex);
-	WriteObject(facade, checked);
+	WriteObject(facade, aKind, checked);
 	facade.Select(FacadeKind(aKind), -1);
 }
 

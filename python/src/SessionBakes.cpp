@@ -175,7 +175,7 @@ py::dict EngineSession::Bake(int aBounces, bool anAmbientFlag, bool aReflections
 	outcome["probes"] = probes;
 	outcome["seconds"] = std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
 	outcome["problems"] = ReportCollector::Get().ProblemsSince(mark);
-	if (aProgress.is_none() == false)
+	if (!aProgress.is_none())
 	{
 		aProgress(StatusDict(status, facade.GetBakeProgress()));
 	}

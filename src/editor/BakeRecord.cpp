@@ -2,7 +2,6 @@
 
 #include <algorithm>
 #include <cfloat>
-#include <charconv>
 #include <cmath>
 #include <ctime>
 #include <filesystem>
@@ -14,6 +13,7 @@
 #include <system_error>
 #include <tuple>
 
+#include "core/ShortestDecimal.h"
 #include "editor/BakeInputs.h"
 #include "engine/FI_File.h"
 #include "platform/paths/Paths.h"
@@ -75,19 +75,9 @@ bool IsBakeDate(const std::string& aText)
 	return true;
 }
 
-// The float as its shortest decimal, so that 0.1f is written "0.1" and reads back as 0.1f.
-double Tidy(float aValue)
-{
-	char text[32];
-	const std::to_chars_result end = std::to_chars(text, text + sizeof(text), aValue);
-	double value = aValue;
-	std::from_chars(text, end.ptr, value);
-	return value;
-}
-
 Json VectorJson(const Vector3<float>& aVector)
 {
-	return Json::array({Tidy(aVector.x), Tidy(aVector.y), Tidy(aVector.z)});
+	return Json::array({ShortestDecimal(aVector.x), ShortestDecimal(aVector.y), ShortestDecimal(aVector.z)});
 }
 
 Json SectionJson(BakePhase aPhase, const BakePhaseRecord& aRecord)
