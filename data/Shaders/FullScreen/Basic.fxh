@@ -63,7 +63,7 @@ fragment PS_ColorGrade
 
 	void main()
 	{
-		vec4 color = texture(SourceTexture, vTexCoord);
+		vec4 color = texelFetch(SourceTexture, ivec2(gl_FragCoord.xy), 0);
 		vec3 size = vec3(max(textureSize(ColorGradingTex, 0), ivec3(1)));
 		vec3 uvw = LinearToSrgb(color.rgb) * ((size - 1.0) / size) + 0.5 / size;
 		oColor = vec4(SrgbToLinear(texture(ColorGradingTex, uvw).rgb), color.a);

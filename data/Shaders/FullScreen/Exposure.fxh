@@ -97,8 +97,9 @@ fragment PS_ToneMap
 
 	void main()
 	{
-		vec4 color = texture(SourceTexture, vTexCoord);
-		float adapted = texture(DiffuseTexture, vec2(0.5)).r;
+		// The source is the target's size; the adapted luminance is one texel.
+		vec4 color = texelFetch(SourceTexture, ivec2(gl_FragCoord.xy), 0);
+		float adapted = texelFetch(DiffuseTexture, ivec2(0), 0).r;
 		float exposure = AutoExposureAdjustment / (IsFinite(adapted) ? max(adapted, 1e-4) : 1.0);
 		oColor = vec4(ToneCurve(color.rgb * exposure), color.a);
 	}
@@ -176,7 +177,7 @@ fragment PS_Bloom
 
 	void main()
 	{
-		vec4 color = texture(SourceTexture, vTexCoord);
+		vec4 color = texelFetch(SourceTexture, ivec2(gl_FragCoord.xy), 0);
 		vec3 glow = texture(DiffuseTexture, vTexCoord).rgb + texture(SecondaryDiffuseTexture, vTexCoord).rgb +
 		            texture(TertiaryDiffuseTexture, vTexCoord).rgb;
 		oColor = vec4(color.rgb + glow * BloomFactor, color.a);
