@@ -307,7 +307,10 @@ TEST_F(ReflectionBakeTest, ALitRoomsCubeShowsItsLightsFollowsTheLobesAndOutlives
 			}
 		}
 		EXPECT_GT(brightest, 0.01) << "mip " << mip;
-		EXPECT_LT(worst, 0.05 * brightest)
+		// The filter sums each lobe to a hundredth of its peak over a cross of about the mip's own
+		// resolution; the first mips stay within 2 % of the exact lobe (the CPU's reference for the
+		// wider ones is itself summed over a quarter of mip 0).
+		EXPECT_LT(worst, (mip <= 3 ? 0.02 : 0.05) * brightest)
 		    << "mip " << mip << ": worst difference " << worst << " of " << brightest;
 	}
 

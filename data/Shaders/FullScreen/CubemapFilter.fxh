@@ -35,7 +35,7 @@ vec4 CrossDirection(vec2 aCross)
 // SourceTexture holds a cross (of any size); the output is a cross too, over the draw's viewport,
 // of which only the centre face is filtered (the rest is black). Each output texel is the average
 // of the source cross weighted by max(0, cos(angle to the texel's direction))^CubePower times the
-// source texel's solid angle. Source texels whose weight is below a thousandth of the lobe's peak
+// source texel's solid angle. Source texels whose weight is below a hundredth of the lobe's peak
 // are left out.
 fragment PS_BlurCubemap
 {
@@ -60,7 +60,7 @@ fragment PS_BlurCubemap
 		// (x, y) an angle covers up to (1 + x^2 + y^2) / sqrt(1 + y^2) of it along x (and the same
 		// with x and y swapped), 3 times at most; across an edge the neighbour's own coordinates
 		// count, which never exceed 1.
-		float reach = acos(pow(1e-3, 1.0 / power));
+		float reach = acos(pow(1e-2, 1.0 / power));
 		vec2 nearest = max(abs(centre) - 3.0 * reach, 0.0);
 		vec2 farthest = min(abs(centre) + 3.0 * reach, 1.0);
 		vec2 halfWidth = reach * (1.0 + dot(farthest, farthest)) / sqrt(1.0 + nearest.yx * nearest.yx) +

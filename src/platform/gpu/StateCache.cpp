@@ -59,6 +59,11 @@ void StateCache::Reset()
 		mySamplers[unit] = 0;
 		glBindSampler(static_cast<GLuint>(unit), 0);
 	}
+	for (int unit = 0; unit < ourTextureUnitCount; ++unit)
+	{
+		myTextures[unit] = 0;
+		glBindTextureUnit(static_cast<GLuint>(unit), 0);
+	}
 	myViewport = Viewport{};
 	ApplyViewport(myViewport);
 
@@ -145,6 +150,19 @@ void StateCache::BindSampler(int aUnit, GLuint aSampler)
 	}
 }
 
+void StateCache::BindTexture(int aUnit, GLuint aTexture)
+{
+	if (aUnit >= 0 && aUnit < ourTextureUnitCount)
+	{
+		if (myTextures[aUnit] == aTexture)
+		{
+			return;
+		}
+		myTextures[aUnit] = aTexture;
+	}
+	glBindTextureUnit(static_cast<GLuint>(aUnit), aTexture);
+}
+
 void StateCache::ForgetProgram(GLuint aProgram)
 {
 	if (myProgram == aProgram)
@@ -168,6 +186,17 @@ void StateCache::ForgetSampler(GLuint aSampler)
 		if (sampler == aSampler)
 		{
 			sampler = 0;
+		}
+	}
+}
+
+void StateCache::ForgetTexture(GLuint aTexture)
+{
+	for (GLuint& texture : myTextures)
+	{
+		if (texture == aTexture)
+		{
+			texture = 0;
 		}
 	}
 }
