@@ -1,62 +1,59 @@
-// The deferred frame of the demo scene (the large sample room with its props, three
-// point lights, a spot light, a decal, the ambient volume and every post stage) at
-// 1280 x 720, headless. One iteration is one frame: queue, render, and wait for the
-// GPU to finish it, so the time column is the whole frame's wall-clock time. The
-// counters are the GPU time of each pass (timestamp queries, averaged over the
-// iterations, in milliseconds). The argument is the shadow quality (0 = no shadow map,
-// 1 = 1024, 3 = 4096 texels).
+// The deferred frame at 1280 x 720, headless, with every stage on. One iteration is one frame:
+// queue, render, and wait for the GPU to finish it, so the time column is the whole frame's
+// wall-clock time. The counters are the GPU time of each pass (timestamp queries, averaged over
+// the iterations, in milliseconds).
+//
+// BM_DemoFrame/S: the demo scene (the large sample room with its props, three point lights, a
+//   spot light, a decal, the ambient volume) at shadow quality S (0 = no shadow map, 1 = 1024,
+//   3 = 4096 texels).
+// BM_DemoFrameMoving: the same with the camera turning a little every frame and the
+//   interactive divisor at 2, as the editor draws while a designer flies: each frame is drawn
+//   at 640 x 360 and scaled up.
+// BM_LevelFrame/M: sample_large through the editor facade from the README's camera (the level's
+//   baked ambient.sh and cubemaps where they exist: scripts/run.sh bakes them), with the
+//   facade's shadow setting; M = 1 turns the camera every frame at the editor's divisor.
 //
 // Run from the repository root (it reads data/):  ./build/bench/bench_frame
 
 #include <benchmark/benchmark.h>
 
 #include <epoxy/gl.h>
+#include <functional>
 #include <map>
 #include <string>
 
 #include "DemoScene.h"
+#include "EditorSession.h"
+#include "LevelCamera.h"
 #include "engine/Engine.h"
 #include "renderer/Renderer.h"
 
 namespace
 {
-void BM_DeferredFrame(benchmark::State& aState)
+constexpr int ourWidth = 1280;
+constexpr int ourHeight = 720;
+// The editor's divisor while the camera moves.
+constexpr int ourMovingDivisor = 3;
+constexpr float ourTurn = 0.002f;
+
+// Times aFrame (which renders one frame and leaves the context current) and publishes the
+// mean GPU time of each pass as a counter.
+void TimeFrames(benchmark::State& aState, Zeph::Renderer& aRenderer, const std::function<void(int)>& aFrame)
 {
-	constexpr int width = 1280;
-	constexpr int height = 720;
-	Gpu::WindowHandle window = 0;
-	if (!Zeph::Engine::Create(window, width, height))
+	// Warm-up: shaders compiled, eye adaptation settled, both frame sizes made once.
+	for (int frame = 0; frame < 6; ++frame)
 	{
-		aState.SkipWithError("the engine could not start (no OpenGL 4.5 core context?)");
-		Zeph::Engine::ShutDown();
-		return;
-	}
-	Zeph::Engine* engine = Zeph::Engine::GetInstance();
-	engine->GetSetupInfo().myShadowQuality = static_cast<int>(aState.range(0));
-	Zeph::Renderer& renderer = engine->GetRenderer();
-	LumoraTool::DemoScene scene;
-	if (!renderer.Init(width, height) || !scene.Init(*engine))
-	{
-		aState.SkipWithError("the renderer or the demo scene could not start (run from the repository root)");
-		scene.Destroy();
-		Zeph::Engine::ShutDown();
-		return;
-	}
-	// Warm-up: shaders compiled, eye adaptation settled.
-	for (int frame = 0; frame < 5; ++frame)
-	{
-		scene.Queue();
-		engine->RenderScene();
+		aFrame(frame);
 	}
 	glFinish();
-	renderer.SetPassTimingFlag(true);
+	aRenderer.SetPassTimingFlag(true);
 	std::map<std::string, double> passTotals;
+	int frame = 0;
 	for (auto _ : aState)
 	{
-		scene.Queue();
-		engine->RenderScene();
+		aFrame(frame++);
 		glFinish();
-		for (const Zeph::Renderer::PassTime& pass : renderer.GetPassTimes())
+		for (const Zeph::Renderer::PassTime& pass : aRenderer.GetPassTimes())
 		{
 			passTotals[pass.myName] += pass.myMilliseconds;
 		}
@@ -65,15 +62,82 @@ void BM_DeferredFrame(benchmark::State& aState)
 	{
 		aState.counters[name] = benchmark::Counter(total / static_cast<double>(aState.iterations()));
 	}
-	renderer.SetPassTimingFlag(false);
+	aState.counters["reduced"] = aRenderer.IsFrameReduced() ? 1.0 : 0.0;
+	aRenderer.SetPassTimingFlag(false);
+}
+
+void DemoFrame(benchmark::State& aState, int aShadowQuality, bool aMovingFlag)
+{
+	Gpu::WindowHandle window = 0;
+	if (!Zeph::Engine::Create(window, ourWidth, ourHeight))
+	{
+		aState.SkipWithError("the engine could not start (no OpenGL 4.5 core context?)");
+		Zeph::Engine::ShutDown();
+		return;
+	}
+	Zeph::Engine* engine = Zeph::Engine::GetInstance();
+	engine->GetSetupInfo().myShadowQuality = aShadowQuality;
+	Zeph::Renderer& renderer = engine->GetRenderer();
+	LumoraTool::DemoScene scene;
+	if (!renderer.Init(ourWidth, ourHeight) || !scene.Init(*engine))
+	{
+		aState.SkipWithError("the renderer or the demo scene could not start (run from the repository root)");
+		scene.Destroy();
+		Zeph::Engine::ShutDown();
+		return;
+	}
+	renderer.SetInteractiveDivisor(aMovingFlag ? ourMovingDivisor : 1);
+	TimeFrames(aState, renderer, [&](int aFrame) {
+		if (aMovingFlag)
+		{
+			scene.GetCamera().Yaw(aFrame % 2 == 0 ? ourTurn : -ourTurn);
+		}
+		scene.Queue();
+		engine->RenderScene();
+	});
 	scene.Destroy();
 	Zeph::Engine::ShutDown();
 }
-BENCHMARK(BM_DeferredFrame)
-    ->Arg(0)
-    ->Arg(1)
-    ->Arg(3)
-    ->Unit(benchmark::kMillisecond)
-    ->UseRealTime()
-    ->MinTime(3.0);
+
+void BM_DemoFrame(benchmark::State& aState)
+{
+	DemoFrame(aState, static_cast<int>(aState.range(0)), false);
+}
+
+void BM_DemoFrameMoving(benchmark::State& aState)
+{
+	DemoFrame(aState, 0, true);
+}
+
+void BM_LevelFrame(benchmark::State& aState)
+{
+	const bool movingFlag = aState.range(0) != 0;
+	LumoraTool::EditorSession session;
+	if (!session.Start("sample_large", ourWidth, ourHeight) || !session.Load("sample_large"))
+	{
+		aState.SkipWithError("sample_large could not be opened (run from the repository root)");
+		return;
+	}
+	Lumora::LumoraWrapper& editor = session.Editor();
+	LumoraTool::WalkIntoTheFirstRoom(editor);
+	// The level as the README pictures it: no light gizmos or volume outlines.
+	editor.RenderMeshes(false);
+	editor.SetInteractiveDivisor(movingFlag ? ourMovingDivisor : 1);
+	Zeph::Engine* engine = Zeph::Engine::GetInstance();
+	TimeFrames(aState, engine->GetRenderer(), [&](int aFrame) {
+		if (movingFlag)
+		{
+			editor.YawCamera(aFrame % 2 == 0 ? ourTurn : -ourTurn);
+		}
+		editor.Update(16.0f);
+		editor.Render();
+		// The facade lets the context go after a frame; the wait and the timings need it.
+		engine->MakeContextCurrent();
+	});
+	engine->ReleaseContext();
+}
+
+BENCHMARK(BM_DemoFrame)->Arg(0)->Arg(1)->Arg(3)->Unit(benchmark::kMillisecond)->UseRealTime()->MinTime(3.0);
+BENCHMARK(BM_DemoFrameMoving)->Unit(benchmark::kMillisecond)->UseRealTime()->MinTime(3.0);
+BENCHMARK(BM_LevelFrame)->Arg(0)->Arg(1)->Unit(benchmark::kMillisecond)->UseRealTime()->MinTime(3.0);
 } // namespace

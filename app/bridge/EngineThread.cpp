@@ -24,6 +24,8 @@ using Lumora::LumoraWrapper;
 constexpr float ourLongestStepMs = 100.0f;
 // Reports of this level and above (error, severe, critical) are problems of what was asked.
 constexpr int ourProblemLevel = 1;
+// The divisor of the width and height while the camera moves, with the fast camera on.
+constexpr int ourFastCameraDivisor = 3;
 
 LumoraWrapper::ObjectKind FacadeKind(Kind aKind)
 {
@@ -369,6 +371,7 @@ void EngineThread::SetDisplay(const DisplayOptions& someOptions)
 {
 	Queue([someOptions](LumoraWrapper& aFacade) {
 		aFacade.RenderMeshes(someOptions.myMeshesFlag);
+		aFacade.SetInteractiveDivisor(someOptions.myFastCameraFlag ? ourFastCameraDivisor : 1);
 		aFacade.RenderRooms(someOptions.myRoomsFlag);
 		aFacade.SetLightIconsFlag(someOptions.myLightIconsFlag);
 		static constexpr LumoraWrapper::LightVolumes ourVolumes[] = {LumoraWrapper::LightVolumes::NONE,

@@ -43,6 +43,10 @@ struct DisplayOptions
 	bool myLightIconsFlag = true;
 	// 0 none, 1 the selection's, 2 every light's falloff sphere and cone.
 	int myLightVolumes = 1;
+	// While the camera moves, frames are drawn at a third of the width and height (scaled up,
+	// the overlays sharp) and the first frame with the camera still at full size: on a software
+	// rasterizer a flight through a level gets about 20 frames a second instead of 3 to 4.
+	bool myFastCameraFlag = true;
 };
 
 class EngineThread : public QObject, public EngineApi

@@ -179,7 +179,12 @@ void MainWindow::BuildActions()
 		connect(myVolumeActions[which], &QAction::triggered, this, &MainWindow::ApplyDisplay);
 	}
 	myVolumeActions[1]->setChecked(true);
-	for (QAction* toggle : {myMeshesAction, myRoomsAction, myIconsAction})
+	myFastCameraAction = new QAction(tr("&Fast Camera"), this);
+	myFastCameraAction->setToolTip(
+	    tr("Draw at a third of the resolution while the camera moves, and sharp again when it stops"));
+	myFastCameraAction->setCheckable(true);
+	myFastCameraAction->setChecked(true);
+	for (QAction* toggle : {myMeshesAction, myRoomsAction, myIconsAction, myFastCameraAction})
 	{
 		connect(toggle, &QAction::toggled, this, &MainWindow::ApplyDisplay);
 	}
@@ -219,6 +224,7 @@ void MainWindow::BuildMenus()
 	myViewMenu->addAction(myMeshesAction);
 	myViewMenu->addAction(myRoomsAction);
 	myViewMenu->addAction(myIconsAction);
+	myViewMenu->addAction(myFastCameraAction);
 	for (QAction* which : myVolumeActions)
 	{
 		myViewMenu->addAction(which);
@@ -501,6 +507,7 @@ void MainWindow::ApplyDisplay()
 	options.myMeshesFlag = myMeshesAction->isChecked();
 	options.myRoomsFlag = myRoomsAction->isChecked();
 	options.myLightIconsFlag = myIconsAction->isChecked();
+	options.myFastCameraFlag = myFastCameraAction->isChecked();
 	for (int which = 0; which < 3; ++which)
 	{
 		if (myVolumeActions[which]->isChecked())

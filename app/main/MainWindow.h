@@ -128,6 +128,7 @@ private:
 	QAction* myMeshesAction = nullptr;
 	QAction* myRoomsAction = nullptr;
 	QAction* myIconsAction = nullptr;
+	QAction* myFastCameraAction = nullptr;
 	QAction* myVolumeActions[3] = {};
 	QMenu* myRecentMenu = nullptr;
 	QMenu* myViewMenu = nullptr;

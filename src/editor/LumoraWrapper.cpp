@@ -507,6 +507,13 @@ void LumoraWrapper::RenderRooms(bool aRenderFlag)
 	myRenderRoomsFlag = aRenderFlag;
 }
 
+void LumoraWrapper::SetInteractiveDivisor(int aDivisor)
+{
+	Claim();
+	EngineOrNull()->GetRenderer().SetInteractiveDivisor(aDivisor);
+	Release();
+}
+
 void LumoraWrapper::PitchCamera(float aPitch)
 {
 	Claim();

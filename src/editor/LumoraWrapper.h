@@ -105,6 +105,10 @@ public:
 	void SetIsLightMode(int aMode);
 	void RenderMeshes(bool aRenderFlag);
 	void RenderRooms(bool aRenderFlag);
+	// While the camera moves, frames are drawn at 1/aDivisor of the width and height and
+	// scaled up; the first frame with the camera still is drawn at full size (1, the start's
+	// setting, draws every frame at full size; held to 1..4).
+	void SetInteractiveDivisor(int aDivisor);
 	void PitchCamera(float aPitch);
 	void YawCamera(float aYaw);
 	void Zoom(float aZoom);

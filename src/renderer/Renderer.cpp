@@ -106,6 +106,8 @@ bool Renderer::Init(int aWidth, int aHeight)
 	Destroy();
 	myWidth = aWidth;
 	myHeight = aHeight;
+	myOutputWidth = aWidth;
+	myOutputHeight = aHeight;
 	int& quality = engine->GetSetupInfo().myShadowQuality;
 	if (quality < SetupInfo::SHADOWS_DISABLED || quality > SetupInfo::SHADOWS_HIGH)
 	{
@@ -149,6 +151,7 @@ bool Renderer::Init(int aWidth, int aHeight)
 	SetupSpecialDepthBuffer();
 	SetupShadowDepthBuffer();
 	myScreenViewport = MakeViewport(aWidth, aHeight);
+	myOutputViewport = myScreenViewport;
 	myShadowViewport = MakeViewport(myShadowMapSize, myShadowMapSize);
 	Effect* modelEffect = engine->GetEffectContainer().GetEffect(ShaderFiles[EFFECT_LIT_MODEL]);
 	myTimeVariable = modelEffect != nullptr && modelEffect->GetEffect() != nullptr
@@ -176,6 +179,36 @@ bool Renderer::Resize(int aWidth, int aHeight)
 		ReportError(__LINE__, function, "Cannot resize the frame to %dx%d", aWidth, aHeight);
 		return false;
 	}
+	if (!ResizeTargets(aWidth, aHeight))
+	{
+		return false;
+	}
+	myOutputWidth = aWidth;
+	myOutputHeight = aHeight;
+	myOutputViewport = MakeViewport(aWidth, aHeight);
+	return true;
+}
+
+void Renderer::SetInteractiveDivisor(int aDivisor)
+{
+	myInteractiveDivisor = std::clamp(aDivisor, 1, 4);
+}
+
+void Renderer::FollowTheCamera()
+{
+	const float* view = myCollector.GetView().myMatrix;
+	const float* previous = myCollector.GetPreviousView().myMatrix;
+	const bool movingFlag = myInteractiveDivisor > 1 && !std::equal(view, view + 16, previous);
+	const int width = movingFlag ? std::max(1, myOutputWidth / myInteractiveDivisor) : myOutputWidth;
+	const int height = movingFlag ? std::max(1, myOutputHeight / myInteractiveDivisor) : myOutputHeight;
+	// A size that cannot be made is reported by ResizeTargets; the frame is then drawn at the
+	// size the targets have.
+	ResizeTargets(width, height);
+}
+
+bool Renderer::ResizeTargets(int aWidth, int aHeight)
+{
+	const char* function = "Zeph::Renderer::Resize";
 	if (aWidth == myWidth && aHeight == myHeight)
 	{
 		return true;
@@ -711,7 +744,7 @@ void Renderer::RenderPostChain()
 	BeginPass("tone map 2");
 	myHDRManager.Render(myToneMappedTarget->GetRenderTargetView(), GetCurrentHDR());
 	BeginPass("grading");
-	myColorGradingManager.Render(myBackBuffer, myToneMappedTarget.get());
+	myColorGradingManager.Render(myBackBuffer, myOutputWidth, myOutputHeight, myToneMappedTarget.get());
 	// With nothing outlined (no selection) the mask is empty and the outline would blend a glow of
 	// alpha 0 over the image, leaving every pixel as it is: its blur chain and full-screen pass
 	// (about an eighth of the frame on a software rasterizer) are skipped.
@@ -719,7 +752,7 @@ void Renderer::RenderPostChain()
 	    myCollector.GetBatches(RenderTargetCollector::OUTLINE_SKINNED_LIST).Count() > 0)
 	{
 		BeginPass("outline");
-		myOutlineManager.Render(myBackBuffer, myOutlineHelper.GetTarget());
+		myOutlineManager.Render(myBackBuffer, myOutputWidth, myOutputHeight, myOutlineHelper.GetTarget());
 	}
 }
 
@@ -790,10 +823,13 @@ void Renderer::Render(Gpu::RenderTargetView* aBackBuffer, Gpu::DepthStencilView*
 		return;
 	}
 	Gpu::Context& context = engine->GetContext();
+	FollowTheCamera();
 	BeginPass("clear");
 	myBackBuffer = aBackBuffer;
 	myCurrentOutput = aBackBuffer;
-	myCurrentDepth = aDepth;
+	// A reduced frame does not fit the engine's depth buffer (the back buffer's size): the
+	// special depth buffer, which follows the frame's size and is cleared with it, stands in.
+	myCurrentDepth = IsFrameReduced() && mySpecialDepthView != nullptr ? mySpecialDepthView : aDepth;
 	myPingPongIndex = 0;
 	myDeferredHelper.Clear();
 	if (myShadowQuality != 0)
@@ -850,7 +886,7 @@ void Renderer::Render(Gpu::RenderTargetView* aBackBuffer, Gpu::DepthStencilView*
 	RenderPostChain();
 
 	BeginPass("late");
-	context.SetViewport(myScreenViewport);
+	context.SetViewport(myOutputViewport);
 	Gpu::RenderTargetView* const backBuffer[] = {myBackBuffer};
 	context.SetRenderTargets(backBuffer, nullptr);
 	// Effects that leave a state group unnamed keep the current one: the late items
@@ -865,7 +901,7 @@ void Renderer::Render(Gpu::RenderTargetView* aBackBuffer, Gpu::DepthStencilView*
 	myCollector.Reset();
 	RenderLateItems();
 	RenderDebugTextures();
-	context.SetViewport(myScreenViewport);
+	context.SetViewport(myOutputViewport);
 	EndPasses();
 	engine->Present();
 }

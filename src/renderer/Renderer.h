@@ -89,6 +89,16 @@ public:
 	// put back at the old size and it returns false (reported at the error level); a size
 	// below 1x1 is refused the same way. The same size does nothing.
 	bool Resize(int aWidth, int aHeight);
+	// Frames drawn while the camera moves: at 1/aDivisor of the width and height, so that a
+	// designer flying through a level on a software rasterizer gets several frames a second;
+	// 1 (the default) draws every frame at full size. The camera moves when the view differs
+	// from the frame before's; the first frame with the camera still is drawn at full size again.
+	// The reduced image is scaled up to the back buffer by the colour grading pass and the
+	// overlays are drawn over it at full size. The divisor is held to 1..4.
+	void SetInteractiveDivisor(int aDivisor);
+	int GetInteractiveDivisor() const { return myInteractiveDivisor; }
+	// Whether the last frame was drawn at the reduced size.
+	bool IsFrameReduced() const { return myWidth != myOutputWidth || myHeight != myOutputHeight; }
 	// Releases every target and forgets the queued frame; the engine calls it first at shutdown.
 	void Destroy();
 
@@ -299,14 +309,23 @@ private:
 	// The renderer's own frame-sized targets (HDR pair, tone-mapped image, special depth)
 	// made at a size, swapped in only when all are made.
 	bool ResizeFrameTargets(int aWidth, int aHeight);
+	// Every frame-sized target made at a size (Resize's steps); the output size stays.
+	bool ResizeTargets(int aWidth, int aHeight);
+	// The frame's size for this frame: reduced while the camera moves (SetInteractiveDivisor).
+	void FollowTheCamera();
 	void LoadSettings();
 	void BeginPass(const char* aName);
 	void EndPasses();
 
 	int myShadowQuality = 3;
 	int myShadowMapSize = 4096;
+	// The frame's targets' size, and the size of the image it is shown at (the back buffer's):
+	// the two differ only while the camera moves with an interactive divisor above 1.
 	int myWidth = 0;
 	int myHeight = 0;
+	int myOutputWidth = 0;
+	int myOutputHeight = 0;
+	int myInteractiveDivisor = 1;
 	std::atomic<int> myBakingProgress{0};
 	// Cells visited by the current bake, over every bounce.
 	long long myBakingProgressCounter = 0;
@@ -347,6 +366,7 @@ private:
 	RenderTargetCollector myCollector;
 	GrowingArray<LateRenderItem> myLateItems;
 	Gpu::Viewport myScreenViewport;
+	Gpu::Viewport myOutputViewport;
 	Gpu::Viewport myShadowViewport;
 	std::unique_ptr<Gpu::Texture> myShadowDepthTexture;
 	Gpu::DepthStencilView* myShadowDepthView = nullptr;

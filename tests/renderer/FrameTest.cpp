@@ -179,3 +179,50 @@ TEST_F(FrameTest, ShadowQualityPicksTheMapAndRepairsTheSettingAndEveryPassRunsWi
 		crate->GetSurfaces()[surface].SetRenderCategory(Zeph::RENDER_CATEGORY_SHADOW_CASTING);
 	}
 }
+
+// While the camera moves, an interactive divisor draws the frame's targets smaller and the grading
+// pass scales the picture up to the whole back buffer; the first frame with the camera still is
+// drawn at full size again, and a divisor of 1 never reduces.
+TEST_F(FrameTest, AMovingCameraIsDrawnSmallerAndScaledUpAndAStillOneAtFullSize)
+{
+	LUMORA_RETURN_UNLESS(Start());
+	Place("data/models/room_small.dae", {0.0f, 0.0f, 0.0f});
+	Place("data/models/crate.dae", {0.3f, 0.0f, 0.6f});
+	myPointLights.push_back(
+	    {.myFalloff = 3.0f, .myPosition = {0.0f, 2.0f, 0.0f}, .myColor = {4.0f, 4.0f, 4.0f, 1.0f}});
+	const auto litWidth = [] { return static_cast<int>(Renderer().GetLitImage()->GetImageInfo().myWidth); };
+	const auto meanDifference = [](const std::vector<uint8_t>& aFirst, const std::vector<uint8_t>& aSecond) {
+		double sum = 0.0;
+		for (size_t index = 0; index < aFirst.size(); ++index)
+		{
+			sum += index % 4 == 3 ? 0.0 : std::abs(aFirst[index] - aSecond[index]);
+		}
+		return sum / (static_cast<double>(aFirst.size()) * 0.75);
+	};
+
+	Renderer().SetInteractiveDivisor(2);
+	Look({-1.0f, 1.6f, -1.6f}, {0.3f, 0.3f, 0.6f});
+	Render("interactive-still", 6);
+	EXPECT_FALSE(Renderer().IsFrameReduced());
+	EXPECT_EQ(litWidth(), ourWidth);
+
+	Look({-1.02f, 1.6f, -1.6f}, {0.3f, 0.3f, 0.6f});
+	Render("interactive-moving");
+	EXPECT_TRUE(Renderer().IsFrameReduced());
+	EXPECT_EQ(litWidth(), ourWidth / 2);
+	const std::vector<uint8_t> moving = myPixels;
+	Render("interactive-stopped");
+	EXPECT_FALSE(Renderer().IsFrameReduced());
+	EXPECT_EQ(litWidth(), ourWidth);
+	// The reduced frame is the same picture, softer: it covers the whole back buffer.
+	const double difference = meanDifference(moving, myPixels);
+	EXPECT_GT(difference, 0.0);
+	EXPECT_LT(difference, 6.0);
+
+	// Off: a moving camera is drawn at full size.
+	Renderer().SetInteractiveDivisor(1);
+	Look({-1.0f, 1.6f, -1.6f}, {0.3f, 0.3f, 0.6f});
+	Render("interactive-off");
+	EXPECT_FALSE(Renderer().IsFrameReduced());
+	EXPECT_EQ(litWidth(), ourWidth);
+}

@@ -38,6 +38,8 @@ public:
 	void Destroy();
 	// Submits the camera, the instances, the lights, the decal and the info line.
 	void Queue();
+	// The camera Queue submits (the frame benchmark turns it to time a moving view).
+	Zeph::CameraInstance& GetCamera() { return myCamera; }
 
 private:
 	Zeph::Engine* myEngine = nullptr;

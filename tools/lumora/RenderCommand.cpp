@@ -1,15 +1,14 @@
 // One frame of a level through the editor facade headless: the level loaded, the
 // editor camera placed, a few frames of the front end's loop (Update, Render) so the
 // eye adaptation settles, and the back buffer read back into a PNG.
-#include <cmath>
 #include <cstdio>
 #include <filesystem>
 #include <vector>
 
 #include "Commands.h"
 #include "EditorSession.h"
+#include "LevelCamera.h"
 #include "editor/LumoraMode.h"
-#include "engine/CameraInstance.h"
 #include "engine/Engine.h"
 #include "platform/gpu/Readback.h"
 #include "platform/paths/Paths.h"
@@ -18,31 +17,6 @@ namespace LumoraTool
 {
 namespace
 {
-constexpr float ourHalfPi = 1.57079633f;
-
-// From the start position (0, 10, 0), looking along +z: turned round toward -z (turns
-// are about the camera's own up, so they come first), back over the first room's edge,
-// down at a steep angle (the camera's pitch is limited) to eye height in the room, a
-// slight downward tilt, and backed off toward the wall.
-void WalkIntoTheFirstRoom(Lumora::LumoraWrapper& anEditor)
-{
-	const auto forward = [&anEditor] {
-		return anEditor.GetCameraInstance()->GetActualOrientation().GetForward();
-	};
-	constexpr float steep = 0.9f;
-	anEditor.YawCamera(2.0f * ourHalfPi);
-	anEditor.Zoom(-5.0f);
-	anEditor.PitchCamera(steep);
-	const float down = forward().y < 0.0f ? 1.0f : -1.0f;
-	if (down < 0.0f)
-	{
-		anEditor.PitchCamera(-2.0f * steep);
-	}
-	anEditor.Zoom(7.5f / std::sin(steep));
-	anEditor.PitchCamera(-down * (steep - 0.18f));
-	anEditor.Zoom(-4.5f);
-}
-
 int ModeNumber(const std::string& aMode)
 {
 	if (aMode == "node")

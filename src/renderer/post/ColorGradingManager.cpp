@@ -65,9 +65,14 @@ bool ColorGradingManager::Init(int aWidth, int aHeight, FullScreenHelper* aFullS
 
 void ColorGradingManager::Render(Gpu::RenderTargetView* aDestination, Texture* aSource)
 {
+	Render(aDestination, myWidth, myHeight, aSource);
+}
+
+void ColorGradingManager::Render(Gpu::RenderTargetView* aDestination, int aWidth, int aHeight, Texture* aSource)
+{
 	if (myFullScreenHelper != nullptr)
 	{
-		myFullScreenHelper->Process("ColorGrade", aSource, aDestination, myWidth, myHeight);
+		myFullScreenHelper->Process("ColorGrade", aSource, aDestination, aWidth, aHeight);
 	}
 }
 

@@ -30,6 +30,8 @@ public:
 	bool Init(int aWidth, int aHeight, FullScreenHelper* aFullScreenHelper, ComputeHelper* aComputeHelper,
 	          const std::string& aLookupFile);
 	void Render(Gpu::RenderTargetView* aDestination, Texture* aSource) override;
+	// Into a destination of another size than the stage's (the source is scaled to it).
+	void Render(Gpu::RenderTargetView* aDestination, int aWidth, int aHeight, Texture* aSource);
 	void Destroy() override;
 
 	Gpu::ShaderResourceView* GetLookupView() const { return myLookupView; }

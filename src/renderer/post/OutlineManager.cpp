@@ -63,6 +63,11 @@ bool OutlineManager::Init(int aWidth, int aHeight, FullScreenHelper* aFullScreen
 
 void OutlineManager::Render(Gpu::RenderTargetView* aDestination, Texture* aSource)
 {
+	Render(aDestination, myWidth, myHeight, aSource);
+}
+
+void OutlineManager::Render(Gpu::RenderTargetView* aDestination, int aWidth, int aHeight, Texture* aSource)
+{
 	if (myFullScreenHelper == nullptr)
 	{
 		return;
@@ -71,7 +76,7 @@ void OutlineManager::Render(Gpu::RenderTargetView* aDestination, Texture* aSourc
 	myFullScreenHelper->SetDiffuseTextures(myChain.GetResult(0)->GetShaderResourceView(),
 	                                       myChain.GetResult(1)->GetShaderResourceView(),
 	                                       myChain.GetResult(2)->GetShaderResourceView());
-	myFullScreenHelper->Process("Outline", aSource, aDestination, myWidth, myHeight);
+	myFullScreenHelper->Process("Outline", aSource, aDestination, aWidth, aHeight);
 	Engine::GetInstance()->GetContext().SetRenderTargets({}, nullptr);
 }
 

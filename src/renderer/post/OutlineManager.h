@@ -45,6 +45,8 @@ public:
 	          ComputeHelper* aComputeHelper) override;
 	// aSource is the outline mask; the glow is blended onto aDestination.
 	void Render(Gpu::RenderTargetView* aDestination, Texture* aSource) override;
+	// Onto a destination of another size than the stage's (the glow is scaled to it).
+	void Render(Gpu::RenderTargetView* aDestination, int aWidth, int aHeight, Texture* aSource);
 	void Destroy() override;
 
 	Texture* GetTarget() const { return myTarget.get(); }
