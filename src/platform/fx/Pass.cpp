@@ -153,7 +153,7 @@ bool Pass::Apply(Gpu::Context& aContext)
 			{
 				const Gpu::ShaderResourceView* view = variable.GetResource(element);
 				const int unit = variable.GetUnit() + element;
-				aContext.GetStateCache().BindTexture(unit, view ? view->GetName() : 0);
+				glBindTextureUnit(static_cast<GLuint>(unit), view ? view->GetName() : 0);
 				aContext.SetSampler(unit, sampler);
 			}
 		}

@@ -59,11 +59,6 @@ void StateCache::Reset()
 		mySamplers[unit] = 0;
 		glBindSampler(static_cast<GLuint>(unit), 0);
 	}
-	for (int unit = 0; unit < ourTextureUnitCount; ++unit)
-	{
-		myTextures[unit] = 0;
-		glBindTextureUnit(static_cast<GLuint>(unit), 0);
-	}
 	myViewport = Viewport{};
 	ApplyViewport(myViewport);
 
@@ -150,19 +145,6 @@ void StateCache::BindSampler(int aUnit, GLuint aSampler)
 	}
 }
 
-void StateCache::BindTexture(int aUnit, GLuint aTexture)
-{
-	if (aUnit >= 0 && aUnit < ourTextureUnitCount)
-	{
-		if (myTextures[aUnit] == aTexture)
-		{
-			return;
-		}
-		myTextures[aUnit] = aTexture;
-	}
-	glBindTextureUnit(static_cast<GLuint>(aUnit), aTexture);
-}
-
 void StateCache::ForgetProgram(GLuint aProgram)
 {
 	if (myProgram == aProgram)
@@ -186,17 +168,6 @@ void StateCache::ForgetSampler(GLuint aSampler)
 		if (sampler == aSampler)
 		{
 			sampler = 0;
-		}
-	}
-}
-
-void StateCache::ForgetTexture(GLuint aTexture)
-{
-	for (GLuint& texture : myTextures)
-	{
-		if (texture == aTexture)
-		{
-			texture = 0;
 		}
 	}
 }

@@ -35,8 +35,6 @@ class StateCache
 public:
 	// Texture units the cache tracks sampler bindings for (GL guarantees 16 per stage).
 	static constexpr int ourSamplerUnitCount = 32;
-	// Texture units the cache tracks texture bindings for; an effect numbers its textures from 0.
-	static constexpr int ourTextureUnitCount = 64;
 
 	// Direct3D's defaults: default blend, depth-stencil and rasterizer states.
 	void Reset();
@@ -49,13 +47,10 @@ public:
 	void BindVertexArray(GLuint aVertexArray);
 	// Units outside 0..ourSamplerUnitCount-1 are ignored; callers check them first.
 	void BindSampler(int aUnit, GLuint aSampler);
-	// A texture (or texture view) for a unit; units outside 0..ourTextureUnitCount-1 are always bound.
-	void BindTexture(int aUnit, GLuint aTexture);
 	// Deleted GL objects are unbound by GL; the cache must not skip a later bind of a reused name.
 	void ForgetProgram(GLuint aProgram);
 	void ForgetVertexArray(GLuint aVertexArray);
 	void ForgetSampler(GLuint aSampler);
-	void ForgetTexture(GLuint aTexture);
 
 	void SetViewport(const Viewport& aViewport);
 	void SetBlendState(const BlendState& aState);
@@ -82,7 +77,6 @@ private:
 	GLuint myProgram = 0;
 	GLuint myVertexArray = 0;
 	GLuint mySamplers[ourSamplerUnitCount] = {};
-	GLuint myTextures[ourTextureUnitCount] = {};
 	Viewport myViewport;
 	BlendState myBlend;
 	bool myDepthTestFlag = true;

@@ -167,10 +167,6 @@ void Texture::Destroy()
 	myDefaultView = nullptr;
 	if (myName != 0)
 	{
-		if (myContext != nullptr)
-		{
-			myContext->GetStateCache().ForgetTexture(myName);
-		}
 		glDeleteTextures(1, &myName);
 		myName = 0;
 	}

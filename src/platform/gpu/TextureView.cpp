@@ -59,7 +59,6 @@ void View::Destroy()
 		return;
 	}
 	myTexture->GetContext().GetFramebufferCache().ForgetView(myUniqueId);
-	myTexture->GetContext().GetStateCache().ForgetTexture(myName);
 	glDeleteTextures(1, &myName);
 	myName = 0;
 	myUniqueId = 0;
