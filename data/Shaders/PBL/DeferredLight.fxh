@@ -23,40 +23,34 @@ struct GBufferSurface
 	float myMetalness;
 };
 
-// The surface's view-space position under this fragment and its G-buffer texel; false where
-// the G-buffer holds no geometry. The rest of the surface is read by ReadMaterial only for
-// pixels the light reaches: most of a volume's pixels lie outside the reach.
-bool ReadPosition(vec2 aFragCoord, out GBufferSurface aSurface, out ivec2 aTexel)
+// The surface under this fragment; false where the G-buffer holds no geometry.
+bool ReadSurface(vec2 aFragCoord, out GBufferSurface aSurface)
 {
 	ivec2 size = max(textureSize(DepthTexture, 0), ivec2(1));
-	aTexel = clamp(ivec2(aFragCoord), ivec2(0), size - 1);
-	float depth = texelFetch(DepthTexture, aTexel, 0).r;
+	ivec2 texel = clamp(ivec2(aFragCoord), ivec2(0), size - 1);
+	float depth = texelFetch(DepthTexture, texel, 0).r;
 	if (depth < 0.0)
 	{
 		return false;
 	}
+	vec4 material = texelFetch(MaterialTexture, texel, 0);
+	aSurface.myAlbedo = texelFetch(AlbedoTexture, texel, 0).rgb;
+	aSurface.myNormal = DecodeNormal(texelFetch(NormalTexture, texel, 0));
 	aSurface.myPosition = ViewPositionFromDepth(aFragCoord / vec2(size), depth, Projection, FarPlane);
-	return true;
-}
-
-void ReadMaterial(ivec2 aTexel, inout GBufferSurface aSurface)
-{
-	vec4 material = texelFetch(MaterialTexture, aTexel, 0);
-	aSurface.myAlbedo = texelFetch(AlbedoTexture, aTexel, 0).rgb;
-	aSurface.myNormal = DecodeNormal(texelFetch(NormalTexture, aTexel, 0));
 	aSurface.myToEye = SafeNormalize(-aSurface.myPosition, vec3(0.0, 0.0, -1.0));
 	aSurface.myRoughness = material.r;
 	aSurface.myMetalness = material.g;
+	return true;
 }
 
-// The light's view-space direction from the surface (the surface's normal where the surface
-// is at the light) and its distance.
-vec3 DirectionToLight(GBufferSurface aSurface, vec3 aFallback, out float aDistance)
+// The light's view-space direction from the surface and its distance.
+vec3 DirectionToLight(GBufferSurface aSurface, out float aDistance)
 {
 	vec3 toLight = LightPosition.xyz - aSurface.myPosition;
 	aDistance = length(toLight);
-	return SafeNormalize(toLight, aFallback);
+	return SafeNormalize(toLight, aSurface.myNormal);
 }
+
 // The volume's outline in the light's colour, for looking at where lights are.
 fragment PS_VolumeMesh
 {

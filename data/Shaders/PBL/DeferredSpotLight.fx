@@ -40,20 +40,17 @@ fragment PS_SpotLight
 	void main()
 	{
 		GBufferSurface surface;
-		ivec2 texel;
-		if (!ReadPosition(gl_FragCoord.xy, surface, texel))
+		if (!ReadSurface(gl_FragCoord.xy, surface))
 		{
 			discard;
 		}
 		float distanceToLight;
-		vec3 toLight = DirectionToLight(surface, vec3(0.0, 0.0, -1.0), distanceToLight);
+		vec3 toLight = DirectionToLight(surface, distanceToLight);
 		float attenuation = DistanceAttenuation(distanceToLight, LightFalloff) * ConeFactor(toLight);
 		if (attenuation <= 0.0)
 		{
 			discard;
 		}
-		ReadMaterial(texel, surface);
-		toLight = DirectionToLight(surface, surface.myNormal, distanceToLight);
 		vec3 radiance = max(LightColor.rgb, vec3(0.0)) * attenuation;
 		oColor = vec4(ShadeDirect(surface.myAlbedo, surface.myRoughness, surface.myMetalness, surface.myNormal,
 		                          surface.myToEye, toLight, radiance),
