@@ -63,10 +63,7 @@ fragment PS_ColorGrade
 
 	void main()
 	{
-		// A frame drawn smaller while the camera moves is scaled up to the target here.
-		vec4 color = all(equal(textureSize(SourceTexture, 0), ivec2(ScreenSize + 0.5)))
-		                 ? texelFetch(SourceTexture, ivec2(gl_FragCoord.xy), 0)
-		                 : texture(SourceTexture, vTexCoord);
+		vec4 color = texture(SourceTexture, vTexCoord);
 		vec3 size = vec3(max(textureSize(ColorGradingTex, 0), ivec3(1)));
 		vec3 uvw = LinearToSrgb(color.rgb) * ((size - 1.0) / size) + 0.5 / size;
 		oColor = vec4(SrgbToLinear(texture(ColorGradingTex, uvw).rgb), color.a);

@@ -124,20 +124,18 @@ fragment PS_Ambient
 
 	void main()
 	{
-		// The G-buffer is the target's size: each pixel reads its own texels.
-		ivec2 pixel = ivec2(gl_FragCoord.xy);
-		float depth = texelFetch(LinearDepthTexture, pixel, 0).r;
+		float depth = texture(LinearDepthTexture, vTexCoord).r;
 		if (depth < 0.0)
 		{
 			discard;
 		}
 		vec3 viewPosition = vFrustumRay * depth;
-		vec3 viewNormal = DecodeNormal(texelFetch(NormalTexture, pixel, 0));
+		vec3 viewNormal = DecodeNormal(texture(NormalTexture, vTexCoord));
 		vec3 worldPosition = (invView * vec4(viewPosition, 1.0)).xyz;
 		vec3 worldNormal = SafeNormalize(mat3(invView) * viewNormal, vec3(0.0, 1.0, 0.0));
 
-		vec3 albedo = texelFetch(AlbedoTexture, pixel, 0).rgb;
-		vec4 material = texelFetch(MaterialTexture, pixel, 0);
+		vec3 albedo = texture(AlbedoTexture, vTexCoord).rgb;
+		vec4 material = texture(MaterialTexture, vTexCoord);
 		float roughness = material.r;
 		float metalness = material.g;
 		float occlusion = material.b;
@@ -148,7 +146,7 @@ fragment PS_Ambient
 
 		vec3 toEye = SafeNormalize(-viewPosition, vec3(0.0, 0.0, -1.0));
 		float NdotV = clamp(dot(viewNormal, toEye), 0.0, 1.0);
-		vec3 specular = texelFetch(ReflectionTexture, pixel, 0).rgb *
+		vec3 specular = texture(ReflectionTexture, vTexCoord).rgb *
 		                EnvironmentBrdf(SpecularF0(albedo, metalness), roughness, NdotV) * occlusion;
 
 		vec3 emissive = albedo * material.a * EmissiveMultiplier;
