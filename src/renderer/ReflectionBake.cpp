@@ -35,10 +35,10 @@ constexpr const char* ourCubeNormalsFile = "data/Cubemaps/normaltest.dds";
 // from 2^11.375 at mip 1 down to 1 (a cosine over the hemisphere) at mip 8.
 constexpr int ourLastMip = 8;
 constexpr double ourSharpestPower = 8192.0;
-// The blur of mip m sums the cross halved m times (a cross of the mip's own resolution) for the
-// first three mips, and m - 1 times, at most 4, after them: a source texel is then at most 1.05 of
-// the lobe's standard deviation (1/sqrt(p) radians) wide, which widens the lobe by under 5 %, and
-// the wide lobes of the last mips sum a 48-texel cross instead of a 768-texel one.
+// The blur of mip m sums the cross halved clamp(m - 1, 1, 4) times, and mip 2 a cross of its own
+// resolution (halved twice): a source texel is then at most 0.9 of the lobe's standard deviation
+// (1/sqrt(p) radians) wide, which widens the lobe by under 4 %, and the wide lobes of the last mips
+// sum a 48-texel cross instead of a 768-texel one.
 constexpr int ourCrossHalvings = 4;
 
 enum Square
@@ -319,7 +319,7 @@ void Renderer::PrefilterReflection(DynamicCubemap& aCube)
 			}
 			effect->SetShaderResource("CubeNormals",
 			                          normals != nullptr ? normals->GetShaderResourceView() : nullptr);
-			const int halvings = std::clamp(mip <= 3 ? mip : mip - 1, 1, ourCrossHalvings);
+			const int halvings = mip == 2 ? 2 : std::clamp(mip - 1, 1, ourCrossHalvings);
 			Texture* source = halves[halvings - 1].get();
 			const int sourceSize = static_cast<int>(source->GetImageInfo().myWidth);
 			// The blurred cross at the mip's size, in the target's top-left corner; only its
