@@ -6,17 +6,18 @@
 // BM_DemoFrame/S: the demo scene (the large sample room with its props, three point lights, a
 //   spot light, a decal, the ambient volume) at shadow quality S (0 = no shadow map, 1 = 1024,
 //   3 = 4096 texels).
-// BM_DemoFrameMoving: the same with the camera turning a little every frame and the
-//   interactive divisor at 2, as the editor draws while a designer flies: each frame is drawn
-//   at 640 x 360 and scaled up.
-// BM_LevelFrame/M: sample_large through the editor facade from the README's camera (the level's
+// BM_DemoFrameMoving/D: the same with the camera turning a little every frame and the
+//   interactive divisor at D, as the editor draws while a designer flies: each frame is drawn
+//   at 1280/D x 720/D and scaled up (the editor picks D from 2 to 4 by the frames' time).
+// BM_LevelFrame/D: sample_large through the editor facade from the README's camera (the level's
 //   baked ambient.sh and cubemaps where they exist: scripts/run.sh bakes them), with the
-//   facade's shadow setting; M = 1 turns the camera every frame at the editor's divisor.
+//   facade's shadow setting; D = 0 still, D > 1 the camera turning at that divisor.
 //
 // Run from the repository root (it reads data/):  ./build/bench/bench_frame
 
 #include <benchmark/benchmark.h>
 
+#include <algorithm>
 #include <epoxy/gl.h>
 #include <functional>
 #include <map>
@@ -32,8 +33,6 @@ namespace
 {
 constexpr int ourWidth = 1280;
 constexpr int ourHeight = 720;
-// The editor's divisor while the camera moves.
-constexpr int ourMovingDivisor = 3;
 constexpr float ourTurn = 0.002f;
 
 // Times aFrame (which renders one frame and leaves the context current) and publishes the
@@ -66,7 +65,7 @@ void TimeFrames(benchmark::State& aState, Zeph::Renderer& aRenderer, const std::
 	aRenderer.SetPassTimingFlag(false);
 }
 
-void DemoFrame(benchmark::State& aState, int aShadowQuality, bool aMovingFlag)
+void DemoFrame(benchmark::State& aState, int aShadowQuality, int aMovingDivisor)
 {
 	Gpu::WindowHandle window = 0;
 	if (!Zeph::Engine::Create(window, ourWidth, ourHeight))
@@ -86,9 +85,9 @@ void DemoFrame(benchmark::State& aState, int aShadowQuality, bool aMovingFlag)
 		Zeph::Engine::ShutDown();
 		return;
 	}
-	renderer.SetInteractiveDivisor(aMovingFlag ? ourMovingDivisor : 1);
+	renderer.SetInteractiveDivisor(std::max(aMovingDivisor, 1));
 	TimeFrames(aState, renderer, [&](int aFrame) {
-		if (aMovingFlag)
+		if (aMovingDivisor > 1)
 		{
 			scene.GetCamera().Yaw(aFrame % 2 == 0 ? ourTurn : -ourTurn);
 		}
@@ -101,17 +100,18 @@ void DemoFrame(benchmark::State& aState, int aShadowQuality, bool aMovingFlag)
 
 void BM_DemoFrame(benchmark::State& aState)
 {
-	DemoFrame(aState, static_cast<int>(aState.range(0)), false);
+	DemoFrame(aState, static_cast<int>(aState.range(0)), 0);
 }
 
 void BM_DemoFrameMoving(benchmark::State& aState)
 {
-	DemoFrame(aState, 0, true);
+	DemoFrame(aState, 0, static_cast<int>(aState.range(0)));
 }
 
 void BM_LevelFrame(benchmark::State& aState)
 {
-	const bool movingFlag = aState.range(0) != 0;
+	const int movingDivisor = static_cast<int>(aState.range(0));
+	const bool movingFlag = movingDivisor > 1;
 	LumoraTool::EditorSession session;
 	if (!session.Start("sample_large", ourWidth, ourHeight) || !session.Load("sample_large"))
 	{
@@ -122,7 +122,7 @@ void BM_LevelFrame(benchmark::State& aState)
 	LumoraTool::WalkIntoTheFirstRoom(editor);
 	// The level as the README pictures it: no light gizmos or volume outlines.
 	editor.RenderMeshes(false);
-	editor.SetInteractiveDivisor(movingFlag ? ourMovingDivisor : 1);
+	editor.SetInteractiveDivisor(std::max(movingDivisor, 1));
 	Zeph::Engine* engine = Zeph::Engine::GetInstance();
 	TimeFrames(aState, engine->GetRenderer(), [&](int aFrame) {
 		if (movingFlag)
@@ -138,6 +138,6 @@ void BM_LevelFrame(benchmark::State& aState)
 }
 
 BENCHMARK(BM_DemoFrame)->Arg(0)->Arg(1)->Arg(3)->Unit(benchmark::kMillisecond)->UseRealTime()->MinTime(3.0);
-BENCHMARK(BM_DemoFrameMoving)->Unit(benchmark::kMillisecond)->UseRealTime()->MinTime(3.0);
-BENCHMARK(BM_LevelFrame)->Arg(0)->Arg(1)->Unit(benchmark::kMillisecond)->UseRealTime()->MinTime(3.0);
+BENCHMARK(BM_DemoFrameMoving)->Arg(3)->Arg(4)->Unit(benchmark::kMillisecond)->UseRealTime()->MinTime(3.0);
+BENCHMARK(BM_LevelFrame)->Arg(0)->Arg(3)->Arg(4)->Unit(benchmark::kMillisecond)->UseRealTime()->MinTime(3.0);
 } // namespace

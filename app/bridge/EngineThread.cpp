@@ -24,8 +24,6 @@ using Lumora::LumoraWrapper;
 constexpr float ourLongestStepMs = 100.0f;
 // Reports of this level and above (error, severe, critical) are problems of what was asked.
 constexpr int ourProblemLevel = 1;
-// The divisor of the width and height while the camera moves, with the fast camera on.
-constexpr int ourFastCameraDivisor = 3;
 
 LumoraWrapper::ObjectKind FacadeKind(Kind aKind)
 {
@@ -334,6 +332,15 @@ void EngineThread::Loop(quint64 aWindow, QSize aSize)
 		facade.Render();
 		lastFrame = Clock::now();
 		const double frameMs = std::chrono::duration<double, std::milli>(lastFrame - start).count();
+		if (myFastCameraFlag && facade.IsFrameReduced())
+		{
+			const int divisor = NextMovingDivisor(myMovingDivisor, frameMs);
+			if (divisor != myMovingDivisor)
+			{
+				myMovingDivisor = divisor;
+				facade.SetInteractiveDivisor(divisor);
+			}
+		}
 		const QSize drawn(facade.GetWidth(), facade.GetHeight());
 		PostToUi([this, frameMs, drawn] { emit frameRendered(frameMs, drawn); });
 	}
@@ -369,9 +376,10 @@ void EngineThread::RequestFrames()
 
 void EngineThread::SetDisplay(const DisplayOptions& someOptions)
 {
-	Queue([someOptions](LumoraWrapper& aFacade) {
+	Queue([this, someOptions](LumoraWrapper& aFacade) {
 		aFacade.RenderMeshes(someOptions.myMeshesFlag);
-		aFacade.SetInteractiveDivisor(someOptions.myFastCameraFlag ? ourFastCameraDivisor : 1);
+		myFastCameraFlag = someOptions.myFastCameraFlag;
+		aFacade.SetInteractiveDivisor(myFastCameraFlag ? myMovingDivisor : 1);
 		aFacade.RenderRooms(someOptions.myRoomsFlag);
 		aFacade.SetLightIconsFlag(someOptions.myLightIconsFlag);
 		static constexpr LumoraWrapper::LightVolumes ourVolumes[] = {LumoraWrapper::LightVolumes::NONE,

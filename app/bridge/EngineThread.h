@@ -28,6 +28,7 @@
 #include "bridge/CameraPlacement.h"
 #include "bridge/EngineApi.h"
 #include "bridge/LevelSnapshot.h"
+#include "view/MovingResolution.h"
 
 namespace Lumora
 {
@@ -43,9 +44,10 @@ struct DisplayOptions
 	bool myLightIconsFlag = true;
 	// 0 none, 1 the selection's, 2 every light's falloff sphere and cone.
 	int myLightVolumes = 1;
-	// While the camera moves, frames are drawn at a third of the width and height (scaled up,
-	// the overlays sharp) and the first frame with the camera still at full size: on a software
-	// rasterizer a flight through a level gets about 20 frames a second instead of 3 to 4.
+	// While the camera moves, frames are drawn smaller (a half to a quarter of the width and
+	// height, as the frame budget allows: view/MovingResolution.h), scaled up with the overlays
+	// sharp, and the first frame with the camera still at full size: on a software rasterizer a
+	// flight through a level gets about 20 frames a second instead of 3 to 4.
 	bool myFastCameraFlag = true;
 };
 
@@ -133,5 +135,8 @@ private:
 	bool myFrameFlag = false;
 	// Frames are rendered until then (eye adaptation after a change).
 	std::chrono::steady_clock::time_point mySettleUntil{};
+	// The engine thread's own: the fast camera's switch and the divisor its frames are drawn at.
+	bool myFastCameraFlag = true;
+	int myMovingDivisor = ourSmallestMovingDivisor + 1;
 };
 } // namespace LumoraEditor

@@ -5,6 +5,7 @@
 
 #include "view/DragMath.h"
 #include "view/FlyCamera.h"
+#include "view/MovingResolution.h"
 
 using namespace LumoraEditor;
 
@@ -43,6 +44,25 @@ class ViewLogicTest : public QObject
 	Q_OBJECT
 
 private slots:
+	// A moving camera's frames keep to the budget: over it the next frame is drawn smaller, a step
+	// sharper is taken only when its four-thirds or more pixels would still fit with room to spare,
+	// and the divisor stays within 2..4 whatever is asked.
+	void TheMovingDivisorFollowsTheFrameBudget()
+	{
+		QCOMPARE(NextMovingDivisor(3, 64.0), 4);
+		QCOMPARE(NextMovingDivisor(4, 90.0), 4);
+		QCOMPARE(NextMovingDivisor(2, 51.0), 3);
+		// At 3, a 2 would take 9/4 of the time: 17 ms (38 ms then) is taken, 18 ms (40.5) is not.
+		QCOMPARE(NextMovingDivisor(3, 17.0), 2);
+		QCOMPARE(NextMovingDivisor(3, 18.0), 3);
+		QCOMPARE(NextMovingDivisor(3, 45.0), 3);
+		// At 4, a 3 would take 16/9: 22 ms (39 then) is taken.
+		QCOMPARE(NextMovingDivisor(4, 22.0), 3);
+		QCOMPARE(NextMovingDivisor(2, 1.0), 2);
+		QCOMPARE(NextMovingDivisor(0, 1.0), 2);
+		QCOMPARE(NextMovingDivisor(9, 1.0), 3);
+	}
+
 	void TheCameraBasisIsUnitAndLeftHanded()
 	{
 		const CameraPlacement camera = TurnedCamera();

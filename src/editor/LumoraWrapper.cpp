@@ -514,6 +514,12 @@ void LumoraWrapper::SetInteractiveDivisor(int aDivisor)
 	Release();
 }
 
+bool LumoraWrapper::IsFrameReduced() const
+{
+	Zeph::Engine* engine = EngineOrNull();
+	return engine != nullptr && engine->GetRenderer().IsFrameReduced();
+}
+
 void LumoraWrapper::PitchCamera(float aPitch)
 {
 	Claim();

@@ -109,6 +109,8 @@ public:
 	// scaled up; the first frame with the camera still is drawn at full size (1, the start's
 	// setting, draws every frame at full size; held to 1..4).
 	void SetInteractiveDivisor(int aDivisor);
+	// Whether the last frame was drawn smaller because the camera moved; the rendering thread.
+	bool IsFrameReduced() const;
 	void PitchCamera(float aPitch);
 	void YawCamera(float aYaw);
 	void Zoom(float aZoom);
