@@ -362,6 +362,7 @@ void MainWindow::RestoreSettings()
 	myMeshesAction->setChecked(settings.value(QStringLiteral("display/meshes"), false).toBool());
 	myRoomsAction->setChecked(settings.value(QStringLiteral("display/rooms"), false).toBool());
 	myIconsAction->setChecked(settings.value(QStringLiteral("display/icons"), true).toBool());
+	myFastCameraAction->setChecked(settings.value(QStringLiteral("display/fast-camera"), true).toBool());
 	myVolumeActions[std::clamp(settings.value(QStringLiteral("display/volumes"), 1).toInt(), 0, 2)]
 	    ->setChecked(true);
 	RefreshRecentMenu();
@@ -376,6 +377,7 @@ void MainWindow::StoreSettings() const
 	settings.setValue(QStringLiteral("display/meshes"), myMeshesAction->isChecked());
 	settings.setValue(QStringLiteral("display/rooms"), myRoomsAction->isChecked());
 	settings.setValue(QStringLiteral("display/icons"), myIconsAction->isChecked());
+	settings.setValue(QStringLiteral("display/fast-camera"), myFastCameraAction->isChecked());
 	for (int which = 0; which < 3; ++which)
 	{
 		if (myVolumeActions[which]->isChecked())
