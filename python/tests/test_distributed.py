@@ -75,11 +75,15 @@ def test_a_worker_killed_mid_bake_changes_nothing_in_the_result(reference, clien
     killed = []
 
     def kill_one(phase, done, total):
-        # After the first part of the first bounce: the other worker is still busy.
+        # After the first part of the first bounce, while the other worker is still busy: a worker
+        # that holds the inputs the driver sent (the level's package), so that the bake depends on
+        # other copies of them.
         if not killed:
-            pid = next(iter(pids.values()))
-            os.kill(pid, signal.SIGKILL)
-            killed.append(pid)
+            holders = {address for key, addresses in client.who_has().items()
+                       if not str(key).startswith("lumora-") for address in addresses}
+            address = next((address for address in pids if address in holders), next(iter(pids)))
+            os.kill(pids[address], signal.SIGKILL)
+            killed.append(address)
 
     lumora.distributed.bake("sample_small", client, bounces=2, parts=12, data=folder, progress=kill_one)
     assert killed

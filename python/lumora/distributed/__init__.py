@@ -140,7 +140,11 @@ def bake(level: str, client, bounces: int = 2, parts: Optional[int] = None, *,
     with Editor(data, 320, 180) as editor, tempfile.TemporaryDirectory(prefix="lumora-driver-") as scratch:
         editor.open(level)
         try:
-            package_future = client.scatter(package, hash=False)
+            # The inputs every task reads are copied to every worker before the first task runs: a
+            # worker that dies then takes no copy the others need with it. (With one copy, a worker
+            # killed while another was still fetching the package from it lost the package, and the
+            # scheduler cancelled every task waiting for it: seen once in a test run.)
+            package_future = client.scatter(package, hash=False, broadcast=True)
             cells = 1
             for count in editor.grid["counts"]:
                 cells *= count
@@ -165,13 +169,13 @@ def bake(level: str, client, bounces: int = 2, parts: Optional[int] = None, *,
                     editor.merge_ambient_parts(paths, merged)
                     with open(merged, "rb") as file:
                         volume = file.read()
-                    previous_future = client.scatter(volume, hash=False)
+                    previous_future = client.scatter(volume, hash=False, broadcast=True)
                     timings[f"ambient bounce {bounce}"] = time.monotonic() - bounce_start
             cubemaps: Dict[str, bytes] = {}
             rooms = [room for room in editor.rooms if room.cubemap] if reflections else []
             if rooms:
                 reflections_start = time.monotonic()
-                volume_future = client.scatter(volume, hash=False) if volume is not None else None
+                volume_future = client.scatter(volume, hash=False, broadcast=True) if volume is not None else None
                 futures = [client.submit(_worker.bake_reflection, package_future, level, room.id, volume_future,
                                          retries=retries, pure=False, key=f"lumora-reflection-{token}-{index}")
                            for index, room in enumerate(rooms)]
