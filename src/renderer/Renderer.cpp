@@ -201,9 +201,13 @@ void Renderer::FollowTheCamera()
 	const bool movingFlag = myInteractiveDivisor > 1 && !std::equal(view, view + 16, previous);
 	const int width = movingFlag ? std::max(1, myOutputWidth / myInteractiveDivisor) : myOutputWidth;
 	const int height = movingFlag ? std::max(1, myOutputHeight / myInteractiveDivisor) : myOutputHeight;
-	// A size that cannot be made is reported by ResizeTargets; the frame is then drawn at the
-	// size the targets have.
-	ResizeTargets(width, height);
+	// A size that cannot be made is reported by ResizeTargets and the frame is drawn at the size
+	// the targets have. Reduced targets that cannot be made turn the reduction off, so that the
+	// failure is reported once rather than at every moving frame.
+	if (!ResizeTargets(width, height) && movingFlag)
+	{
+		myInteractiveDivisor = 1;
+	}
 }
 
 bool Renderer::ResizeTargets(int aWidth, int aHeight)

@@ -96,7 +96,6 @@ public:
 	// The reduced image is scaled up to the back buffer by the colour grading pass and the
 	// overlays are drawn over it at full size. The divisor is held to 1..4.
 	void SetInteractiveDivisor(int aDivisor);
-	int GetInteractiveDivisor() const { return myInteractiveDivisor; }
 	// Whether the last frame was drawn at the reduced size.
 	bool IsFrameReduced() const { return myWidth != myOutputWidth || myHeight != myOutputHeight; }
 	// Releases every target and forgets the queued frame; the engine calls it first at shutdown.
