@@ -82,8 +82,8 @@ TEST(VolumeModelTest, VolumesAreClosedOutwardConvexAndContainTheirShapes)
 		size_t myTriangles;
 		const std::vector<Point>& myInside;
 		double myMinVolume, myMaxVolume;
-	} const cases[] = {{"light_volume_point", 320, sphere, 4.0 / 3.0 * ourPi, 4.0 / 3.0 * ourPi * 1.1},
-	                   {"light_volume_spot", 48, cone, ourPi / 3.0, ourPi / 3.0 * 1.02},
+	} const cases[] = {{"light_volume_point", 80, sphere, 4.0 / 3.0 * ourPi, 4.0 / 3.0 * ourPi * 1.08},
+	                   {"light_volume_spot", 24, cone, ourPi / 3.0, ourPi / 3.0 * 1.03},
 	                   {"decal_box", 12, cube, 1.0 - 1e-5, 1.0 + 1e-5}};
 	for (const Case& test : cases)
 	{

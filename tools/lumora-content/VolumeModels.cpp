@@ -90,7 +90,7 @@ std::vector<Triangle> Icosphere(int aLevels)
 ModelDescription PointVolume()
 {
 	ModelDescription model = StartModel("light_volume_point");
-	std::vector<Triangle> triangles = Icosphere(2);
+	std::vector<Triangle> triangles = Icosphere(1);
 	// The faces nearest the centre decide the scale that puts every plane outside the unit sphere.
 	double nearest = 1.0;
 	for (const Triangle& triangle : triangles)
