@@ -1,6 +1,10 @@
 #include "engine/SetupInfo.h"
 
+#include <filesystem>
+#include <system_error>
+
 #include "engine/FI_File.h"
+#include "platform/paths/Paths.h"
 
 namespace Zeph
 {
@@ -37,6 +41,15 @@ int ShadowQualityFromName(const std::string& aName)
 	}
 	return SetupInfo::SHADOWS_DISABLED;
 }
+
+void RemoveTemporary(const std::string& aTemporary)
+{
+	if (!aTemporary.empty())
+	{
+		std::error_code ignored;
+		std::filesystem::remove(aTemporary, ignored);
+	}
+}
 } // namespace
 
 bool SetupInfo::HasSettingsFile() const
@@ -50,9 +63,14 @@ bool SetupInfo::SaveSettings() const
 	{
 		return false;
 	}
+	// The settings are written whole to a temporary beside the file and renamed over it: a
+	// full disk or a killed process leaves the previous settings, never half of new ones.
+	const std::string target = Paths::PrepareForWrite(myFolder + myFileName);
+	const std::string temporary = target.empty() ? std::string() : Paths::TemporaryFor(target);
 	FI_File file;
-	if (!file.Open(myFolder + myFileName, FI_File::FileFlags::WRITE))
+	if (temporary.empty() || !file.Open(temporary, FI_File::FileFlags::WRITE))
 	{
+		RemoveTemporary(temporary);
 		return false;
 	}
 	// Each label is followed by a space: the reader takes labels as whitespace-separated
@@ -73,7 +91,12 @@ bool SetupInfo::SaveSettings() const
 	file.NewLine();
 	file.WriteWord("Shadows ");
 	file.Write(ShadowQualityName(myShadowQuality));
-	return file.Close();
+	if (!file.Close() || !Paths::ReplaceWith(temporary, target))
+	{
+		RemoveTemporary(temporary);
+		return false;
+	}
+	return true;
 }
 
 bool SetupInfo::LoadSettings()

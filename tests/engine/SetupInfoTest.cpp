@@ -5,6 +5,7 @@
 
 #include "engine/Camera.h"
 #include "engine/SetupInfo.h"
+#include "support/FileSizeLimit.h"
 #include "support/TestSupport.h"
 
 using TestSupport::ReadWholeFile;
@@ -55,7 +56,7 @@ TEST(SetupInfoTest, SettingsFileIsWrittenAsTextAndReadsBackEveryField)
 	}
 }
 
-TEST(SetupInfoTest, NoSettingsFileWhileFolderOrNameIsNullAndACutFileChangesNothing)
+TEST(SetupInfoTest, NoSettingsFileWhileFolderOrNameIsNullAndACutFileOrAFullDiskChangesNothing)
 {
 	ScratchDir scratch;
 	Zeph::SetupInfo info;
@@ -69,6 +70,21 @@ TEST(SetupInfoTest, NoSettingsFileWhileFolderOrNameIsNullAndACutFileChangesNothi
 	EXPECT_FALSE(info.LoadSettings());
 	EXPECT_EQ(info.mySessionName, Zeph::SetupInfo().mySessionName);
 	EXPECT_EQ(info.myWidth, Zeph::SetupInfo().myWidth);
+
+	// A save that cannot finish leaves the settings that were there, and no temporary.
+	info.myFileName = "Saved.txt";
+	ASSERT_TRUE(info.SaveSettings());
+	const std::string saved = ReadWholeFile(info.myFolder + info.myFileName);
+	info.mySessionName = "A session name long enough not to fit";
+	{
+		TestSupport::FileSizeLimit full(16);
+		EXPECT_FALSE(info.SaveSettings());
+	}
+	EXPECT_EQ(ReadWholeFile(info.myFolder + info.myFileName), saved);
+	EXPECT_EQ(std::distance(std::filesystem::directory_iterator(scratch.Path()),
+	                        std::filesystem::directory_iterator()),
+	          2)
+	    << "Cut.txt and Saved.txt only";
 }
 
 TEST(SetupInfoTest, CameraWithoutAnEngineTakesTheDefaultResolution)
