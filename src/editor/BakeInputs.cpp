@@ -7,7 +7,9 @@
 #include <xxhash.h>
 
 #include "engine/Engine.h"
+#include "engine/ShaderFiles.h"
 #include "model/ModelFactory.h"
+#include "platform/fx/EffectSource.h"
 #include "platform/paths/Paths.h"
 #include "renderer/post/ColorGradingManager.h"
 
@@ -22,6 +24,11 @@ constexpr const char* ourLevelFiles[] = {"rooms.xml", "entities.xml", "lights.xm
 constexpr const char* ourSharedFiles[] = {"data/XML/EntityTypes.xml", "data/XML/DecalTypes.xml",
                                           "data/Shaders/SSAO.xml", "data/Shaders/HDRBloom.xml",
                                           Zeph::ColorGradingManager::ourLookupFile};
+// The effects the probe captures draw with (the G-buffer, both light passes, the ambient pass
+// and the reflection filter): a changed shader changes what a bake makes.
+constexpr Zeph::EffectType ourBakeEffects[] = {Zeph::EFFECT_LIT_MODEL, Zeph::EFFECT_FULL_SCREEN,
+                                               Zeph::EFFECT_DEFERRED_POINT_LIGHT,
+                                               Zeph::EFFECT_DEFERRED_SPOT_LIGHT};
 
 std::string Hex(const XXH128_hash_t& aHash)
 {
@@ -58,6 +65,16 @@ std::vector<std::string> CollectBakeInputs(const std::string& aLevel)
 		inputs.push_back("data/XML/levels/" + aLevel + "/" + file);
 	}
 	inputs.insert(inputs.end(), std::begin(ourSharedFiles), std::end(ourSharedFiles));
+	for (const Zeph::EffectType effect : ourBakeEffects)
+	{
+		// Each effect with every file it includes, as the effect compiler finds them; one that
+		// is missing or does not assemble is still named, so that its hash tells what became of it.
+		Fx::EffectSource source;
+		std::string errors;
+		source.Load(Zeph::ShaderFiles[effect], errors);
+		inputs.push_back(Zeph::ShaderFiles[effect]);
+		inputs.insert(inputs.end(), source.GetFiles().begin(), source.GetFiles().end());
+	}
 	if (Zeph::Engine* engine = Zeph::Engine::GetInstance())
 	{
 		const std::vector<std::string> textures = engine->GetTextureContainer().GetFileNames();

@@ -19,8 +19,9 @@ namespace Lumora
 inline constexpr const char* ourMissingHash = "missing";
 
 // The level's five files, both catalogues, the post-processing settings (SSAO, bloom, the
-// colour-grading lookup) and every model and texture the engine has loaded: sorted, each
-// once. Without an engine the models and textures are left out.
+// colour-grading lookup), the effects the probe captures draw with and the files they
+// include, and every model and texture the engine has loaded: sorted, each once. Without an
+// engine the models and textures are left out.
 std::vector<std::string> CollectBakeInputs(const std::string& aLevel);
 
 // Each file's content hash; ourMissingHash for one that cannot be read.

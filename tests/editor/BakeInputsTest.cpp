@@ -18,9 +18,9 @@ using testing::Contains;
 using testing::EndsWith;
 } // namespace
 
-// The level's five files, both catalogues, the post-processing settings and every model and
-// texture loaded for the level, in order and each once; all of them files (the room boxes that
-// the model factory makes in memory are none). A record of the bake made from them names the
+// The level's five files, both catalogues, the post-processing settings, the capture's shaders
+// with the files they include, and every model and texture loaded for the level, in order and
+// each once; all of them files (the room boxes that the model factory makes in memory are none). A record of the bake made from them names the
 // volume with its size and finds nothing stale.
 TEST_F(BakeInputsTest, TheLoadedLevelsFilesModelsAndTexturesAreTheInputsOfItsBake)
 {
@@ -33,7 +33,9 @@ TEST_F(BakeInputsTest, TheLoadedLevelsFilesModelsAndTexturesAreTheInputsOfItsBak
 	      "data/XML/levels/sample_small/lights.xml", "data/XML/levels/sample_small/nodegraph.xml",
 	      "data/XML/levels/sample_small/decals.xml", "data/XML/EntityTypes.xml", "data/XML/DecalTypes.xml",
 	      "data/Shaders/SSAO.xml", "data/Shaders/HDRBloom.xml", "data/grading/default.dds",
-	      "data/models/crate.dae"})
+	      "data/models/crate.dae", "data/Shaders/PBL/DeferredPointLight.fx",
+	      "data/Shaders/FullScreen/VertexUV_Shader.fx", "data/Shaders/Common/Lighting.fxh",
+	      "data/Shaders/FullScreen/CubemapFilter.fxh"})
 	{
 		EXPECT_THAT(inputs, Contains(std::string(input)));
 	}
