@@ -12,31 +12,30 @@
 // its area over |d|^3 and the filter needs no table of faces: only angles between directions
 // count, and the centre face's frame serves for all of them.
 
-// The direction of cross point aCross in the centre face's frame; w is 0 in the empty corners.
-vec4 CrossDirection(vec2 aCross)
+// The cross u interval, within aLow..aHigh, of a row's texels on one face whose directions are
+// aStart + u * aStep (a face's directions are affine along a row; |aStep| = 1) and lie inside
+// the cone of directions within acos(aCosine) of aNormal: there (n.d)^2 - c^2 |d|^2 >= 0, a
+// quadratic in u. An empty interval has x > y.
+vec2 LobeInterval(vec3 aStart, vec3 aStep, float aLow, float aHigh, vec3 aNormal, float aCosine)
 {
-	bool insideX = abs(aCross.x) <= 1.0;
-	bool insideY = abs(aCross.y) <= 1.0;
-	if (insideX && insideY)
-	{
-		return vec4(aCross, 1.0, 1.0);
-	}
-	if (insideY)
-	{
-		return aCross.x > 0.0 ? vec4(1.0, aCross.y, 2.0 - aCross.x, 1.0) : vec4(-1.0, aCross.y, 2.0 + aCross.x, 1.0);
-	}
-	if (insideX)
-	{
-		return aCross.y > 0.0 ? vec4(aCross.x, 1.0, 2.0 - aCross.y, 1.0) : vec4(aCross.x, -1.0, 2.0 + aCross.y, 1.0);
-	}
-	return vec4(0.0);
+	float g = dot(aNormal, aStart);
+	float h = dot(aNormal, aStep);
+	float cosine2 = aCosine * aCosine;
+	float a = h * h - cosine2;
+	float b = 2.0 * (g * h - cosine2 * dot(aStart, aStep));
+	float c = g * g - cosine2 * dot(aStart, aStart);
+	float discriminant = b * b - 4.0 * a * c;
+	// With a >= 0 the cone runs along the row (wide lobes only): the whole face is kept.
+	float root = sqrt(max(discriminant, 0.0));
+	vec2 roots = a < 0.0 ? vec2(-b + root, -b - root) / (2.0 * a) : vec2(aLow, aHigh);
+	return a < 0.0 && discriminant < 0.0 ? vec2(1.0, -1.0) : vec2(max(roots.x, aLow), min(roots.y, aHigh));
 }
 
 // SourceTexture holds a cross (of any size); the output is a cross too, over the draw's viewport,
 // of which only the centre face is filtered (the rest is black). Each output texel is the average
 // of the source cross weighted by max(0, cos(angle to the texel's direction))^CubePower times the
-// source texel's solid angle. Source texels whose weight is below a hundredth of the lobe's peak
-// are left out.
+// source texel's solid angle. Source texels where the lobe is below a hundredth of its peak are
+// left out: each row visits only the texels inside that cone (LobeInterval).
 fragment PS_BlurCubemap
 {
 	in vec2 vTexCoord;
@@ -55,12 +54,15 @@ fragment PS_BlurCubemap
 		float power = max(CubePower, 1.0);
 		ivec2 size = textureSize(SourceTexture, 0);
 		float texelsPerUnit = float(size.x) / 6.0;
+		int face = size.x / 3;
 
 		// The lobe's reach as an angle, and as distances along the cross's axes: at face point
 		// (x, y) an angle covers up to (1 + x^2 + y^2) / sqrt(1 + y^2) of it along x (and the same
 		// with x and y swapped), 3 times at most; across an edge the neighbour's own coordinates
-		// count, which never exceed 1.
-		float reach = acos(pow(1e-2, 1.0 / power));
+		// count, which never exceed 1. The rows come from this window; each row's texels from
+		// the lobe's cone itself.
+		float reachCosine = pow(1e-2, 1.0 / power);
+		float reach = acos(reachCosine);
 		vec2 nearest = max(abs(centre) - 3.0 * reach, 0.0);
 		vec2 farthest = min(abs(centre) + 3.0 * reach, 1.0);
 		vec2 halfWidth = reach * (1.0 + dot(farthest, farthest)) / sqrt(1.0 + nearest.yx * nearest.yx) +
@@ -74,21 +76,40 @@ fragment PS_BlurCubemap
 		float total = 0.0;
 		for (int y = first.y; y <= last.y; ++y)
 		{
-			for (int x = first.x; x <= last.x; ++x)
+			float v = 3.0 - (float(y) + 0.5) / texelsPerUnit;
+			// The row's texels inside the lobe's cone: in the middle rows the left, centre and right
+			// faces (directions at cross u = 0 and their change per unit of u, as laid out at the
+			// top of this file), elsewhere the top or bottom face alone; the corners hold nothing.
+			bool middle = y >= face && y < 2 * face;
+			vec3 across = middle ? vec3(0.0, v, 1.0) : y < face ? vec3(0.0, 1.0, 2.0 - v) : vec3(0.0, -1.0, 2.0 + v);
+			vec2 span = LobeInterval(across, vec3(1.0, 0.0, 0.0), -1.0, 1.0, normal, reachCosine);
+			if (middle)
 			{
-				vec2 cross = vec2((float(x) + 0.5) / texelsPerUnit - 3.0, 3.0 - (float(y) + 0.5) / texelsPerUnit);
-				vec4 direction = CrossDirection(cross);
-				if (direction.w == 0.0)
+				vec2 left = LobeInterval(vec3(-1.0, v, 2.0), vec3(0.0, 0.0, 1.0), -3.0, -1.0, normal, reachCosine);
+				vec2 right = LobeInterval(vec3(1.0, v, 2.0), vec3(0.0, 0.0, -1.0), 1.0, 3.0, normal, reachCosine);
+				// The cone is continuous over the edges, so the faces' intervals join into one.
+				span = vec2(left.x <= left.y ? left.x : span.x, right.x <= right.y ? right.y : span.y);
+			}
+			// The texels whose centres lie in the interval (a hundredth of a texel more, against
+			// rounding), within the window.
+			int x0 = max(first.x, int(ceil((span.x + 3.0) * texelsPerUnit - 0.51)));
+			int x1 = min(last.x, int(floor((span.y + 3.0) * texelsPerUnit - 0.49)));
+			for (int x = x0; x <= x1; ++x)
+			{
+				float u = (float(x) + 0.5) / texelsPerUnit - 3.0;
+				vec3 direction = across + vec3(u, 0.0, 0.0);
+				if (middle && abs(u) > 1.0)
 				{
-					continue;
+					direction = u < 0.0 ? vec3(-1.0, v, 2.0 + u) : vec3(1.0, v, 2.0 - u);
 				}
-				float length2 = dot(direction.xyz, direction.xyz);
-				float cosine = dot(normal, direction.xyz) * inversesqrt(length2);
+				float inverseLength = inversesqrt(dot(direction, direction));
+				float cosine = dot(normal, direction) * inverseLength;
 				if (cosine <= 0.0)
 				{
 					continue;
 				}
-				float weight = pow(cosine, power) * inversesqrt(length2 * length2 * length2);
+				// pow() for a positive base, written out.
+				float weight = exp2(power * log2(cosine)) * inverseLength * inverseLength * inverseLength;
 				sum += texelFetch(SourceTexture, ivec2(x, y), 0) * weight;
 				total += weight;
 			}
