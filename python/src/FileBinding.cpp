@@ -179,7 +179,22 @@ PixelLayout GetPixelLayout(Dds::Format aFormat)
 	case Format::BC3_TYPELESS:
 	case Format::BC3_UNORM:
 	case Format::BC3_UNORM_SRGB:
+	case Format::BC7_TYPELESS:
+	case Format::BC7_UNORM:
+	case Format::BC7_UNORM_SRGB:
 		return {"uint8", static_cast<int>(Dds::BlockBytes(aFormat)), "RGBA", false};
+	case Format::BC4_TYPELESS:
+	case Format::BC4_UNORM:
+	case Format::BC4_SNORM:
+		return {"uint8", static_cast<int>(Dds::BlockBytes(aFormat)), "R", false};
+	case Format::BC5_TYPELESS:
+	case Format::BC5_UNORM:
+	case Format::BC5_SNORM:
+		return {"uint8", static_cast<int>(Dds::BlockBytes(aFormat)), "RG", false};
+	case Format::BC6H_TYPELESS:
+	case Format::BC6H_UF16:
+	case Format::BC6H_SF16:
+		return {"uint8", static_cast<int>(Dds::BlockBytes(aFormat)), "RGB", false};
 	case Format::B8G8R8A8_UNORM:
 	case Format::B8G8R8A8_TYPELESS:
 	case Format::B8G8R8A8_UNORM_SRGB:

@@ -197,6 +197,14 @@ def test_dds_dx10_float_volume_and_compressed(tmp_path):
     image = files.DdsImage.read(tmp_path / "bc1.dds")
     assert image.compressed and image.format == "BC1_UNORM" and image.block_bytes == 8
     assert image.mip(0).shape == (1, 2, 8) and image.mip(0).tobytes() == blocks
+    # Two-channel normal maps as other tools write them (ATI2, 16-byte blocks), and BC7 (DX10 header).
+    blocks = bytes(range(32))
+    (tmp_path / "bc5.dds").write_bytes(dds_header(8, 4, 1, (0x4, fourcc("ATI2"), 0, 0, 0, 0, 0)) + blocks)
+    (tmp_path / "bc7.dds").write_bytes(dx10_header(8, 4, 98) + blocks)
+    for name, format in [("bc5.dds", "BC5_UNORM"), ("bc7.dds", "BC7_UNORM")]:
+        image = files.DdsImage.read(tmp_path / name)
+        assert image.compressed and image.format == format and image.block_bytes == 16
+        assert image.mip(0).shape == (1, 2, 16) and image.mip(0).tobytes() == blocks
 
 
 def test_damaged_or_missing_dds(tmp_path):

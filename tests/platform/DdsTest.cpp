@@ -81,7 +81,7 @@ void ExpectRoundTrip(const ScratchDir& aScratch, const ImageInfo& anInfo, bool a
 } // namespace
 
 // Each format's typeless and sRGB forms and whether it is sRGB; what has no such forms (B8G8R8A8
-// included) maps to itself.
+// included, and BC4-BC6H for sRGB) maps to itself.
 TEST(DdsFormatTest, SRGBAndTypelessMaps)
 {
 	const std::tuple<Format, Format, Format, bool> cases[] = {
@@ -89,6 +89,11 @@ TEST(DdsFormatTest, SRGBAndTypelessMaps)
 	    {Format::R8G8B8A8_SINT, Format::R8G8B8A8_TYPELESS, Format::R8G8B8A8_UNORM_SRGB, false},
 	    {Format::R8G8B8A8_UNORM_SRGB, Format::R8G8B8A8_TYPELESS, Format::R8G8B8A8_UNORM_SRGB, true},
 	    {Format::BC3_UNORM, Format::BC3_TYPELESS, Format::BC3_UNORM_SRGB, false},
+	    {Format::BC4_SNORM, Format::BC4_TYPELESS, Format::BC4_SNORM, false},
+	    {Format::BC5_UNORM, Format::BC5_TYPELESS, Format::BC5_UNORM, false},
+	    {Format::BC6H_SF16, Format::BC6H_TYPELESS, Format::BC6H_SF16, false},
+	    {Format::BC7_UNORM, Format::BC7_TYPELESS, Format::BC7_UNORM_SRGB, false},
+	    {Format::BC7_UNORM_SRGB, Format::BC7_TYPELESS, Format::BC7_UNORM_SRGB, true},
 	    {Format::B8G8R8A8_UNORM, Format::B8G8R8A8_UNORM, Format::B8G8R8A8_UNORM, false},
 	    {Format::B8G8R8A8_UNORM_SRGB, Format::B8G8R8A8_UNORM_SRGB, Format::B8G8R8A8_UNORM_SRGB, true},
 	};
@@ -106,10 +111,12 @@ TEST(DdsFileTest, EveryFormatAndLayoutRoundTripsByteForByte)
 	const struct
 	{
 		Format format;
-		bool dx10Flag; // no legacy form: written with the DX10 header
+		bool dx10Flag; // no legacy form that is written: the DX10 header
 	} cases[] = {
 	    {Format::R8G8B8A8_UNORM_SRGB, true}, {Format::B8G8R8X8_UNORM, false}, {Format::BC2_UNORM, false},
 	    {Format::BC3_TYPELESS, true},        {Format::R32_FLOAT, false},      {Format::R11G11B10_FLOAT, true},
+	    {Format::BC4_SNORM, true},           {Format::BC5_UNORM, true},       {Format::BC6H_UF16, true},
+	    {Format::BC7_UNORM_SRGB, true},
 	};
 	for (const auto& test : cases)
 	{
@@ -134,6 +141,10 @@ TEST(DdsFileTest, EveryFormatAndLayoutRoundTripsByteForByte)
 	     false, 1176},
 	    {"volume-bc", ImageInfo{8, 8, 2, 1, 3, 0, Format::BC1_UNORM, ResourceDimension::Texture3D}, false,
 	     4 * 8 * 2 + 8 + 8},
+	    // 5x5, 2x2, 1x1: 2x2 blocks of 8 bytes, then one each.
+	    {"bc4", ImageInfo{5, 5, 1, 1, 3, 0, Format::BC4_UNORM}, true, 4 * 8 + 8 + 8},
+	    // 20x12 down to 1x1 is 5x3, 3x2, 2x1, 1, 1 blocks of 16 bytes per item.
+	    {"bc7-array", ImageInfo{20, 12, 1, 2, 5, 0, Format::BC7_UNORM}, true, 2 * 25 * 16},
 	    {"line", ImageInfo{16, 1, 1, 1, 5, 0, Format::R8G8B8A8_UNORM, ResourceDimension::Texture1D}, true,
 	     4 * 31},
 	};
@@ -159,7 +170,7 @@ TEST(DdsFileTest, EveryFormatAndLayoutRoundTripsByteForByte)
 	EXPECT_EQ(U32At(arrayFile, 140), 2u) << "DX10 array size counts cubes";
 }
 
-TEST(DdsFileTest, LegacyHeadersHaveTheirFieldsAtKnownOffsets)
+TEST(DdsFileTest, HeadersHaveTheirFieldsAtKnownOffsets)
 {
 	ScratchDir scratch;
 	const struct
@@ -178,6 +189,9 @@ TEST(DdsFileTest, LegacyHeadersHaveTheirFieldsAtKnownOffsets)
 	    {Format::R8G8B8A8_UNORM, 80, 0x41, "RGB and alpha flags"},
 	    {Format::R8G8B8A8_UNORM, 20, 32, "row pitch"},
 	    {Format::B8G8R8A8_UNORM, 92, 0xFF0000, "red mask"},
+	    {Format::BC4_UNORM, 20, 32, "linear size of 2x2 blocks of 8 bytes"},
+	    {Format::BC4_UNORM, 128, 80, "DXGI format"},
+	    {Format::BC7_UNORM_SRGB, 128, 99, "DXGI format"},
 	};
 	for (const auto& test : cases)
 	{
@@ -191,11 +205,39 @@ TEST(DdsFileTest, LegacyHeadersHaveTheirFieldsAtKnownOffsets)
 	}
 }
 
+// The FourCCs that other tools write for BC4 and BC5 read as those formats with the bytes unchanged
+// (written back, they get the DX10 header like any BC4 or BC5 image).
+TEST(DdsFileTest, OtherToolsFourCCsReadAsBc4AndBc5)
+{
+	const struct
+	{
+		const char* fourCC;
+		Format sameBlockBytes;
+		Format format;
+	} cases[] = {
+	    {"ATI1", Format::BC1_UNORM, Format::BC4_UNORM}, {"BC4U", Format::BC1_UNORM, Format::BC4_UNORM},
+	    {"BC4S", Format::BC1_UNORM, Format::BC4_SNORM}, {"ATI2", Format::BC3_UNORM, Format::BC5_UNORM},
+	    {"BC5U", Format::BC3_UNORM, Format::BC5_UNORM}, {"BC5S", Format::BC3_UNORM, Format::BC5_SNORM},
+	};
+	for (const auto& test : cases)
+	{
+		SCOPED_TRACE(test.fourCC);
+		std::vector<uint8_t> bytes = SaveBytes(ImageInfo{12, 8, 1, 1, 3, 0, test.sameBlockBytes});
+		std::memcpy(bytes.data() + 84, test.fourCC, 4);
+		Dds::Image image;
+		std::string error;
+		ASSERT_TRUE(Dds::LoadFromMemory(bytes.data(), bytes.size(), image, error)) << error;
+		EXPECT_EQ(image.Info(), (ImageInfo{12, 8, 1, 1, 3, 0, test.format}));
+		EXPECT_TRUE(std::equal(image.Bytes().begin(), image.Bytes().end(), bytes.begin() + 128, bytes.end()));
+	}
+}
+
 TEST(DdsFileTest, MalformedInputFailsWithAMessage)
 {
 	const std::vector<uint8_t> legacy = SaveBytes(ImageInfo{8, 8, 1, 1, 4, 0, Format::BC1_UNORM});
 	const std::vector<uint8_t> dx10 =
 	    SaveBytes(ImageInfo{4, 4, 1, 6, 3, Dds::MiscTextureCube, Format::R8G8B8A8_UNORM_SRGB});
+	const std::vector<uint8_t> bc7 = SaveBytes(ImageInfo{8, 8, 1, 1, 1, 0, Format::BC7_UNORM});
 	const struct
 	{
 		const char* label;
@@ -220,9 +262,12 @@ TEST(DdsFileTest, MalformedInputFailsWithAMessage)
 	    {"cube faces", legacy,
 	     [](auto& b) { SetU32(b, 112, 0x200 | 0x400 | 0x800 | 0x1000 | 0x2000 | 0x4000); },
 	     "cube map is missing faces"},
-	    {"unknown DXGI format", dx10, [](auto& b) { SetU32(b, 128, 98); }, "unsupported DXGI format 98"},
-	    {"unknown FourCC", legacy, [](auto& b) { std::memcpy(b.data() + 84, "ATI2", 4); },
-	     "unsupported FourCC 'ATI2'"},
+	    {"unknown DXGI format", dx10, [](auto& b) { SetU32(b, 128, 85); }, "unsupported DXGI format 85"},
+	    {"unknown FourCC", legacy, [](auto& b) { std::memcpy(b.data() + 84, "YUY2", 4); },
+	     "unsupported FourCC 'YUY2'"},
+	    // BC5 takes twice the bytes of the BC1 data there: 64 + 16 + 16 + 16 after the header.
+	    {"short ATI2 data", legacy, [](auto& b) { std::memcpy(b.data() + 84, "ATI2", 4); },
+	     "the BC5_UNORM 8x8x1 image with 4 mips and 1 slices needs 240"},
 	    {"unknown masks", legacy,
 	     [](auto& b) {
 		     SetU32(b, 80, 0x40);
@@ -232,6 +277,8 @@ TEST(DdsFileTest, MalformedInputFailsWithAMessage)
 	    {"dimension", dx10, [](auto& b) { SetU32(b, 132, 7); },
 	     "cube flag is set on a texture that is not 2D"},
 	    {"dimension", dx10, [](auto& b) { SetU32(b, 132, 7), SetU32(b, 136, 0); }, "resource dimension 7"},
+	    {"short BC7 data", bc7, [](auto& b) { b.pop_back(); },
+	     "truncated: 211 bytes, the BC7_UNORM 8x8x1 image with 1 mips and 1 slices needs 212"},
 	    // Cut inside the legacy header.
 	    {"cut header", legacy, [](auto& b) { b.resize(100); }, "truncated: 100 bytes"},
 	};

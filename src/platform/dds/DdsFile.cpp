@@ -68,8 +68,8 @@ constexpr uint32_t MakeFourCC(const char (&aText)[5])
 constexpr uint32_t Magic = MakeFourCC("DDS ");
 constexpr uint32_t FourCCDx10 = MakeFourCC("DX10");
 
-// The legacy pixel formats: a FourCC (a DDS code or one of D3DFORMAT's numbers
-// for float formats), or 32-bit RGB masks.
+// The legacy pixel formats that are read and written: a FourCC (a DDS code or one
+// of D3DFORMAT's numbers for float formats), or 32-bit RGB masks.
 struct LegacyForm
 {
 	Format myFormat;
@@ -90,6 +90,22 @@ constexpr LegacyForm LegacyForms[] = {
     {Format::R8G8B8A8_UNORM, 0, {0x000000FF, 0x0000FF00, 0x00FF0000, 0xFF000000}},
     {Format::B8G8R8A8_UNORM, 0, {0x00FF0000, 0x0000FF00, 0x000000FF, 0xFF000000}},
     {Format::B8G8R8X8_UNORM, 0, {0x00FF0000, 0x0000FF00, 0x000000FF, 0x00000000}},
+};
+
+// FourCCs that other tools write and that are only read. DXT2 and DXT4 mark
+// premultiplied alpha, which changes nothing about the bytes. BC4 and BC5 files get the
+// DX10 header when written, as BC6H and BC7 (which have no FourCC) always do: not every
+// reader knows these codes, while any reader of BC4/BC5 knows the DX10 header.
+struct ReadOnlyFourCC
+{
+	uint32_t myFourCC;
+	Format myFormat;
+};
+constexpr ReadOnlyFourCC ReadOnlyFourCCs[] = {
+    {MakeFourCC("DXT2"), Format::BC2_UNORM}, {MakeFourCC("DXT4"), Format::BC3_UNORM},
+    {MakeFourCC("ATI1"), Format::BC4_UNORM}, {MakeFourCC("BC4U"), Format::BC4_UNORM},
+    {MakeFourCC("BC4S"), Format::BC4_SNORM}, {MakeFourCC("ATI2"), Format::BC5_UNORM},
+    {MakeFourCC("BC5U"), Format::BC5_UNORM}, {MakeFourCC("BC5S"), Format::BC5_SNORM},
 };
 
 const LegacyForm* FindLegacyForm(Format aFormat)
@@ -146,11 +162,13 @@ bool FormatFromDdsPixelFormat(const uint8_t* someBytes, Format& aFormatOut, std:
 	if (flags & PfFourCC)
 	{
 		const uint32_t fourCC = ReadU32(someBytes, OffsetFourCC);
-		// Premultiplied alpha changes nothing about the bytes.
-		if (fourCC == MakeFourCC("DXT2") || fourCC == MakeFourCC("DXT4"))
+		for (const ReadOnlyFourCC& form : ReadOnlyFourCCs)
 		{
-			aFormatOut = fourCC == MakeFourCC("DXT2") ? Format::BC2_UNORM : Format::BC3_UNORM;
-			return true;
+			if (form.myFourCC == fourCC)
+			{
+				aFormatOut = form.myFormat;
+				return true;
+			}
 		}
 		for (const LegacyForm& form : LegacyForms)
 		{

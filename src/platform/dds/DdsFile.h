@@ -7,11 +7,13 @@
 //   ... image.Info(), image.Data(mip, face) ...
 //   if (!Dds::SaveToFile("data/Cubemaps/level/1.dds", image, error)) { log(error); }
 //
-// Reading accepts the legacy header (FourCC DXT1-DXT5 and the float FourCCs, or
-// 32-bit RGBA/BGRA/BGRX bit masks) and the "DX10" extension header (any format
-// of Format.h, 1D/2D arrays, cube arrays, volumes). Writing uses the legacy
-// header wherever the format has a legacy form and the texture is not an array,
-// so older viewers open the files; everything else gets the DX10 header.
+// Reading accepts the legacy header (FourCC DXT1-DXT5, ATI1/BC4U/BC4S for BC4,
+// ATI2/BC5U/BC5S for BC5 and the float FourCCs, or 32-bit RGBA/BGRA/BGRX bit
+// masks) and the "DX10" extension header (any format of Format.h, 1D/2D arrays,
+// cube arrays, volumes). Writing uses the legacy header wherever the format has
+// a legacy form that older viewers open (BC1-BC3, the float and 8-bit RGBA
+// formats) and the texture is not an array; everything else, BC4-BC7 included,
+// gets the DX10 header.
 //
 // Every function returns false with a message naming the file and the fault;
 // a failed load leaves anImageOut empty, a failed save leaves the old file as

@@ -81,6 +81,18 @@ constexpr Facts GetFacts(Format aFormat)
 		return {"BC3_UNORM", 16, true, false};
 	case Format::BC3_UNORM_SRGB:
 		return {"BC3_UNORM_SRGB", 16, true, true};
+	case Format::BC4_TYPELESS:
+		return {"BC4_TYPELESS", 8, true, false};
+	case Format::BC4_UNORM:
+		return {"BC4_UNORM", 8, true, false};
+	case Format::BC4_SNORM:
+		return {"BC4_SNORM", 8, true, false};
+	case Format::BC5_TYPELESS:
+		return {"BC5_TYPELESS", 16, true, false};
+	case Format::BC5_UNORM:
+		return {"BC5_UNORM", 16, true, false};
+	case Format::BC5_SNORM:
+		return {"BC5_SNORM", 16, true, false};
 	case Format::B8G8R8A8_UNORM:
 		return {"B8G8R8A8_UNORM", 4, false, false};
 	case Format::B8G8R8X8_UNORM:
@@ -89,6 +101,18 @@ constexpr Facts GetFacts(Format aFormat)
 		return {"B8G8R8A8_TYPELESS", 4, false, false};
 	case Format::B8G8R8A8_UNORM_SRGB:
 		return {"B8G8R8A8_UNORM_SRGB", 4, false, true};
+	case Format::BC6H_TYPELESS:
+		return {"BC6H_TYPELESS", 16, true, false};
+	case Format::BC6H_UF16:
+		return {"BC6H_UF16", 16, true, false};
+	case Format::BC6H_SF16:
+		return {"BC6H_SF16", 16, true, false};
+	case Format::BC7_TYPELESS:
+		return {"BC7_TYPELESS", 16, true, false};
+	case Format::BC7_UNORM:
+		return {"BC7_UNORM", 16, true, false};
+	case Format::BC7_UNORM_SRGB:
+		return {"BC7_UNORM_SRGB", 16, true, true};
 	}
 	// A number read from a file that names none of the members.
 	return {"UNKNOWN", 0, false, false};
@@ -145,6 +169,9 @@ Format ToSRGB(Format aFormat)
 	case Format::BC3_TYPELESS:
 	case Format::BC3_UNORM:
 		return Format::BC3_UNORM_SRGB;
+	case Format::BC7_TYPELESS:
+	case Format::BC7_UNORM:
+		return Format::BC7_UNORM_SRGB;
 	default:
 		return aFormat;
 	}
@@ -169,6 +196,18 @@ Format ToTypeless(Format aFormat)
 	case Format::BC3_UNORM:
 	case Format::BC3_UNORM_SRGB:
 		return Format::BC3_TYPELESS;
+	case Format::BC4_UNORM:
+	case Format::BC4_SNORM:
+		return Format::BC4_TYPELESS;
+	case Format::BC5_UNORM:
+	case Format::BC5_SNORM:
+		return Format::BC5_TYPELESS;
+	case Format::BC6H_UF16:
+	case Format::BC6H_SF16:
+		return Format::BC6H_TYPELESS;
+	case Format::BC7_UNORM:
+	case Format::BC7_UNORM_SRGB:
+		return Format::BC7_TYPELESS;
 	default:
 		return aFormat;
 	}

@@ -50,10 +50,22 @@ enum class Format : uint32_t
 	BC3_TYPELESS = 76,
 	BC3_UNORM = 77,
 	BC3_UNORM_SRGB = 78,
+	BC4_TYPELESS = 79, // one channel
+	BC4_UNORM = 80,
+	BC4_SNORM = 81,
+	BC5_TYPELESS = 82, // two channels, mostly normal maps
+	BC5_UNORM = 83,
+	BC5_SNORM = 84,
 	B8G8R8A8_UNORM = 87,
 	B8G8R8X8_UNORM = 88,
 	B8G8R8A8_TYPELESS = 90,
 	B8G8R8A8_UNORM_SRGB = 91,
+	BC6H_TYPELESS = 94, // RGB half floats
+	BC6H_UF16 = 95,
+	BC6H_SF16 = 96,
+	BC7_TYPELESS = 97,
+	BC7_UNORM = 98,
+	BC7_UNORM_SRGB = 99,
 };
 
 // False for UNKNOWN and for numbers that are not members of the enum.
@@ -62,14 +74,15 @@ bool IsKnown(Format aFormat);
 const char* FormatName(Format aFormat);
 bool IsBlockCompressed(Format aFormat);
 bool IsSRGB(Format aFormat);
-// Bits one pixel takes on average: 4 for BC1, 8 for BC2 and BC3.
+// Bits one pixel takes on average: 4 for BC1 and BC4, 8 for the other BC formats.
 uint32_t BitsPerPixel(Format aFormat);
 // Bytes of one pixel, or of one 4x4 block for block-compressed formats.
 uint32_t BlockBytes(Format aFormat);
 
-// The sRGB form of an 8-bit RGBA or BC1-BC3 format; any other format unchanged.
+// The sRGB form of an 8-bit RGBA, BC1-BC3 or BC7 format; any other format unchanged
+// (BC4, BC5 and BC6H have none).
 Format ToSRGB(Format aFormat);
-// The typeless form of an 8-bit RGBA or BC1-BC3 format; any other format unchanged.
+// The typeless form of an 8-bit RGBA or BC1-BC7 format; any other format unchanged.
 Format ToTypeless(Format aFormat);
 
 // Sizes of tightly packed data, in bytes. Block-compressed formats count whole

@@ -12,12 +12,15 @@ namespace Gpu
 {
 namespace
 {
+// Block-compressed data copies only within its typeless family (BC7 into BC7_UNORM_SRGB, not into
+// BC3): GL refuses the rest, and Direct3D does too.
 bool CopyCompatible(const Texture& aDestination, const Texture& aSource)
 {
 	const FormatInfo destination = GetFormatInfo(aDestination.GetDesc().myFormat);
 	const FormatInfo source = GetFormatInfo(aSource.GetDesc().myFormat);
 	return destination.myBlockBytes == source.myBlockBytes && destination.myBlockSize == source.myBlockSize &&
-	       destination.myDepthFlag == source.myDepthFlag;
+	       destination.myDepthFlag == source.myDepthFlag &&
+	       (!destination.myCompressedFlag || aDestination.CanViewAs(aSource.GetDesc().myFormat));
 }
 
 constexpr GLenum ToGlTopology(PrimitiveTopology aTopology)

@@ -131,6 +131,26 @@ constexpr FormatInfo GetFormatInfo(Dds::Format aFormat)
 		return Block(GL_COMPRESSED_RGBA_S3TC_DXT5_EXT, 16, false);
 	case Dds::Format::BC3_UNORM_SRGB:
 		return Block(GL_COMPRESSED_SRGB_ALPHA_S3TC_DXT5_EXT, 16, true);
+	case Dds::Format::BC4_TYPELESS: // storage that UNORM and SNORM views share
+	case Dds::Format::BC4_UNORM:
+		return Block(GL_COMPRESSED_RED_RGTC1, 8, false);
+	case Dds::Format::BC4_SNORM:
+		return Block(GL_COMPRESSED_SIGNED_RED_RGTC1, 8, false);
+	case Dds::Format::BC5_TYPELESS: // storage that UNORM and SNORM views share
+	case Dds::Format::BC5_UNORM:
+		return Block(GL_COMPRESSED_RG_RGTC2, 16, false);
+	case Dds::Format::BC5_SNORM:
+		return Block(GL_COMPRESSED_SIGNED_RG_RGTC2, 16, false);
+	case Dds::Format::BC6H_TYPELESS: // storage that UF16 and SF16 views share
+	case Dds::Format::BC6H_UF16:
+		return Block(GL_COMPRESSED_RGB_BPTC_UNSIGNED_FLOAT, 16, false);
+	case Dds::Format::BC6H_SF16:
+		return Block(GL_COMPRESSED_RGB_BPTC_SIGNED_FLOAT, 16, false);
+	case Dds::Format::BC7_TYPELESS: // storage that UNORM and UNORM_SRGB views share
+	case Dds::Format::BC7_UNORM:
+		return Block(GL_COMPRESSED_RGBA_BPTC_UNORM, 16, false);
+	case Dds::Format::BC7_UNORM_SRGB:
+		return Block(GL_COMPRESSED_SRGB_ALPHA_BPTC_UNORM, 16, true);
 	case Dds::Format::B8G8R8A8_UNORM:
 		return Plain(GL_RGBA8, GL_BGRA, GL_UNSIGNED_BYTE, 4);
 	case Dds::Format::B8G8R8A8_UNORM_SRGB:

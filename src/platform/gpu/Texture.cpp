@@ -46,8 +46,10 @@ constexpr GLenum ToGlTarget(ViewDimension aDimension)
 }
 
 // Formats that glTextureView may reinterpret into each other share a class:
-// uncompressed colour formats by bits per texel, compressed ones only as their
-// sRGB/linear pair, depth formats only as themselves.
+// uncompressed colour formats by bits per texel, compressed ones only within the
+// family that one typeless DXGI format stands for (sRGB/linear for BC1-BC3 and BC7,
+// unsigned/signed for BC4-BC6H; GL's view classes pair them the same way), depth
+// formats only as themselves.
 constexpr uint32_t ViewClass(const FormatInfo& anInfo)
 {
 	if (anInfo.myDepthFlag)
@@ -66,6 +68,14 @@ constexpr uint32_t ViewClass(const FormatInfo& anInfo)
 		return GL_COMPRESSED_RGBA_S3TC_DXT3_EXT;
 	case GL_COMPRESSED_SRGB_ALPHA_S3TC_DXT5_EXT:
 		return GL_COMPRESSED_RGBA_S3TC_DXT5_EXT;
+	case GL_COMPRESSED_SIGNED_RED_RGTC1:
+		return GL_COMPRESSED_RED_RGTC1;
+	case GL_COMPRESSED_SIGNED_RG_RGTC2:
+		return GL_COMPRESSED_RG_RGTC2;
+	case GL_COMPRESSED_RGB_BPTC_SIGNED_FLOAT:
+		return GL_COMPRESSED_RGB_BPTC_UNSIGNED_FLOAT;
+	case GL_COMPRESSED_SRGB_ALPHA_BPTC_UNORM:
+		return GL_COMPRESSED_RGBA_BPTC_UNORM;
 	default:
 		return anInfo.myInternalFormat;
 	}

@@ -87,13 +87,14 @@ public:
 	int GetMipHeight(int aMip) const;
 	int GetMipDepth(int aMip) const;
 	Context& GetContext() const { return *myContext; }
+	// Whether views (and copies) of aFormat may share this storage: glTextureView reinterprets
+	// only within a format's view class.
+	bool CanViewAs(Dds::Format aFormat) const;
 
 private:
 	template <typename ViewType>
 	ViewType* AddView(GLenum aTarget, Dds::Format aFormat, int aFirstMip, int aMipCount, int aFirstSlice,
 	                  int aSliceCount, const char* aKind);
-	// glTextureView reinterprets only within a format's view class.
-	bool CanViewAs(Dds::Format aFormat) const;
 
 	Context* myContext = nullptr;
 	TextureDesc myDesc;

@@ -4,6 +4,7 @@
 #include "platform/gpu/TextureLoader.h"
 
 #include <cstring>
+#include <tuple>
 
 #include "GpuTest.h"
 #include "platform/dds/DdsFile.h"
@@ -39,6 +40,90 @@ Bytes Bc1Block(uint16_t aColor0, uint16_t aColor1, uint8_t anIndex)
 	        uint8_t(aColor1), uint8_t(aColor1 >> 8),
 	        indices,          indices,
 	        indices,          indices};
+}
+
+// A BC4-BC7 block: (value, bits) fields packed from the lowest bit up, then one index of
+// anIndexBits per texel (texel 0 leaves out the top bit of a 4-bit index, which is 0).
+Bytes PackBlock(std::vector<std::pair<uint32_t, int>> someFields, int anIndexBits, uint32_t (*anIndex)(int))
+{
+	for (int texel = 0; texel < 16; ++texel)
+	{
+		someFields.push_back({anIndex(texel), texel == 0 && anIndexBits == 4 ? 3 : anIndexBits});
+	}
+	Bytes bytes;
+	int at = 0;
+	for (const auto& [value, count] : someFields)
+	{
+		for (int bit = 0; bit < count; ++bit, ++at)
+		{
+			bytes.resize(static_cast<size_t>(at / 8 + 1));
+			bytes.back() |= static_cast<uint8_t>((value >> bit & 1) << (at % 8));
+		}
+	}
+	return bytes;
+}
+
+// BC4 (and each channel of BC5) with texel t taking index t % 8.
+Bytes Bc4Block(uint8_t anEnd0, uint8_t anEnd1)
+{
+	return PackBlock({{anEnd0, 8}, {anEnd1, 8}}, 3, [](int aTexel) { return uint32_t(aTexel % 8); });
+}
+
+Bytes operator+(Bytes aFirst, const Bytes& aSecond)
+{
+	aFirst.insert(aFirst.end(), aSecond.begin(), aSecond.end());
+	return aFirst;
+}
+
+// Index t % 8 of a BC4 block with end0 > end1: 0 and 1 are the ends, k in 2..7 is
+// ((8 - k) end0 + (k - 1) end1) / 7.
+float Bc4Value(float anEnd0, float anEnd1, int aTexel)
+{
+	const int k = aTexel % 8;
+	return k < 2 ? (k == 0 ? anEnd0 : anEnd1) : ((8 - k) * anEnd0 + (k - 1) * anEnd1) / 7;
+}
+
+// BC6H mode 11 (code 00011): 10-bit RGB ends (495, 0, 495) and (0, 495, 1023), odd texels
+// taking end 1. As unsigned halves 495 is 1.0 and 1023 the largest half, 65504; as signed,
+// 495 is 32800 and 1023 (-1) is -93 * 2^-24.
+const Bytes ourBc6hBlock =
+    PackBlock({{0x03, 5}, {495, 10}, {0, 10}, {495, 10}, {0, 10}, {495, 10}, {1023, 10}}, 4,
+              [](int aTexel) { return aTexel % 2 == 0 ? 0u : 15u; });
+// BC7 mode 6 (bit 6): 7-bit RGBA ends and a p-bit each, (255, 1, 129, 255) and (0, 254, 64, 126),
+// odd texels taking end 1 but texel 5 index 8, weight 34: (30 end0 + 34 end1 + 32) / 64.
+const Bytes ourBc7Block = PackBlock(
+    {{1 << 6, 7}, {127, 7}, {0, 7}, {0, 7}, {127, 7}, {64, 7}, {32, 7}, {127, 7}, {63, 7}, {1, 1}, {0, 1}}, 4,
+    [](int aTexel) { return aTexel == 5       ? 8u
+	                        : aTexel % 2 == 0 ? 0u
+	                                          : 15u; });
+
+// What texel aTexel (0..15) of the blocks above decodes to in aFormat.
+Color Decoded(Format aFormat, int aTexel)
+{
+	const bool endOneFlag = aTexel % 2 == 1;
+	const Color bc7 = aTexel == 5  ? Color{120, 135, 94, 186}
+	                  : endOneFlag ? Color{0, 254, 64, 126}
+	                               : Color{255, 1, 129, 255};
+	switch (aFormat)
+	{
+	case Format::BC4_UNORM:
+		return {Bc4Value(1, 0, aTexel), 0, 0, 1};
+	case Format::BC4_SNORM:
+		return {Bc4Value(1, -1, aTexel), 0, 0, 1};
+	case Format::BC5_UNORM:
+		return {Bc4Value(1, 0, aTexel), Bc4Value(128 / 255.0f, 0, aTexel), 0, 1};
+	case Format::BC5_SNORM:
+		return {Bc4Value(1, -1, aTexel), Bc4Value(64 / 127.0f, -64 / 127.0f, aTexel), 0, 1};
+	case Format::BC6H_UF16:
+		return endOneFlag ? Color{0, 1, 65504, 1} : Color{1, 0, 1, 1};
+	case Format::BC6H_SF16:
+		return endOneFlag ? Color{0, 32800, std::ldexp(-93.0f, -24), 1} : Color{32800, 0, 32800, 1};
+	case Format::BC7_UNORM_SRGB:
+		return {SrgbToLinear(bc7[0] / 255), SrgbToLinear(bc7[1] / 255), SrgbToLinear(bc7[2] / 255),
+		        bc7[3] / 255};
+	default:
+		return {bc7[0] / 255, bc7[1] / 255, bc7[2] / 255, bc7[3] / 255};
+	}
 }
 
 template <typename Value, size_t Count> Bytes BytesOf(const std::array<Value, Count>& someValues)
@@ -83,6 +168,37 @@ protected:
 	Gpu::Texture* Load(const std::string& aPath, Dds::ImageInfo* anInfoOut)
 	{
 		return Keep(Gpu::CreateTextureFromFile(GetContext(), aPath, anInfoOut));
+	}
+
+	// What a shader reads from mip 0 of aView with texelFetch, as RGBA floats row by row.
+	std::vector<float> Fetch(const Gpu::ShaderResourceView& aView)
+	{
+		static const char* ourSource = R"(#version 450 core
+layout(local_size_x = 1) in;
+layout(binding = 0) uniform sampler2D uTexture;
+layout(binding = 0, rgba32f) writeonly uniform image2D uTexels;
+void main()
+{
+	const ivec2 at = ivec2(gl_GlobalInvocationID.xy);
+	imageStore(uTexels, at, texelFetch(uTexture, at, 0));
+})";
+		Gpu::Texture* texels = MakeTarget(Format::R32G32B32A32_FLOAT, aView.GetWidth(), aView.GetHeight());
+		const GLuint program = glCreateShaderProgramv(GL_COMPUTE_SHADER, 1, &ourSource);
+		GLint linkedFlag = GL_FALSE;
+		glGetProgramiv(program, GL_LINK_STATUS, &linkedFlag);
+		if (texels == nullptr || linkedFlag != GL_TRUE)
+		{
+			glDeleteProgram(program);
+			return {};
+		}
+		glUseProgram(program);
+		glBindTextureUnit(0, aView.GetName());
+		glBindImageTexture(0, texels->GetName(), 0, GL_FALSE, 0, GL_WRITE_ONLY, GL_RGBA32F);
+		glDispatchCompute(static_cast<GLuint>(aView.GetWidth()), static_cast<GLuint>(aView.GetHeight()), 1);
+		glMemoryBarrier(GL_TEXTURE_UPDATE_BARRIER_BIT);
+		glUseProgram(0);
+		glDeleteProgram(program);
+		return Texels(*texels, 0);
 	}
 
 	TestSupport::ScratchDir myScratch;
@@ -189,6 +305,54 @@ TEST_F(TextureLoaderTest, FormatsHoldTheirStoredValues)
 			{
 				ASSERT_NEAR(values[at], test.myExpected[at % 4], test.myTolerance)
 				    << "mip " << mip << ", value " << at;
+			}
+		}
+	}
+}
+
+// One hand-made block per BC4-BC7 format, over an 8x8 texture, must reach shaders decoded texel by
+// texel as the format defines: a swapped signed/unsigned or sRGB/linear GL format, a wrong block
+// size or a texel out of place shows as a wrong value. The engine's sRGB textures (a copy in the
+// typeless format seen through the sRGB form, or the format itself where it has none) must read
+// the same.
+TEST_F(TextureLoaderTest, Bc4ToBc7BlocksReachShadersAsTheFormatsDefine)
+{
+	const std::tuple<Format, Bytes, float> cases[] = {
+	    {Format::BC4_UNORM, Bc4Block(255, 0), 5e-3f},
+	    {Format::BC4_SNORM, Bc4Block(127, 0x81), 9e-3f},
+	    {Format::BC5_UNORM, Bc4Block(255, 0) + Bc4Block(128, 0), 5e-3f},
+	    {Format::BC5_SNORM, Bc4Block(127, 0x81) + Bc4Block(64, 0xC0), 9e-3f},
+	    {Format::BC6H_UF16, ourBc6hBlock, 0.0f},
+	    {Format::BC6H_SF16, ourBc6hBlock, 0.0f},
+	    {Format::BC7_UNORM, ourBc7Block, 1e-3f}, // its sRGB view decodes
+	    {Format::BC7_UNORM_SRGB, ourBc7Block, 1e-3f},
+	};
+	for (const auto& [format, block, tolerance] : cases)
+	{
+		SCOPED_TRACE(Dds::FormatName(format));
+		Dds::Image image = MakeImage({8, 8, 1, 1, 1, 0, format});
+		Repeat(image.Bytes().data(), image.Bytes().size(), block);
+		const std::string path = myScratch.File(std::string(Dds::FormatName(format)) + ".dds");
+		Save(path, image);
+		Gpu::Texture* texture = Load(path, nullptr);
+		ASSERT_NE(texture, nullptr);
+		Gpu::TextureDesc desc = texture->GetDesc();
+		desc.myFormat = Dds::ToTypeless(format);
+		Gpu::Texture* copy = MakeTexture(desc);
+		ASSERT_TRUE(copy != nullptr && GetContext().CopyResource(*copy, *texture));
+		Gpu::ShaderResourceView* srgb = copy->CreateShaderResourceView({.myFormat = Dds::ToSRGB(format)});
+		ASSERT_NE(srgb, nullptr);
+		for (const Gpu::ShaderResourceView* view : {texture->GetDefaultShaderResourceView(), srgb})
+		{
+			const std::vector<float> values = Fetch(*view);
+			ASSERT_EQ(values.size(), 8u * 8 * 4);
+			for (size_t at = 0; at < values.size(); ++at)
+			{
+				const size_t x = at / 4 % 8;
+				const size_t y = at / 32;
+				ASSERT_NEAR(values[at], Decoded(view->GetFormat(), int(y % 4 * 4 + x % 4))[at % 4], tolerance)
+				    << Dds::FormatName(view->GetFormat()) << " texel " << x << "," << y << " channel "
+				    << at % 4;
 			}
 		}
 	}
