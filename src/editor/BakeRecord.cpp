@@ -444,8 +444,7 @@ bool WriteBakeRecord(const std::string& aLevel, const BakeRecord& aRecord, std::
 	written = file.Close() && written;
 	if (!written)
 	{
-		std::error_code ignored;
-		std::filesystem::remove(temporary, ignored);
+		Paths::Discard(temporary);
 		aProblemRef = path + ": the disk did not take its " + std::to_string(text.size()) +
 		              " bytes (full, or over a size limit); the old record is kept";
 		return false;

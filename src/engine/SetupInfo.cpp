@@ -1,8 +1,5 @@
 #include "engine/SetupInfo.h"
 
-#include <filesystem>
-#include <system_error>
-
 #include "engine/FI_File.h"
 #include "platform/paths/Paths.h"
 
@@ -41,15 +38,6 @@ int ShadowQualityFromName(const std::string& aName)
 	}
 	return SetupInfo::SHADOWS_DISABLED;
 }
-
-void RemoveTemporary(const std::string& aTemporary)
-{
-	if (!aTemporary.empty())
-	{
-		std::error_code ignored;
-		std::filesystem::remove(aTemporary, ignored);
-	}
-}
 } // namespace
 
 bool SetupInfo::HasSettingsFile() const
@@ -70,7 +58,7 @@ bool SetupInfo::SaveSettings() const
 	FI_File file;
 	if (temporary.empty() || !file.Open(temporary, FI_File::FileFlags::WRITE))
 	{
-		RemoveTemporary(temporary);
+		Paths::Discard(temporary);
 		return false;
 	}
 	// Each label is followed by a space: the reader takes labels as whitespace-separated
@@ -93,7 +81,7 @@ bool SetupInfo::SaveSettings() const
 	file.Write(ShadowQualityName(myShadowQuality));
 	if (!file.Close() || !Paths::ReplaceWith(temporary, target))
 	{
-		RemoveTemporary(temporary);
+		Paths::Discard(temporary);
 		return false;
 	}
 	return true;

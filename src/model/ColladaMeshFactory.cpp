@@ -1,7 +1,6 @@
 #include "model/ColladaMeshFactory.h"
 
 #include <cstdint>
-#include <filesystem>
 #include <memory>
 #include <vector>
 
@@ -204,11 +203,7 @@ bool ColladaMeshFactory::SaveModelNodeAL(const ModelNode& aNode, const std::stri
 	writtenFlag = file.Close() && writtenFlag;
 	if (!writtenFlag || !Paths::ReplaceWith(temporary, target))
 	{
-		if (!temporary.empty())
-		{
-			std::error_code ignored;
-			std::filesystem::remove(temporary, ignored);
-		}
+		Paths::Discard(temporary);
 		ReportCritical(__LINE__, ourWriteFunction, "Couldn't write model file %s", aFileName.c_str());
 		return false;
 	}

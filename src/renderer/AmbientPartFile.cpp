@@ -109,8 +109,7 @@ bool WriteAmbientPart(const std::string& aPath, const AmbientPart& aPart, std::s
 	written = file.Close() && written;
 	if (!written)
 	{
-		std::error_code ignored;
-		std::filesystem::remove(temporary, ignored);
+		Paths::Discard(temporary);
 		aProblemOut = aPath + ": the disk did not take the part (full, or over a size limit)";
 		return false;
 	}

@@ -115,8 +115,7 @@ bool WriteAmbientVolume(const std::string& aPath, const AmbientVolume& aVolume, 
 	written = file.Close() && written;
 	if (!written)
 	{
-		std::error_code ignored;
-		std::filesystem::remove(temporary, ignored);
+		Paths::Discard(temporary);
 		aProblemOut = aPath + ": the disk did not take its " + std::to_string(36 + 28 * cells) +
 		              " bytes (full, or over a size limit); the old file is kept";
 		return false;

@@ -3,7 +3,6 @@
 // surfaces, saved as "data/Cubemaps/" + level + "/" + room id + ".dds".
 #include <algorithm>
 #include <cmath>
-#include <filesystem>
 #include <memory>
 #include <numbers>
 
@@ -19,6 +18,7 @@
 #include "platform/gpu/Context.h"
 #include "platform/gpu/Texture.h"
 #include "platform/gpu/TextureSaver.h"
+#include "platform/paths/Paths.h"
 #include "renderer/BakeProgress.h"
 #include "renderer/CubemapContainer.h"
 #include "renderer/DynamicCubemap.h"
@@ -180,8 +180,7 @@ void Renderer::GenerateReflections(const GrowingArray<Room*>& someRooms, const s
 	{
 		if (cancelledFlag)
 		{
-			std::error_code ignored;
-			std::filesystem::remove(temporary, ignored);
+			Paths::Discard(temporary);
 		}
 		else
 		{

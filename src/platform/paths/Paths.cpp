@@ -294,4 +294,11 @@ bool ReplaceWith(const std::string& aTemporary, const std::string& aFinalPath)
 	}
 	return true;
 }
+void Discard(const std::string& aTemporary)
+{
+	if (!aTemporary.empty())
+	{
+		::unlink(aTemporary.c_str());
+	}
+}
 } // namespace Paths

@@ -37,4 +37,8 @@ std::string TemporaryFor(const std::string& aFinalPath);
 // Flushes aTemporary to disk and renames it over aFinalPath. On failure the
 // temporary is removed, aFinalPath is left as it was and false is returned.
 bool ReplaceWith(const std::string& aTemporary, const std::string& aFinalPath);
+
+// Removes a temporary that will not be renamed into place (a write that failed or was
+// cancelled); an empty name or a file already gone is no error.
+void Discard(const std::string& aTemporary);
 } // namespace Paths
