@@ -25,7 +25,10 @@ void PrintBuildAndGpu()
 		return;
 	}
 	std::printf("gpu:        %s, OpenGL %s, %s\n", device.GetRendererName().c_str(),
-	            device.GetVersionName().c_str(), device.IsSurfaceless() ? "EGL surfaceless" : "EGL pbuffer");
+	            device.GetVersionName().c_str(),
+	            device.IsHardwareDevice() ? "EGL device"
+	            : device.IsSurfaceless()  ? "EGL surfaceless"
+	                                      : "EGL pbuffer");
 	device.Destroy();
 }
 
@@ -125,8 +128,9 @@ int main(int argc, char** argv)
 	    "check", "Read a level's files and both catalogues; list every problem (exit 1 if any)");
 	checkCommand->add_option("LEVEL", checkLevel, "Level folder name under data/XML/levels/")->required();
 	bool checkJson = false;
-	checkCommand->add_flag("--json", checkJson,
-	                       "Print the problems as JSON records (message, file, element, baked) and the notes");
+	checkCommand->add_flag(
+	    "--json", checkJson,
+	    "Print the problems as JSON records (message, file, element, baked) and the notes");
 
 	std::string infoPath;
 	CLI::App* infoCommand = app.add_subcommand(

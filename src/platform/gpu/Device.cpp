@@ -1,6 +1,7 @@
 #include "platform/gpu/Device.h"
 
 #include <algorithm>
+#include <cstdlib>
 #include <cstring>
 #include <dlfcn.h>
 #include <link.h>
@@ -79,8 +80,8 @@ void KeepDriverLoaded()
 		dl_iterate_phdr(
 		    [](dl_phdr_info* anInfo, size_t, void*) -> int {
 			    const std::string name = anInfo->dlpi_name != nullptr ? anInfo->dlpi_name : "";
-			    for (const char* library :
-			         {"_dri.so", "libgallium", "libEGL_mesa", "libglapi", "libGLX_mesa"})
+			    for (const char* library : {"_dri.so", "libgallium", "libEGL_mesa", "libglapi", "libGLX_mesa",
+			                                "libEGL_nvidia", "libnvidia-"})
 			    {
 				    if (name.find(library) != std::string::npos)
 				    {
@@ -214,9 +215,63 @@ bool Device::Init(int aWidth, int aHeight, WindowHandle aWindow)
 	return false;
 }
 
+// A GPU's own EGL device, where the EGL vendor libraries list one. With the vendor-neutral
+// libEGL, Mesa's surfaceless platform belongs to Mesa alone: on a machine whose GPU Mesa has
+// no driver for (NVIDIA's), it answers with its software rasterizer. A device display reaches
+// the GPU's own driver, as a Direct3D device is made on the first hardware adapter. Mesa's
+// software device is left to the surfaceless path below, and LIBGL_ALWAYS_SOFTWARE (Mesa's
+// own switch) skips this path, for bakes that must match a software machine byte for byte.
+bool Device::InitHardwareDevice(const char* someClientExtensions)
+{
+	const char* software = std::getenv("LIBGL_ALWAYS_SOFTWARE");
+	if ((software != nullptr && *software != '\0' && std::strcmp(software, "0") != 0) ||
+	    !HasExtension(someClientExtensions, "EGL_EXT_platform_device") ||
+	    !HasExtension(someClientExtensions, "EGL_EXT_device_enumeration") ||
+	    !HasExtension(someClientExtensions, "EGL_EXT_device_query"))
+	{
+		return false;
+	}
+	EGLint count = 0;
+	if (!eglQueryDevicesEXT(0, nullptr, &count) || count < 1)
+	{
+		return false;
+	}
+	std::vector<EGLDeviceEXT> devices(static_cast<size_t>(count));
+	if (!eglQueryDevicesEXT(count, devices.data(), &count))
+	{
+		return false;
+	}
+	devices.resize(static_cast<size_t>(std::max(count, 0)));
+	for (EGLDeviceEXT device : devices)
+	{
+		if (HasExtension(eglQueryDeviceStringEXT(device, EGL_EXTENSIONS), "EGL_MESA_device_software"))
+		{
+			continue;
+		}
+		if (OpenDisplay(eglGetPlatformDisplayEXT(EGL_PLATFORM_DEVICE_EXT, device, nullptr)) &&
+		    HasExtension(eglQueryString(myDisplay, EGL_EXTENSIONS), "EGL_KHR_surfaceless_context") &&
+		    CreateContext(SurfaceKind::Surfaceless, ChooseConfig(myDisplay, 0)))
+		{
+			myHardwareDeviceFlag = true;
+			return true;
+		}
+		// A device without OpenGL 4.5 core is passed over for the next one, or for the
+		// software rasterizer, rather than failing the whole start.
+		ReleaseDisplay();
+		myFailure = DeviceFailure::NoDevice;
+		myRendererName.clear();
+		myVersionName.clear();
+	}
+	return false;
+}
+
 bool Device::InitHeadless()
 {
 	const char* clientExtensions = eglQueryString(EGL_NO_DISPLAY, EGL_EXTENSIONS);
+	if (InitHardwareDevice(clientExtensions))
+	{
+		return true;
+	}
 	if (HasExtension(clientExtensions, "EGL_MESA_platform_surfaceless") &&
 	    HasExtension(clientExtensions, "EGL_EXT_platform_base"))
 	{
@@ -418,6 +473,7 @@ void Device::ReleaseDisplay()
 	}
 	myDisplay = EGL_NO_DISPLAY;
 	mySurfacelessFlag = false;
+	myHardwareDeviceFlag = false;
 }
 
 void Device::Destroy()

@@ -16,8 +16,9 @@
 //   target.Destroy();
 //   device.Destroy();             // with the context current: GPU objects first
 //
-// Init(width, height) is the headless device: EGL surfaceless on Mesa, or a
-// pbuffer of that size where the surfaceless platform is missing. Init(width,
+// Init(width, height) is the headless device: a GPU's own EGL device where the driver lists
+// one (not Mesa's software device; LIBGL_ALWAYS_SOFTWARE set skips it), else EGL surfaceless
+// on Mesa, or a pbuffer of that size where the surfaceless platform is missing. Init(width,
 // height, window) opens the X display named by $DISPLAY, makes an EGL window
 // surface on that X11 window and maps the window; a Gpu::SwapChain then presents
 // into it. Either way the context is OpenGL 4.5 core (with the debug flag in
@@ -69,8 +70,11 @@ public:
 	// after a VersionTooLow failure, those of the best context the driver could make.
 	const std::string& GetRendererName() const { return myRendererName; }
 	const std::string& GetVersionName() const { return myVersionName; }
-	// True when the display is EGL's surfaceless platform rather than the pbuffer fallback.
+	// True when the context has no surface (a GPU's EGL device or Mesa's surfaceless
+	// platform) rather than the pbuffer fallback or a window.
 	bool IsSurfaceless() const { return mySurfacelessFlag; }
+	// True when the headless context is on a GPU's own EGL device.
+	bool IsHardwareDevice() const { return myHardwareDeviceFlag; }
 
 	bool HasWindow() const { return myWindow.IsInitialized(); }
 	WindowHandle GetWindow() const { return myWindow.GetHandle(); }
@@ -95,6 +99,7 @@ private:
 	};
 
 	bool InitHeadless();
+	bool InitHardwareDevice(const char* someClientExtensions);
 	bool InitWindow(WindowHandle aWindow);
 	bool OpenDisplay(EGLDisplay aDisplay);
 	bool CreateContext(SurfaceKind aKind, EGLConfig aConfig);
@@ -119,6 +124,7 @@ private:
 	int mySwapInterval = -1;         // not set yet
 	EGLint myEglError = EGL_SUCCESS; // of the last failed attempt, for the report
 	bool mySurfacelessFlag = false;
+	bool myHardwareDeviceFlag = false;
 	std::string myRendererName;
 	std::string myVersionName;
 };
