@@ -156,9 +156,12 @@ TEST_F(CommandLineTest, BadInputGetsAClearLineAndAFailingExitTheSmallLevelBakesA
 	EXPECT_TRUE(fs::exists(myScratch.Path() / "x.png"));
 
 	// The small level baked with one bounce, the written files described, a frame rendered.
+	// Each bar ends at 100 % (the bake's own percentage stops at 50 here: it counts the
+	// volume's top layer, which is never visited).
 	const ToolRun bake = Run("bake sample_small --bounces 1");
 	ExpectRun(bake, 0, bake.myOutput,
-	          {"ambient: data/XML/levels/sample_small/ambient.sh",
+	          {"ambient      100%\n", "reflections  100%\n",
+	           "ambient: data/XML/levels/sample_small/ambient.sh",
 	           "reflections: data/Cubemaps/sample_small/main.dds"});
 
 	// The volume: the room's -3..3 x 0..3 x -4..4 gives 3 x 2 x 4 cells; the top layer

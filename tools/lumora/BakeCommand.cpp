@@ -147,6 +147,7 @@ bool BakeAmbient(EditorSession& aSession, const BakeOptions& someOptions)
 			editor.BakeAmbientRooms(Lumora::ToWide(someOptions.myLevel), someOptions.myBounces,
 			                        someOptions.myRooms, refusal);
 		}
+		bar.Stop(Finished(aSession));
 	}
 	const double seconds = SecondsSince(start);
 	const Zeph::BakeStatus status = editor.GetBakeStatus();
@@ -211,6 +212,7 @@ bool BakeReflections(EditorSession& aSession, const BakeOptions& someOptions)
 		{
 			editor.BakeSpecularRooms(Lumora::ToWide(someOptions.myLevel), someOptions.myRooms, refusal);
 		}
+		bar.Stop(Finished(aSession));
 	}
 	if (!Finished(aSession))
 	{
@@ -260,6 +262,7 @@ bool BakePart(EditorSession& aSession, const BakeOptions& someOptions)
 		bakedFlag = editor.BakeAmbientPart(Lumora::ToWide(someOptions.myLevel), someOptions.myPartBounce,
 		                                   someOptions.myPrevious, someOptions.myFirst, someOptions.myCount,
 		                                   someOptions.myPartOutput, problem);
+		bar.Stop(bakedFlag);
 	}
 	if (editor.GetBakeStatus().myLastResult == Zeph::BakeResult::CANCELLED)
 	{

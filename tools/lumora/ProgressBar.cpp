@@ -38,7 +38,7 @@ ProgressBar::~ProgressBar()
 	Stop();
 }
 
-void ProgressBar::Stop()
+void ProgressBar::Stop(bool aCompleteFlag)
 {
 	if (!myThread.joinable())
 	{
@@ -46,7 +46,12 @@ void ProgressBar::Stop()
 	}
 	myStopFlag = true;
 	myThread.join();
-	Draw(myPoll());
+	Progress last = myPoll();
+	if (aCompleteFlag)
+	{
+		last.myPercent = 100;
+	}
+	Draw(last);
 	if (myTerminalFlag)
 	{
 		std::printf("\n");

@@ -6,8 +6,9 @@
 // has moved: it may be the last job's.
 //
 //   LumoraTool::ProgressBar bar("ambient", [&] { return ProgressBar::Progress{editor.GetBakeProgress(), ""};
-//   }); editor.BakeAmbient(level, 2, false);   // blocks; the bar moves meanwhile bar.Stop(); // last value
-//   drawn, line ended
+//   });
+//   editor.BakeAmbient(level, 2, false);   // blocks; the bar moves meanwhile
+//   bar.Stop(finishedFlag);                 // last value (100 % once finished) drawn, line ended
 #include <atomic>
 #include <functional>
 #include <string>
@@ -28,7 +29,9 @@ public:
 	ProgressBar(const ProgressBar&) = delete;
 	ProgressBar& operator=(const ProgressBar&) = delete;
 
-	void Stop();
+	// Ends the bar with its last value, or at 100 % when aCompleteFlag says the work finished:
+	// the bake's own percentage may stop short (it counts grid cells that are never visited).
+	void Stop(bool aCompleteFlag = false);
 
 private:
 	void Draw(const Progress& aProgress);
