@@ -69,6 +69,40 @@ def test_a_distributed_bake_gives_the_local_bake_byte_for_byte_and_a_current_rec
     assert outputs(again) == reference
 
 
+def test_a_bake_of_some_rooms_writes_their_cubemaps_as_a_local_room_bake_and_nothing_else(client, tmp_path):
+    def cubemaps(folder):
+        directory = os.path.join(folder, "data", "Cubemaps", "sample_large")
+        return sorted(os.listdir(directory)) if os.path.isdir(directory) else []
+
+    local = make_data_copy(str(tmp_path / "local"), levels=("sample_large",))
+    with lumora.Editor(local) as editor:
+        editor.open("sample_large")
+        ids = [room.id for room in editor.rooms]
+        assert len(ids) > 2
+        chosen = [ids[1], ids[-1]]
+        assert editor.bake(ambient=False, rooms=chosen).finished
+    expected = {name: read(os.path.join(local, "data", "Cubemaps", "sample_large", name)) for name in cubemaps(local)}
+    assert len(expected) == 2
+
+    folder = make_data_copy(str(tmp_path / "game"), levels=("sample_large",))
+    before = cubemaps(folder)
+    # A misspelt room, a room with the ambient volume, or no room at all: refused, nothing written.
+    with pytest.raises(lumora.LumoraError, match="no room with the ID 'nowhere'"):
+        lumora.distributed.bake("sample_large", client, data=folder, ambient=False, rooms=[chosen[0], "nowhere"])
+    for wrong in ([chosen[0]], []):
+        with pytest.raises(ValueError):
+            lumora.distributed.bake("sample_large", client, data=folder, ambient=bool(wrong), rooms=wrong)
+    assert cubemaps(folder) == before and not os.path.exists(level_file(folder, "bake.json", "sample_large"))
+
+    result = lumora.distributed.bake("sample_large", client, data=folder, ambient=False, rooms=chosen)
+    assert result.ambient is None and len(result.cubemaps) == 2
+    baked = {name: read(os.path.join(folder, "data", "Cubemaps", "sample_large", name))
+             for name in cubemaps(folder) if name not in before}
+    assert baked == expected
+    record = lumora.read_bake_record(level_file(folder, "bake.json", "sample_large"))
+    assert record.ambient is None and sorted(record.reflections.rooms) == sorted(chosen)
+
+
 def test_a_worker_killed_mid_bake_changes_nothing_in_the_result(reference, client, tmp_path):
     folder = make_data_copy(str(tmp_path / "game"))
     pids = client.run(lumora.distributed._worker.worker_pid)

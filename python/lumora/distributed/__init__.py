@@ -23,7 +23,7 @@ import tempfile
 import time
 import uuid
 from dataclasses import dataclass
-from typing import Callable, Dict, List, Optional, Tuple, Union
+from typing import Callable, Dict, Iterable, List, Optional, Tuple, Union
 
 from .._editor import Editor, LumoraError, check
 from . import _worker
@@ -101,13 +101,17 @@ def _gather(client, futures, phase: str, progress: Optional[Progress]) -> list:
 def bake(level: str, client, bounces: int = 2, parts: Optional[int] = None, *,
          data: Union[str, os.PathLike] = ".", ambient: bool = True, reflections: bool = True,
          shared_data: Optional[Union[str, os.PathLike]] = None, force: bool = False,
-         retries: int = 2, progress: Optional[Progress] = None) -> DistributedBakeResult:
+         rooms: Optional[Iterable[str]] = None, retries: int = 2,
+         progress: Optional[Progress] = None) -> DistributedBakeResult:
     """Bakes ``level`` of the data folder ``data`` on the Dask cluster of ``client``.
 
     ``bounces``: the ambient bake's bounces (0: no ambient bake). ``parts``: the probe ranges each
     bounce is split into (default: three per worker). ``shared_data``: the data folder as every
     worker sees it, when they share one; otherwise the level's inputs are shipped. ``force``: bake a
-    level in which check() finds problems. ``retries``: how often a task that raised is tried again
+    level in which check() finds problems. ``rooms``: re-bake only the reflection cubemaps of these
+    rooms (their IDs), every other cubemap left as it is; the ambient volume is then not baked
+    (``ambient=False`` is required: the volume is one whole here, and ``Editor.bake(rooms=...)``
+    re-bakes a room's probes on one machine). ``retries``: how often a task that raised is tried again
     (a task whose worker died is run again anyway). ``progress(phase, done, total)`` is called as
     tasks end, phase being "ambient bounce N" or "reflections".
 
@@ -121,6 +125,13 @@ def bake(level: str, client, bounces: int = 2, parts: Optional[int] = None, *,
         raise ValueError("bounces must not be negative")
     if not ambient and not reflections:
         raise ValueError("nothing to bake: ambient and reflections are both off")
+    selected = None if rooms is None else list(dict.fromkeys(str(room) for room in rooms))
+    if selected is not None:
+        if not selected:
+            raise ValueError("rooms is empty: name at least one room, or leave rooms out for all of them")
+        if ambient or not reflections:
+            raise ValueError("a distributed bake of some rooms re-bakes their reflections only: pass "
+                             "ambient=False (Editor.bake(rooms=...) re-bakes their ambient probes)")
     report = check(level, data)
     level_problems = [problem.message for problem in report.problems if not problem.baked]
     if level_problems and not force:
@@ -173,6 +184,18 @@ def bake(level: str, client, bounces: int = 2, parts: Optional[int] = None, *,
                     timings[f"ambient bounce {bounce}"] = time.monotonic() - bounce_start
             cubemaps: Dict[str, bytes] = {}
             rooms = [room for room in editor.rooms if room.cubemap] if reflections else []
+            if selected is not None:
+                # Every ID is checked before the first task: a misspelt room bakes nothing.
+                known = {room.id: room for room in editor.rooms}
+                unknown = [room for room in selected if room not in known]
+                if unknown:
+                    raise LumoraError(f"level '{level}' has no room with the ID " +
+                                      ", ".join(f"'{room}'" for room in unknown) + "; nothing baked")
+                unnamed = [room for room in selected if not known[room].cubemap]
+                if unnamed:
+                    raise LumoraError("room ID " + ", ".join(f"'{room}'" for room in unnamed) +
+                                      " cannot name a cubemap file; nothing baked")
+                rooms = [known[room] for room in selected]
             if rooms:
                 reflections_start = time.monotonic()
                 volume_future = client.scatter(volume, hash=False, broadcast=True) if volume is not None else None
@@ -197,7 +220,7 @@ def bake(level: str, client, bounces: int = 2, parts: Optional[int] = None, *,
                 editor.record_bake("ambient", [], bounces, sum(value for key, value in timings.items()
                                                                if key.startswith("ambient")))
             if cubemaps:
-                editor.record_bake("reflections", [], 0, timings.get("reflections", 0.0))
+                editor.record_bake("reflections", selected or [], 0, timings.get("reflections", 0.0))
         except BaseException:
             # Cancelled, or a task failed: the cluster stops working for this bake, and no output
             # is touched.

@@ -1,7 +1,7 @@
 # Type stubs of lumora.distributed.
 import os
 from dataclasses import dataclass
-from typing import Any, Callable, Dict, Optional, Tuple, Union
+from typing import Any, Callable, Dict, Iterable, Optional, Tuple, Union
 
 _PathLike = Union[str, os.PathLike[str]]
 
@@ -36,4 +36,5 @@ class DistributedBakeResult:
 
 def bake(level: str, client: Any, bounces: int = ..., parts: Optional[int] = ..., *, data: _PathLike = ...,
          ambient: bool = ..., reflections: bool = ..., shared_data: Optional[_PathLike] = ..., force: bool = ...,
-         retries: int = ..., progress: Optional[Callable[[str, int, int], None]] = ...) -> DistributedBakeResult: ...
+         rooms: Optional[Iterable[str]] = ..., retries: int = ...,
+         progress: Optional[Callable[[str, int, int], None]] = ...) -> DistributedBakeResult: ...

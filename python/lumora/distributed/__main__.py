@@ -1,4 +1,4 @@
-"""python3 -m lumora.distributed LEVEL (--scheduler tcp://HOST:PORT | --local N) [--bounces N]
+"""python3 -m lumora.distributed LEVEL (--scheduler tcp://HOST:PORT | --local N) [--bounces N] [--rooms ID,ID]
 
 Bakes a level over a Dask cluster: an existing one (--scheduler), or N local worker processes
 (--local). Exit status: 0 baked, 1 the bake failed or the level has problems, 2 bad arguments or no
@@ -30,6 +30,8 @@ def _arguments(argv):
                         help="the data folder as every worker sees it (a share); otherwise the inputs are shipped")
     parser.add_argument("--ambient-only", action="store_true", help="bake the ambient volume only")
     parser.add_argument("--reflections-only", action="store_true", help="bake the room reflections only")
+    parser.add_argument("--rooms", metavar="ID,ID", default=None,
+                        help="re-bake only these rooms' reflection cubemaps (comma-separated IDs; no ambient bake)")
     parser.add_argument("--force", action="store_true", help="bake a level in which check finds problems")
     parser.add_argument("--connect-timeout", type=float, default=10.0, metavar="SECONDS",
                         help="how long to try to reach the scheduler (default 10)")
@@ -38,6 +40,13 @@ def _arguments(argv):
         parser.error("--local needs at least 1 worker")
     if options.ambient_only and options.reflections_only:
         parser.error("--ambient-only and --reflections-only exclude each other")
+    if options.rooms is not None:
+        options.rooms = [room.strip() for room in options.rooms.split(",") if room.strip()]
+        if not options.rooms:
+            parser.error("--rooms needs at least one room ID")
+        if options.ambient_only:
+            parser.error("--rooms re-bakes reflections only; it excludes --ambient-only")
+        options.reflections_only = True
     return options
 
 
@@ -72,7 +81,7 @@ def main(argv=None) -> int:
         result = bake(options.level, client, bounces=0 if options.reflections_only else options.bounces,
                       parts=options.parts, data=options.data, ambient=not options.reflections_only,
                       reflections=not options.ambient_only, shared_data=options.shared_data, force=options.force,
-                      progress=_progress)
+                      rooms=options.rooms, progress=_progress)
     except KeyboardInterrupt:
         print("\nlumora.distributed: bake cancelled: every output is as it was", file=sys.stderr)
         return 130
