@@ -2,7 +2,10 @@
 
 from __future__ import annotations
 
+import json
 import os
+import subprocess
+import sys
 from typing import Callable, Iterable, List, Optional, Sequence, Tuple, Union
 
 from . import _lumora
@@ -226,11 +229,46 @@ class Editor:
             raise LumoraError(f"level '{self.level}' did not load cleanly; open a level without problems")
 
 
+# The check in a child process, for a process whose one engine an Editor holds: it prints the
+# report as JSON, or {"error": message} for what would have been a LumoraError.
+_CHILD_CHECK = """
+import json, sys
+from lumora import _lumora
+try:
+    report = _lumora.check(sys.argv[1], sys.argv[2])
+except _lumora.LumoraError as error:
+    report = {"error": str(error)}
+sys.stdout.write(json.dumps(report))
+"""
+
+
+def _check_in_child(data: str, level: str) -> dict:
+    package_parent = os.path.dirname(os.path.dirname(os.path.abspath(__file__)))
+    environment = dict(os.environ)
+    environment["PYTHONPATH"] = os.pathsep.join(
+        [package_parent] + ([environment["PYTHONPATH"]] if environment.get("PYTHONPATH") else []))
+    # A KeyboardInterrupt here kills the child (subprocess.run does) and goes on up.
+    done = subprocess.run([sys.executable, "-c", _CHILD_CHECK, data, level], env=environment,
+                          stdout=subprocess.PIPE, stderr=subprocess.PIPE, check=False)
+    try:
+        report = json.loads(done.stdout.decode("utf-8"))
+    except ValueError:
+        raise LumoraError(f"the check of '{level}' in a process of its own ended with status {done.returncode}: "
+                          + done.stderr.decode("utf-8", "replace").strip()[-2000:]) from None
+    if "error" in report:
+        raise LumoraError(report["error"])
+    return report
+
+
 def check(level: str, data: Union[str, os.PathLike] = ".") -> CheckReport:
     """Checks a level as `lumora check` does: it is loaded in an engine of its own with every report
     listed, and what loading passes over in silence (unknown entity types, rooms without extent,
-    stale or damaged bakes) is looked for. Not while an Editor is open in the process."""
-    report = _lumora.check(os.fspath(data), level)
+    stale or damaged bakes) is looked for. While an Editor holds this process's engine, the check
+    runs in a child process (a second or so longer): the Editor's level and edits are not touched."""
+    if _lumora.engine_running():
+        report = _check_in_child(os.path.abspath(os.fspath(data)), level)
+    else:
+        report = _lumora.check(os.fspath(data), level)
     return CheckReport(level=report["level"],
                        problems=tuple(Problem(**problem) for problem in report["problems"]),
                        notes=tuple(report["notes"]))

@@ -72,6 +72,10 @@ py::dict Check(const std::string& aDataFolder, const std::string& aLevel)
 void RegisterCheck(py::module_& aModule)
 {
 	aModule.def(
+	    "engine_running", [] { return Lumora::LumoraWrapper::GetInstance() != nullptr; },
+	    "Whether this process's engine is taken (an Editor is open): check() then runs in a process of "
+	    "its own.");
+	aModule.def(
 	    "check", &Check, py::arg("data"), py::arg("level"),
 	    "The level's problems (dicts: message, file, element, baked) and notes, as `lumora check --json` "
 	    "lists them.");

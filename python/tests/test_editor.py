@@ -110,6 +110,12 @@ def test_bad_values_are_refused_and_change_nothing(data_folder):
 def test_one_editor_per_process_and_clear_errors_around_it(data_folder, tmp_path):
     with pytest.raises(lumora.LumoraError, match="no data/ folder"):
         lumora.Editor(str(tmp_path / "nowhere"))
+    alone = lumora.check("sample_small", data_folder)
+    with pytest.raises(lumora.LumoraError, match="no level 'missing'"):
+        lumora.check("missing", data_folder)
+    with lumora.Editor(data_folder, 64, 64) as first:
+        first.open("sample_small")
+        lights = len(first.point_lights)
     editor = lumora.Editor(data_folder, 320, 180)
     try:
         with pytest.raises(RuntimeError, match="already open"):
@@ -118,8 +124,15 @@ def test_one_editor_per_process_and_clear_errors_around_it(data_folder, tmp_path
             editor.point_lights
         with pytest.raises(lumora.LumoraError, match="no level 'missing'"):
             editor.open("missing")
-        with pytest.raises(lumora.LumoraError, match="check.. starts an engine of its own"):
-            lumora.check("sample_small", data_folder)
+        # The engine is the Editor's: check runs in a child process, with the same answers, and
+        # leaves the Editor's level as it was.
+        editor.open("sample_small")
+        editor.add(lumora.PointLight(position=(1.0, 2.0, 3.0)))
+        report = lumora.check("sample_small", data_folder)
+        assert report == alone
+        with pytest.raises(lumora.LumoraError, match="no level 'missing'"):
+            lumora.check("missing", data_folder)
+        assert len(editor.point_lights) == lights + 1
     finally:
         editor.close()
     editor.close()
