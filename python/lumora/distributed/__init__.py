@@ -150,6 +150,17 @@ def bake(level: str, client, bounces: int = 2, parts: Optional[int] = None, *,
     staged: List[Tuple[str, str]] = []
     with Editor(data, 320, 180) as editor, tempfile.TemporaryDirectory(prefix="lumora-driver-") as scratch:
         editor.open(level)
+        if selected is not None:
+            # Every ID is checked before anything is sent: a misspelt room bakes nothing.
+            known = {room.id: room for room in editor.rooms}
+            unknown = [room for room in selected if room not in known]
+            if unknown:
+                raise LumoraError(f"level '{level}' has no room with the ID " +
+                                  ", ".join(f"'{room}'" for room in unknown) + "; nothing baked")
+            unnamed = [room for room in selected if not known[room].cubemap]
+            if unnamed:
+                raise LumoraError("room ID " + ", ".join(f"'{room}'" for room in unnamed) +
+                                  " cannot name a cubemap file; nothing baked")
         try:
             # The inputs every task reads are copied to every worker before the first task runs: a
             # worker that dies then takes no copy the others need with it. (With one copy, a worker
@@ -183,27 +194,18 @@ def bake(level: str, client, bounces: int = 2, parts: Optional[int] = None, *,
                     previous_future = client.scatter(volume, hash=False, broadcast=True)
                     timings[f"ambient bounce {bounce}"] = time.monotonic() - bounce_start
             cubemaps: Dict[str, bytes] = {}
-            rooms = [room for room in editor.rooms if room.cubemap] if reflections else []
             if selected is not None:
-                # Every ID is checked before the first task: a misspelt room bakes nothing.
-                known = {room.id: room for room in editor.rooms}
-                unknown = [room for room in selected if room not in known]
-                if unknown:
-                    raise LumoraError(f"level '{level}' has no room with the ID " +
-                                      ", ".join(f"'{room}'" for room in unknown) + "; nothing baked")
-                unnamed = [room for room in selected if not known[room].cubemap]
-                if unnamed:
-                    raise LumoraError("room ID " + ", ".join(f"'{room}'" for room in unnamed) +
-                                      " cannot name a cubemap file; nothing baked")
-                rooms = [known[room] for room in selected]
-            if rooms:
+                baked_rooms = [known[room] for room in selected]
+            else:
+                baked_rooms = [room for room in editor.rooms if room.cubemap] if reflections else []
+            if baked_rooms:
                 reflections_start = time.monotonic()
                 volume_future = client.scatter(volume, hash=False, broadcast=True) if volume is not None else None
                 futures = [client.submit(_worker.bake_reflection, package_future, level, room.id, volume_future,
                                          retries=retries, pure=False, key=f"lumora-reflection-{token}-{index}")
-                           for index, room in enumerate(rooms)]
+                           for index, room in enumerate(baked_rooms)]
                 results = _gather(client, futures, "reflections", progress)
-                cubemaps = {room.cubemap: content for room, content in zip(rooms, results)}
+                cubemaps = {room.cubemap: content for room, content in zip(baked_rooms, results)}
                 timings["reflections"] = time.monotonic() - reflections_start
             futures = []
             # Every output is staged whole before the first replaces its file.
