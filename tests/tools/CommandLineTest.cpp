@@ -366,3 +366,56 @@ TEST_F(CommandLineTest, ACancelledBakeKeepsItsFilesRoomsBakeAloneAndPartsMergeIn
 	ExpectOneErrorLine(Run("bake-merge sample_small b2-12.part b2-0:.part b2-11.part --out x.sh"), 1,
 	                   "lumora: not merged: b2-12.part was baked from other inputs");
 }
+
+// A bake shared by three processes (--jobs 3) writes what the bake in one process writes,
+// byte for byte, starting from the same files: the volume (each bounce split between them and
+// merged) and the cubemap (baked by a helper). Ctrl-C stops the helpers too and leaves every
+// file as it was, with no part or temporary left behind. --jobs does not go with a room
+// re-bake.
+TEST_F(CommandLineTest, ABakeSharedByProcessesIsTheOneProcessBakeByteForByteAndStopsCleanly)
+{
+	CopyData();
+	const ToolRun alone = Run("bake sample_small --bounces 2");
+	if (alone.myErrors.find("no OpenGL 4.5") != std::string::npos && !TestSupport::IsCi())
+	{
+		GTEST_SKIP() << alone.myErrors;
+	}
+	ASSERT_EQ(alone.myStatus, 0) << alone.myErrors;
+	const std::string ambient = "data/XML/levels/sample_small/ambient.sh";
+	const std::string cubemap = "data/Cubemaps/sample_small/main.dds";
+	const std::string bakedAmbient = Read(ambient);
+	const std::string bakedCubemap = Read(cubemap);
+	ASSERT_FALSE(bakedAmbient.empty());
+	ASSERT_FALSE(bakedCubemap.empty());
+	// The ambient pass reflects the rooms' cubemaps: the shared bake starts where this one did.
+	fs::remove_all(myScratch.File("data/Cubemaps/sample_small"));
+	fs::remove(myScratch.File(ambient));
+	fs::remove(myScratch.File("data/XML/levels/sample_small/bake.json"));
+
+	const ToolRun shared = Run("bake sample_small --bounces 2 --jobs 3");
+	ExpectRun(shared, 0, shared.myOutput,
+	          {"over 2 bounces in", "3 processes)", "reflections: 1 room in", "reflections: " + cubemap});
+	EXPECT_EQ(shared.myErrors, "");
+	EXPECT_TRUE(Read(ambient) == bakedAmbient) << "the shared bake's volume differs";
+	EXPECT_TRUE(Read(cubemap) == bakedCubemap) << "the shared bake's cubemap differs";
+	const ToolRun record = Run("info data/XML/levels/sample_small/bake.json");
+	ExpectRun(record, 0, record.myOutput, {"ambient: baked 20", "2 bounces", "reflections: baked 20"});
+
+	// Stopped in its first bounce; the parts went to a temporary folder of the test's own.
+	const int stopped =
+	    Shell("mkdir tmp && TMPDIR=$PWD/tmp $LUMORA bake sample_small --bounces 16 --jobs 2 >bake.out "
+	          "2>bake.err & pid=$!; until grep -q bounce bake.out || ! kill -0 $pid 2>/dev/null; do "
+	          "sleep 0.02; done; kill -INT $pid; wait $pid");
+	EXPECT_EQ(stopped, 130) << Read("bake.out");
+	EXPECT_EQ(Read("bake.err"), "lumora: bake cancelled (SIGINT): ambient.sh and every room cubemap are as "
+	                            "they were\n");
+	EXPECT_TRUE(Read(ambient) == bakedAmbient) << "the stopped bake changed ambient.sh";
+	EXPECT_TRUE(fs::is_empty(myScratch.File("tmp"))) << "the stopped bake left its parts";
+	EXPECT_EQ(std::distance(fs::directory_iterator(myScratch.File("data/XML/levels/sample_small")),
+	                        fs::directory_iterator()),
+	          7)
+	    << "five level files, ambient.sh and bake.json: no temporary";
+
+	ExpectOneErrorLine(Run("bake sample_small --jobs 2 --rooms main"), 2,
+	                   "lumora: --jobs shares a whole bake: it does not go with --bounce, --rooms");
+}

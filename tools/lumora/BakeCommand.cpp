@@ -4,10 +4,14 @@
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
+#include <thread>
 
+#include "BakeSupport.h"
+#include "BakeWorkers.h"
 #include "Commands.h"
 #include "EditorSession.h"
 #include "LevelCheck.h"
+#include "ParallelBake.h"
 #include "ProgressBar.h"
 #include "editor/StringConversion.h"
 #include "engine/Engine.h"
@@ -20,108 +24,6 @@ namespace LumoraTool
 {
 namespace
 {
-// The signal that asked the bake to stop (SIGINT, SIGTERM), or 0.
-volatile std::sig_atomic_t ourStopSignal = 0;
-
-void AskToStop(int aSignal)
-{
-	ourStopSignal = aSignal;
-	// Sets one atomic flag of the running bake; a second signal ends the process.
-	if (Lumora::LumoraWrapper* editor = Lumora::LumoraWrapper::GetInstance())
-	{
-		editor->CancelBake();
-	}
-}
-
-// Ctrl-C and SIGTERM cancel the bake for as long as it runs; the handlers reset
-// themselves, so a second one stops the process the usual way.
-class StopSignals
-{
-public:
-	StopSignals()
-	{
-		struct sigaction action = {};
-		action.sa_handler = &AskToStop;
-		action.sa_flags = SA_RESETHAND;
-		sigemptyset(&action.sa_mask);
-		sigaction(SIGINT, &action, &myPreviousInterrupt);
-		sigaction(SIGTERM, &action, &myPreviousTerminate);
-	}
-	~StopSignals()
-	{
-		sigaction(SIGINT, &myPreviousInterrupt, nullptr);
-		sigaction(SIGTERM, &myPreviousTerminate, nullptr);
-	}
-	StopSignals(const StopSignals&) = delete;
-	StopSignals& operator=(const StopSignals&) = delete;
-
-private:
-	struct sigaction myPreviousInterrupt = {};
-	struct sigaction myPreviousTerminate = {};
-};
-
-bool StopAsked()
-{
-	return ourStopSignal != 0;
-}
-
-double SecondsSince(std::chrono::steady_clock::time_point aStart)
-{
-	return std::chrono::duration<double>(std::chrono::steady_clock::now() - aStart).count();
-}
-
-std::string SizeOf(const std::string& aPath)
-{
-	std::error_code error;
-	const auto bytes = std::filesystem::file_size(aPath, error);
-	return error ? std::string("missing") : std::to_string(bytes) + " bytes";
-}
-
-std::string Duration(double aSeconds)
-{
-	const long long seconds = static_cast<long long>(aSeconds + 0.5);
-	char text[48];
-	if (seconds >= 3600)
-	{
-		std::snprintf(text, sizeof(text), "%lld h %02lld min", seconds / 3600, seconds / 60 % 60);
-	}
-	else if (seconds >= 60)
-	{
-		std::snprintf(text, sizeof(text), "%lld min %02lld s", seconds / 60, seconds % 60);
-	}
-	else
-	{
-		std::snprintf(text, sizeof(text), "%lld s", seconds);
-	}
-	return text;
-}
-
-// The bar's detail: the bounce and probes (ambient) or the room (reflections), and the
-// time left once the bake has measured some of its work.
-ProgressBar::Progress PollBake(const Lumora::LumoraWrapper& anEditor)
-{
-	const Zeph::BakeStatus status = anEditor.GetBakeStatus();
-	ProgressBar::Progress progress{anEditor.GetBakeProgress(), ""};
-	char text[160] = "";
-	if (status.myPhase == Zeph::BakePhase::AMBIENT)
-	{
-		std::snprintf(text, sizeof(text), "bounce %d/%d, %lld/%lld probes", status.myBounce,
-		              status.myBounceCount, status.myProbesDone, status.myProbesTotal);
-	}
-	else if (status.myPhase == Zeph::BakePhase::REFLECTIONS)
-	{
-		std::snprintf(text, sizeof(text), "%d/%d rooms", status.myRoomsDone, status.myRoomsTotal);
-	}
-	progress.myDetail = text;
-	if (status.myPhase != Zeph::BakePhase::IDLE)
-	{
-		progress.myDetail += status.mySecondsLeft >= 0.0
-		                         ? ", " + Duration(status.mySecondsLeft) + " left"
-		                         : ", " + Duration(status.myElapsedSeconds) + " so far";
-	}
-	return progress;
-}
-
 // What the last bake of the facade ended with, when it did not finish.
 bool Finished(EditorSession& aSession)
 {
@@ -285,7 +187,7 @@ bool BakePart(EditorSession& aSession, const BakeOptions& someOptions)
 // the rest is as it was.
 int ReportCancel(const BakeOptions& someOptions, bool anAmbientWrittenFlag)
 {
-	const char* signal = ourStopSignal == SIGTERM ? "SIGTERM" : "SIGINT";
+	const char* signal = GetStopSignal() == SIGTERM ? "SIGTERM" : "SIGINT";
 	std::string kept;
 	if (someOptions.myPartBounce > 0)
 	{
@@ -356,6 +258,17 @@ int RunBake(const BakeOptions& someOptions)
 	std::printf("level %s: %d rooms, %d point and %d spot lights\n", someOptions.myLevel.c_str(),
 	            editor.GetRooms().Count(), editor.GetPointLights().Count(), editor.GetSpotLights().Count());
 	const size_t before = session.GetProblemCount();
+	// Helpers start loading the level while this process begins its share.
+	BakeWorkers workers;
+	const int jobs = someOptions.myJobs > 0
+	                     ? someOptions.myJobs
+	                     : static_cast<int>(std::max(1u, std::thread::hardware_concurrency()));
+	if (const int helpers = someOptions.myPartBounce > 0 ? 0 : CountUsefulWorkers(session, someOptions, jobs);
+	    helpers > 0 && !workers.Init(someOptions.myLevel, helpers))
+	{
+		std::fprintf(stderr, "lumora: no helper process could be started; the bake runs in this one\n");
+	}
+	const bool sharedFlag = workers.GetCount() > 0;
 	bool done = true;
 	bool ambientWrittenFlag = false;
 	if (someOptions.myPartBounce > 0)
@@ -366,14 +279,26 @@ int RunBake(const BakeOptions& someOptions)
 	{
 		if (!someOptions.mySpecularOnlyFlag && !StopAsked())
 		{
-			done = BakeAmbient(session, someOptions);
+			done = sharedFlag && someOptions.myBounces > 0
+			           ? BakeAmbientInParallel(session, someOptions, workers)
+			           : BakeAmbient(session, someOptions);
 			ambientWrittenFlag = done && someOptions.myBounces > 0;
 		}
 		if (!someOptions.myAmbientOnlyFlag && !StopAsked())
 		{
-			done = BakeReflections(session, someOptions) && done;
+			const std::string ambient =
+			    ambientWrittenFlag ? "data/XML/levels/" + someOptions.myLevel + "/ambient.sh" : std::string();
+			done = (sharedFlag ? BakeReflectionsInParallel(session, someOptions, workers, ambient)
+			                   : BakeReflections(session, someOptions)) &&
+			       done;
 		}
 	}
+	if (StopAsked() || !done)
+	{
+		// Their running jobs are cancelled: nothing they bake would be used.
+		workers.Stop();
+	}
+	workers.Destroy();
 	if (StopAsked())
 	{
 		return ReportCancel(someOptions, ambientWrittenFlag);

@@ -20,6 +20,9 @@ struct BakeOptions
 	bool myForceFlag = false;
 	// Only these rooms: their cubemaps, and the ambient volume's probes inside them.
 	std::vector<std::string> myRooms;
+	// Processes to share the bake (this one and helpers, byte for byte the same result); 0:
+	// one per processor.
+	int myJobs = 1;
 	// A part of a bake spread over machines (myPartBounce > 0): cells myFirst .. myFirst +
 	// myCount - 1 of that bounce, lit by myPrevious (the merged volume of the bounce before),
 	// into myPartOutput.
@@ -34,6 +37,10 @@ struct BakeOptions
 // (other than in its baked files) is refused, unless forced.
 // Ctrl-C or SIGTERM cancels it: nothing more is written, exit 130.
 int RunBake(const BakeOptions& someOptions);
+
+// A helper process of a bake spread over this machine's processors: loads the level and
+// bakes the jobs read on standard input (BakeWorkers.h).
+int RunBakeWorker(const std::string& aLevel);
 
 struct MergeOptions
 {

@@ -91,10 +91,22 @@ int main(int argc, char** argv)
 	CLI::Option* probeRange = bakeCommand->add_option(
 	    "--probes", probes, "FIRST:COUNT: the cells of the part, in ambient.sh's order (x, then y, then z)");
 	CLI::Option* partOutput = bakeCommand->add_option("--out", bake.myPartOutput, "The part file to write");
+	bakeCommand
+	    ->add_option("--jobs,-j", bake.myJobs,
+	                 "Processes to share the bake, this one included (0: one per processor); the result "
+	                 "is the same, byte for byte")
+	    ->check(CLI::Range(0, 256))
+	    ->capture_default_str();
 	partBounce->needs(probeRange)->needs(partOutput)->excludes(rooms)->excludes(specularOnly);
 	previous->needs(partBounce);
 	probeRange->needs(partBounce);
 	partOutput->needs(partBounce);
+
+	// The helper processes of "bake --jobs" (not for people: it reads jobs on its input).
+	std::string workerLevel;
+	CLI::App* workerCommand = app.add_subcommand("bake-worker", "");
+	workerCommand->group("");
+	workerCommand->add_option("LEVEL", workerLevel)->required();
 
 	LumoraTool::MergeOptions merge;
 	CLI::App* mergeCommand = app.add_subcommand(
@@ -196,7 +208,17 @@ int main(int argc, char** argv)
 			}
 			bake.myAmbientOnlyFlag = true;
 		}
+		if (bake.myJobs != 1 && (*partBounce || *rooms || bake.myDebugCapturesFlag))
+		{
+			LumoraTool::PrintError("--jobs shares a whole bake: it does not go with --bounce, --rooms or "
+			                       "--debug-captures");
+			return 2;
+		}
 		return LumoraTool::RunBake(bake);
+	}
+	if (*workerCommand)
+	{
+		return LumoraTool::RunBakeWorker(LumoraTool::LevelSpelledOnDisk(workerLevel));
 	}
 	if (*mergeCommand)
 	{
