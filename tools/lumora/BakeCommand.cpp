@@ -221,6 +221,16 @@ int RunBake(const BakeOptions& someOptions)
 	{
 		return 1;
 	}
+	// Helpers start loading the level while this process checks it. (Their number is
+	// trimmed once the level's probes and rooms are known; a refused bake stops them.)
+	BakeWorkers workers;
+	const int jobs = someOptions.myJobs > 0
+	                     ? someOptions.myJobs
+	                     : static_cast<int>(std::max(1u, std::thread::hardware_concurrency()));
+	if (jobs > 1 && someOptions.myPartBounce == 0 && !workers.Init(someOptions.myLevel, jobs - 1))
+	{
+		std::fprintf(stderr, "lumora: no helper process could be started; the bake runs in this one\n");
+	}
 	// What check finds wrong would be baked in (a misspelt catalogue entry bakes an empty
 	// level over a good bake); damaged baked files are what the bake replaces.
 	const LevelReport report = CheckLevel(session, someOptions.myLevel);
@@ -258,16 +268,8 @@ int RunBake(const BakeOptions& someOptions)
 	std::printf("level %s: %d rooms, %d point and %d spot lights\n", someOptions.myLevel.c_str(),
 	            editor.GetRooms().Count(), editor.GetPointLights().Count(), editor.GetSpotLights().Count());
 	const size_t before = session.GetProblemCount();
-	// Helpers start loading the level while this process begins its share.
-	BakeWorkers workers;
-	const int jobs = someOptions.myJobs > 0
-	                     ? someOptions.myJobs
-	                     : static_cast<int>(std::max(1u, std::thread::hardware_concurrency()));
-	if (const int helpers = someOptions.myPartBounce > 0 ? 0 : CountUsefulWorkers(session, someOptions, jobs);
-	    helpers > 0 && !workers.Init(someOptions.myLevel, helpers))
-	{
-		std::fprintf(stderr, "lumora: no helper process could be started; the bake runs in this one\n");
-	}
+	// Fewer helpers than started when the level has fewer probes and rooms to share.
+	workers.Keep(CountUsefulWorkers(session, someOptions, workers.GetCount() + 1));
 	const bool sharedFlag = workers.GetCount() > 0;
 	bool done = true;
 	bool ambientWrittenFlag = false;

@@ -1,5 +1,6 @@
 #include "BakeWorkers.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <csignal>
 #include <cstring>
@@ -60,7 +61,7 @@ bool WriteAll(int aDescriptor, const std::string& aText)
 
 BakeWorkers::~BakeWorkers()
 {
-	Destroy();
+	Stop();
 }
 
 bool BakeWorkers::Init(const std::string& aLevel, int aCount)
@@ -121,31 +122,41 @@ bool BakeWorkers::Init(const std::string& aLevel, int aCount)
 
 void BakeWorkers::Destroy()
 {
-	for (Worker& worker : myWorkers)
-	{
-		CloseIfOpen(worker.myInput);
-		CloseIfOpen(worker.myOutput);
-		if (worker.myPid > 0)
-		{
-			int status = 0;
-			while (waitpid(worker.myPid, &status, 0) < 0 && errno == EINTR)
-			{
-			}
-		}
-	}
-	myWorkers.clear();
+	Reap(0);
 }
 
 void BakeWorkers::Stop()
 {
-	for (const Worker& worker : myWorkers)
+	Keep(0);
+}
+
+void BakeWorkers::Keep(int aCount)
+{
+	const size_t kept = static_cast<size_t>(std::max(aCount, 0));
+	for (size_t index = kept; index < myWorkers.size(); ++index)
 	{
-		if (worker.myPid > 0)
+		if (myWorkers[index].myPid > 0)
 		{
-			kill(worker.myPid, SIGTERM);
+			kill(myWorkers[index].myPid, SIGTERM);
 		}
 	}
-	Destroy();
+	Reap(kept);
+}
+
+void BakeWorkers::Reap(size_t aFirst)
+{
+	for (size_t index = aFirst; index < myWorkers.size(); ++index)
+	{
+		Worker& worker = myWorkers[index];
+		// The end of its input ends a worker once its current job is done.
+		CloseIfOpen(worker.myInput);
+		CloseIfOpen(worker.myOutput);
+		int status = 0;
+		while (worker.myPid > 0 && waitpid(worker.myPid, &status, 0) < 0 && errno == EINTR)
+		{
+		}
+	}
+	myWorkers.resize(std::min(aFirst, myWorkers.size()));
 }
 
 bool BakeWorkers::Send(int anIndex, const std::vector<std::string>& someFields, std::string& aLossOut)

@@ -18,6 +18,7 @@
 //
 // A worker that cannot start or dies is a worker whose Send and Receive fail from then
 // on, never the end of the bake: the caller does that job itself.
+#include <cstddef>
 #include <string>
 #include <sys/types.h>
 #include <vector>
@@ -36,6 +37,7 @@ class BakeWorkers
 {
 public:
 	BakeWorkers() = default;
+	// Stops them.
 	~BakeWorkers();
 	BakeWorkers(const BakeWorkers&) = delete;
 	BakeWorkers& operator=(const BakeWorkers&) = delete;
@@ -46,6 +48,9 @@ public:
 	void Destroy();
 	// Asks every worker to stop (SIGTERM cancels its running job) and waits for them.
 	void Stop();
+
+	// Stops the workers after the first aCount (their jobs are cancelled) and waits for them.
+	void Keep(int aCount);
 
 	int GetCount() const { return static_cast<int>(myWorkers.size()); }
 	// Sends one job; false when the worker is gone or a field holds a tab or a line break.
@@ -64,6 +69,8 @@ private:
 		int myOutput = -1;
 		std::string myReceived;
 	};
+	// Closes the input of the workers from aFirst on, waits for them and forgets them.
+	void Reap(size_t aFirst);
 	// The worker is gone: its pipes are closed and its exit is collected and described.
 	std::string Lose(Worker& aWorker);
 
