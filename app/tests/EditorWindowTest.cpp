@@ -170,6 +170,9 @@ private slots:
 		}
 		QVERIFY(myData.isValid());
 		QVERIFY(CopyTree(QDir::current().absoluteFilePath("data"), myData.path() + "/data"));
+		// The small level's rooms start without cubemaps of their own, as in a fresh checkout,
+		// whatever a bake in the working tree left there.
+		QVERIFY(QDir(myData.path() + "/data/Cubemaps/sample_small").removeRecursively());
 		myStartFolder = QDir::currentPath();
 		QVERIFY(QDir::setCurrent(myData.path()));
 		myWindow = std::make_unique<MainWindow>();
