@@ -416,6 +416,19 @@ TEST_F(CommandLineTest, ABakeSharedByProcessesIsTheOneProcessBakeByteForByteAndS
 	          7)
 	    << "five level files, ambient.sh and bake.json: no temporary";
 
+	// With no temporary folder to be had, the parts go to a hidden one in the level's folder,
+	// which is gone afterwards (from the starting files again: no room cubemap).
+	fs::remove_all(myScratch.File("data/Cubemaps/sample_small"));
+	const int withoutTemporary =
+	    Shell("TMPDIR=/nonexistent/lumora $LUMORA bake sample_small --bounces 2 --jobs 2 --ambient-only "
+	          ">bake.out 2>bake.err");
+	EXPECT_EQ(withoutTemporary, 0) << Read("bake.err");
+	EXPECT_TRUE(Read(ambient) == bakedAmbient) << "the bake without a temporary folder differs";
+	EXPECT_EQ(std::distance(fs::directory_iterator(myScratch.File("data/XML/levels/sample_small")),
+	                        fs::directory_iterator()),
+	          7)
+	    << "the hidden folder of parts is left";
+
 	ExpectOneErrorLine(Run("bake sample_small --jobs 2 --rooms main"), 2,
 	                   "lumora: --jobs shares a whole bake: it does not go with --bounce, --rooms");
 }

@@ -64,17 +64,24 @@ std::vector<CellRange> SplitByProbes(const Zeph::AmbientGrid& aGrid,
 	return ranges;
 }
 
-// A folder of its own under the system's temporary folder, removed with what it holds.
+// A folder of its own under the system's temporary folder (or, where that cannot be had, a
+// hidden one in aFallbackParent), removed with what it holds.
 class ScratchFolder
 {
 public:
-	ScratchFolder()
+	explicit ScratchFolder(const std::string& aFallbackParent)
 	{
 		std::error_code error;
-		std::string pattern = (std::filesystem::temp_directory_path(error) / "lumora-bake-XXXXXX").string();
-		if (!error && mkdtemp(pattern.data()) != nullptr)
+		const std::filesystem::path system = std::filesystem::temp_directory_path(error);
+		for (const std::string& pattern : {error ? std::string() : (system / "lumora-bake-XXXXXX").string(),
+		                                   aFallbackParent + "/.lumora-bake-XXXXXX"})
 		{
-			myPath = pattern;
+			std::string path = pattern;
+			if (!path.empty() && mkdtemp(path.data()) != nullptr)
+			{
+				myPath = path;
+				return;
+			}
 		}
 	}
 	~ScratchFolder()
@@ -211,7 +218,7 @@ bool BakeAmbientInParallel(EditorSession& aSession, const BakeOptions& someOptio
 	const auto start = std::chrono::steady_clock::now();
 	const Zeph::AmbientGrid grid = Zeph::AmbientGrid::FromRooms(editor.GetRooms());
 	const std::vector<CellRange> ranges = SplitByProbes(grid, editor.GetRooms(), someWorkers.GetCount() + 1);
-	const ScratchFolder scratch;
+	const ScratchFolder scratch("data/XML/levels/" + someOptions.myLevel);
 	if (scratch.GetPath().empty())
 	{
 		PrintError("the ambient bake did not write " + path + ": no temporary folder for its parts");
@@ -254,6 +261,11 @@ bool BakeAmbientInParallel(EditorSession& aSession, const BakeOptions& someOptio
 			previous = merged;
 		}
 		bar.Stop(bakedFlag);
+	}
+	if (!bakedFlag)
+	{
+		// Before their folder goes: a helper still baking would make it again for its part.
+		someWorkers.Stop();
 	}
 	if (StopAsked())
 	{
@@ -319,6 +331,11 @@ bool BakeReflectionsInParallel(EditorSession& aSession, const BakeOptions& someO
 		});
 		bakedFlag = ShareJobs(aSession, someOptions.myLevel, someWorkers, jobs, roomsDone, problem);
 		bar.Stop(bakedFlag);
+	}
+	if (!bakedFlag || StopAsked())
+	{
+		// Before the temporaries go: a helper still baking would write its own again.
+		someWorkers.Stop();
 	}
 	// Every cubemap is in its temporary before the first replaces its file.
 	for (size_t index = 0; index < targets.size(); ++index)
