@@ -33,7 +33,7 @@ bool Finished(EditorSession& aSession)
 bool BakeAmbient(EditorSession& aSession, const BakeOptions& someOptions)
 {
 	Lumora::LumoraWrapper& editor = aSession.Editor();
-	const std::string path = "data/XML/levels/" + someOptions.myLevel + "/ambient.sh";
+	const std::string path = AmbientFile(someOptions.myLevel);
 	const auto start = std::chrono::steady_clock::now();
 	const size_t problemsBefore = aSession.GetProblemCount();
 	std::string refusal;
@@ -288,8 +288,7 @@ int RunBake(const BakeOptions& someOptions)
 		}
 		if (!someOptions.myAmbientOnlyFlag && !StopAsked())
 		{
-			const std::string ambient =
-			    ambientWrittenFlag ? "data/XML/levels/" + someOptions.myLevel + "/ambient.sh" : std::string();
+			const std::string ambient = ambientWrittenFlag ? AmbientFile(someOptions.myLevel) : std::string();
 			done = (sharedFlag ? BakeReflectionsInParallel(session, someOptions, workers, ambient)
 			                   : BakeReflections(session, someOptions)) &&
 			       done;

@@ -50,6 +50,11 @@ int GetStopSignal()
 	return ourStopSignal;
 }
 
+std::string AmbientFile(const std::string& aLevel)
+{
+	return "data/XML/levels/" + aLevel + "/ambient.sh";
+}
+
 double SecondsSince(std::chrono::steady_clock::time_point aStart)
 {
 	return std::chrono::duration<double>(std::chrono::steady_clock::now() - aStart).count();

@@ -34,6 +34,9 @@ private:
 bool StopAsked();
 int GetStopSignal();
 
+// The level's ambient volume, as the bakes write it: "data/XML/levels/LEVEL/ambient.sh".
+std::string AmbientFile(const std::string& aLevel);
+
 double SecondsSince(std::chrono::steady_clock::time_point aStart);
 // "1234 bytes", or "missing".
 std::string SizeOf(const std::string& aPath);

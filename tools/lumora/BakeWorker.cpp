@@ -33,7 +33,6 @@ std::vector<std::string> SplitFields(const std::string& aLine)
 		start = end + 1;
 	}
 }
-
 } // namespace
 
 std::string RunBakeJob(EditorSession& aSession, const std::string& aLevel,
@@ -45,10 +44,10 @@ std::string RunBakeJob(EditorSession& aSession, const std::string& aLevel,
 	bool doneFlag = false;
 	if (someFields.size() == 6 && someFields[0] == "ambient")
 	{
-		char* end = nullptr;
-		const long bounce = std::strtol(someFields[1].c_str(), &end, 10);
-		const long long first = std::strtoll(someFields[2].c_str(), &end, 10);
-		const long long count = std::strtoll(someFields[3].c_str(), &end, 10);
+		// The numbers come from the process that started this one; the bake refuses bad ones.
+		const long bounce = std::strtol(someFields[1].c_str(), nullptr, 10);
+		const long long first = std::strtoll(someFields[2].c_str(), nullptr, 10);
+		const long long count = std::strtoll(someFields[3].c_str(), nullptr, 10);
 		doneFlag = editor.BakeAmbientPart(Lumora::ToWide(aLevel), static_cast<int>(bounce), someFields[4],
 		                                  first, count, someFields[5], problem);
 	}

@@ -214,7 +214,7 @@ bool BakeAmbientInParallel(EditorSession& aSession, const BakeOptions& someOptio
 {
 	Lumora::LumoraWrapper& editor = aSession.Editor();
 	const std::u16string level = Lumora::ToWide(someOptions.myLevel);
-	const std::string path = "data/XML/levels/" + someOptions.myLevel + "/ambient.sh";
+	const std::string path = AmbientFile(someOptions.myLevel);
 	const auto start = std::chrono::steady_clock::now();
 	const Zeph::AmbientGrid grid = Zeph::AmbientGrid::FromRooms(editor.GetRooms());
 	const std::vector<CellRange> ranges = SplitByProbes(grid, editor.GetRooms(), someWorkers.GetCount() + 1);
